@@ -1,0 +1,70 @@
+#pragma once
+
+#include <nexil/JobCancel.h>
+
+#include <tbb/blocked_range.h>
+#include <tbb/parallel_for.h>
+#include <tbb/parallel_reduce.h>
+#include <tbb/parallel_sort.h>
+#include <tbb/task_group.h>
+
+#include <cstddef>
+#include <utility>
+
+/// The one way to loop in parallel here: the range, the grain by name, the body.
+///
+///     parallel::forRange(faceCount, grain::kFaces, [&](std::size_t begin, std::size_t end) { ... });
+///
+/// Every call runs in a task context of its own, so that neither side's cancellation cuts the other short; asks for
+/// cancellation once per chunk; and passes on the first exception of a body. Ranges of one grain or less stay on the
+/// calling thread.
+namespace Nexil::parallel {
+
+/// Calls body(begin, end) over disjoint chunks that cover [0, count). Where the cuts lie depends on the schedule, so
+/// the body's results must not depend on them.
+template <class Body>
+void forRange(std::size_t count, std::size_t grain, Body const& body)
+{
+    if (count == 0)
+        return;
+    if (count <= grain) {
+        Nexil::Internal::throwIfJobCancelled();
+        body(std::size_t(0), count);
+        return;
+    }
+    tbb::task_group_context context(tbb::task_group_context::isolated);
+    tbb::parallel_for(
+        tbb::blocked_range<std::size_t>(0, count, grain),
+        [&body](tbb::blocked_range<std::size_t> const& range) {
+            Nexil::Internal::throwIfJobCancelled();
+            body(range.begin(), range.end());
+        },
+        tbb::auto_partitioner(), context);
+}
+
+/// Folds chunk(begin, end) results left to right over fixed ranges of `grain`: one value for every thread count.
+template <class Value, class Chunk, class Unite>
+[[nodiscard]] Value reduceInOrder(std::size_t count, std::size_t grain, Value const& identity, Chunk const& chunk,
+                                  Unite const& unite)
+{
+    tbb::task_group_context context(tbb::task_group_context::isolated);
+    return tbb::parallel_deterministic_reduce(
+        tbb::blocked_range<std::size_t>(0, count, grain), identity,
+        [&](tbb::blocked_range<std::size_t> const& range, Value value) {
+            Nexil::Internal::throwIfJobCancelled();
+            return chunk(range.begin(), range.end(), std::move(value));
+        },
+        unite, tbb::simple_partitioner(), context);
+}
+
+/// Sorts [first, last). Not stable: the order must be total, or equal elements indistinguishable.
+template <class Iterator, class Less>
+void sort(Iterator first, Iterator last, Less const& less)
+{
+    tbb::task_group_context context(tbb::task_group_context::isolated);
+    // tbb::parallel_sort takes no context; a loop of one task lends it this one.
+    tbb::parallel_for(
+        0, 1, [&](int) { tbb::parallel_sort(first, last, less); }, tbb::simple_partitioner(), context);
+}
+
+} // namespace Nexil::parallel

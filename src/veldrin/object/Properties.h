@@ -1,0 +1,39 @@
+#pragma once
+
+#include <veldrin/object/Object.h>
+
+#include <type_traits>
+#include <utility>
+
+/// Typed reading and storing of properties.
+namespace Veldrin {
+
+/// The value under `key` when it is exactly a T, else T(): null for pointers, "" for strings, 0 for numbers.
+template <class T>
+[[nodiscard]] T getPropertyAs(Object const& object, Nexil::String const& key)
+{
+    Nexil::Any value = object.getProperty(key);
+    auto* const typed = value.get<T>();
+    return typed ? std::move(*typed) : T();
+}
+
+/// Stores `value` under `key`; false, and nothing stored, under an empty key.
+///
+/// What the object model knows only by its base is stored as that: a writable pointer becomes a shared one, a pointer to
+/// a class derived from Object a `Ptr<Object>`, a text constant a `String`.
+template <class T>
+bool setProperty(Object& object, Nexil::String const& key, T&& value)
+{
+    using Value = std::decay_t<T>;
+    if constexpr (std::is_convertible_v<Value, Nexil::Ptr<Object>> && !std::is_same_v<Value, std::nullptr_t>)
+        return object.setPropertyAny(key, Nexil::Ptr<Object>(std::forward<T>(value)));
+    else if constexpr (requires { typename Value::element_type; } &&
+                       std::is_same_v<Value, Nexil::MutablePtr<typename Value::element_type>>)
+        return object.setPropertyAny(key, Nexil::Ptr<typename Value::element_type>(std::forward<T>(value)));
+    else if constexpr (std::is_convertible_v<Value, char const*>)
+        return object.setPropertyAny(key, Nexil::String(value));
+    else
+        return object.setPropertyAny(key, Nexil::Any(std::forward<T>(value)));
+}
+
+} // namespace Veldrin
