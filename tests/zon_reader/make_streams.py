@@ -579,15 +579,19 @@ def bad_arrays():
     for name, chunk in [
             ("15_bytes", fake_chunk(16, length=15)), ("no_bytes", b""), ("format_1", fake_chunk(16, 32, fmt=1)),
             ("length_less", fake_chunk(16, 32, said=31)), ("length_more", fake_chunk(16, 32, said=33)),
-            ("codec_blosclz", fake_chunk(16, 32, flags=0x01)), ("codec_snappy", fake_chunk(16, 32, flags=0x41)),
-            ("codec_zlib", fake_chunk(16, 32, flags=0x61)), ("codec_zstd", fake_chunk(16, 32, flags=0x81)),
+            ("codec_unknown", fake_chunk(16, 32, flags=0xE1)),
             ("declared_0", fake_chunk(0, 16)), ("block_0", fake_chunk(16, 32, block=0)),
-            ("block_over", fake_chunk(16, 32, block=17)), ("stored_other_size", fake_chunk(16, 31, flags=0x22)),
+            ("block_over", patched(good, 8, *struct.pack("<I", 1601))), ("stored_other_size", fake_chunk(16, 31, flags=0x22)),
             ("ratio_256", fake_chunk(256 * 32, 32)), ("declared_2_gib", fake_chunk((1 << 31) - 1, 64)),
             ("declared_4_gib", fake_chunk((1 << 32) - 1, 64)), ("payload_zero", fake_chunk(16, 64)),
             ("payload_cut", patched(good[:-8], 12, *struct.pack("<I", len(good) - 8)))]:
         declared = struct.unpack("<I", chunk[4:8])[0] if len(chunk) > 8 else 16
         yield f"packed_{name}", with_chunk(chunk, declared // 4 or 1), DECOMPRESS
+    # Sound chunks of other codecs: the decompressor would take them.
+    for codec in blosc.compressor_list():
+        if not codec.startswith("lz4"):
+            chunk = blosc.compress(bytes(1600), typesize=4, clevel=9, shuffle=blosc.SHUFFLE, cname=codec)
+            yield f"packed_codec_{codec}", with_chunk(chunk, 400), DECOMPRESS
     yield "packed_plain_bytes", floored(2, pair, level=9), DECOMPRESS
     yield "stored_compressed_bytes", floored(400, good, level=0), TOTAL
 
