@@ -1,0 +1,210 @@
+#include <veldrin/io/ObjectStream.h>
+
+#include <nexil/JobCancel.h>
+#include <veldrin/io/InputMemoryBuf.h>
+#include <veldrin/io/StreamKeys.h>
+#include <veldrin/io/internal/ByteSink.h>
+#include <veldrin/io/internal/ByteSource.h>
+#include <veldrin/io/internal/Msgpack.h>
+#include <veldrin/io/internal/StreamHeader.h>
+#include <veldrin/io/internal/StreamReader.h>
+#include <veldrin/io/internal/StreamWriter.h>
+
+#include <cstring>
+#include <fstream>
+#include <memory>
+#include <stdexcept>
+#include <vector>
+
+namespace Veldrin::IO {
+
+namespace {
+
+    using Objects = Nexil::Array<Nexil::Ptr<Object>>;
+
+    constexpr std::size_t kFileBufferBytes = std::size_t(2) << 20;
+
+    bool report(Nexil::RuntimeServices const* services, Nexil::String const& text)
+    {
+        if (services)
+            services->logMessage({Nexil::RuntimeMessageCategory::Error, text});
+        return false;
+    }
+
+    /// The shape of every entry point: does the work, and turns what it throws into false and a message.
+    /// ioMessage: what to say when the stream itself fails.
+    template <class Work>
+    bool runReported(Nexil::RuntimeServices const* services, Nexil::String const& ioMessage, Work const& work)
+    {
+        try {
+            return work();
+        } catch (Nexil::String const& text) {
+            return report(services, text);
+        } catch (WriteFailure const&) {
+            return report(services, ioMessage);
+        } catch (std::ios_base::failure const&) {
+            return report(services, ioMessage);
+        } catch (std::bad_alloc const&) {
+            throw;
+        } catch (std::runtime_error const& error) {
+            // A cancelled job is no failure. Of the MessagePack library's errors some are runtime errors too.
+            if (std::strcmp(error.what(), Nexil::Internal::kJobCancelledText) == 0)
+                return false;
+            return report(services, "Unknown msgpack error occurred");
+        } catch (std::exception const&) {
+            return report(services, "Unknown msgpack error occurred");
+        }
+    }
+
+    bool writeReported(Objects const& objects, WriterContext const& context, Nexil::OutputStream& stream)
+    {
+        return runReported(context.services, "Cannot write to stream", [&] {
+            writeStream(objects, context, stream.standardStream());
+            return true;
+        });
+    }
+
+    /// Position of a stream that can seek, or -1.
+    std::streamoff seekablePosition(std::streambuf& buffer)
+    {
+        return std::streamoff(buffer.pubseekoff(0, std::ios_base::cur, std::ios_base::in));
+    }
+
+    std::vector<char> readAll(std::streambuf& buffer)
+    {
+        std::vector<char> bytes;
+        for (;;) {
+            // Memory grows with what really came.
+            std::size_t const have = bytes.size();
+            bytes.resize(have + std::max<std::size_t>(have / 2, 64 << 10));
+            auto const got = buffer.sgetn(bytes.data() + have, static_cast<std::streamsize>(bytes.size() - have));
+            bytes.resize(have + static_cast<std::size_t>(got));
+            if (got == 0)
+                return bytes;
+        }
+    }
+
+    bool readObjects(std::streambuf& buffer, std::uint64_t position, std::uint64_t end, Objects& out)
+    {
+        Object header;
+        ByteSource headerSource(buffer, position, end, ByteSource::ReadAhead::None);
+        readHeader(headerSource, header);
+        unsigned int const version = headerUnsigned(header, sStreamVersion);
+        if (version == 0)
+            return false;
+        ByteSource source(buffer, headerSource.position(), end, ByteSource::ReadAhead::Window);
+        Objects objects = version <= 4 ? readSequentialStream(source, header, version)
+                                       : readEntryStream(source, header, version >= kCurrentVersion);
+        out.reserve(out.size() + objects.size());
+        for (auto& object : objects)
+            out.push_back(std::move(object));
+        return true;
+    }
+
+    bool readStream(std::istream& stream, Objects& out)
+    {
+        std::streambuf* const buffer = stream.rdbuf();
+        if (!buffer)
+            throwTruncated();
+        std::streamoff const position = seekablePosition(*buffer);
+        std::streamoff const end =
+            position < 0 ? -1 : std::streamoff(buffer->pubseekoff(0, std::ios_base::end, std::ios_base::in));
+        if (end < position || end < 0) {
+            std::vector<char> const bytes = readAll(*buffer);
+            InputMemoryBuf memory(bytes.data(), bytes.size());
+            return readObjects(memory, 0, bytes.size(), out);
+        }
+        buffer->pubseekpos(std::streampos(position), std::ios_base::in);
+        return readObjects(*buffer, static_cast<std::uint64_t>(position), static_cast<std::uint64_t>(end), out);
+    }
+
+    bool readHeaderOnly(std::istream& stream, Object& header)
+    {
+        std::streambuf* const buffer = stream.rdbuf();
+        if (!buffer)
+            throwTruncated();
+        std::streamoff const position = std::max<std::streamoff>(seekablePosition(*buffer), 0);
+        ByteSource source(*buffer, static_cast<std::uint64_t>(position), ByteSource::kUnknownEnd,
+                          ByteSource::ReadAhead::None);
+        readHeader(source, header);
+        return true;
+    }
+
+    /// Opens a file for reading and works on it.
+    template <class Work>
+    bool withInputFile(Nexil::String const& path, Nexil::RuntimeServices const* services, Work const& work)
+    {
+        return runReported(services, Nexil::String("Cannot read from file: ") + path, [&] {
+            std::ifstream file(path.c_str(), std::ios_base::in | std::ios_base::binary);
+            if (!file)
+                throw Nexil::String("Cannot open file for reading: ") + path;
+            return work(file);
+        });
+    }
+
+} // namespace
+
+bool serialize(Objects const& objects, Nexil::String const& path, SerializationOptions const& options,
+               Nexil::RuntimeServices const* services)
+{
+    WriterContext const context{options, false, {}, services};
+    return runReported(services, Nexil::String("Cannot write to file: ") + path, [&] {
+        auto const memory = std::make_unique<char[]>(kFileBufferBytes);
+        std::ofstream file;
+        // Once a file is open the buffer can no longer be set.
+        file.rdbuf()->pubsetbuf(memory.get(), kFileBufferBytes);
+        file.open(path.c_str(), std::ios_base::out | std::ios_base::binary | std::ios_base::trunc);
+        if (!file)
+            throw Nexil::String("Cannot open file for writing: ") + path;
+        writeStream(objects, context, file);
+        file.close();
+        if (!file)
+            throw WriteFailure();
+        return true;
+    });
+}
+
+bool serialize(Objects const& objects, Nexil::OutputStream& stream, SerializationOptions const& options,
+               Nexil::RuntimeServices const* services)
+{
+    return writeReported(objects, {options, false, {}, services}, stream);
+}
+
+bool serialize(Nexil::Array<Nexil::Ptr<Object>*> const& handles, Nexil::OutputStream& stream,
+               SerializationOptions const& options, Nexil::RuntimeServices const* services)
+{
+    Objects objects;
+    objects.reserve(handles.size());
+    auto addresses = Nexil::makeMutable<Nexil::Array<unsigned long long>>();
+    addresses->reserve(handles.size());
+    for (auto const* handle : handles) {
+        objects.push_back(handle ? *handle : Nexil::Ptr<Object>());
+        addresses->push_back(reinterpret_cast<unsigned long long>(handle));
+    }
+    return writeReported(objects, {options, true, std::move(addresses), services}, stream);
+}
+
+bool deserialize(Nexil::InputStream& stream, Objects& out, DeserializationOptions const&,
+                 Nexil::RuntimeServices const* services)
+{
+    return runReported(services, "Cannot read from stream", [&] { return readStream(stream.standardStream(), out); });
+}
+
+bool deserialize(Nexil::String const& path, Objects& out, DeserializationOptions const&,
+                 Nexil::RuntimeServices const* services)
+{
+    return withInputFile(path, services, [&](std::istream& file) { return readStream(file, out); });
+}
+
+bool deserializeHeader(Nexil::InputStream& stream, Object& header, Nexil::RuntimeServices const* services)
+{
+    return runReported(services, "Cannot read from stream",
+                       [&] { return readHeaderOnly(stream.standardStream(), header); });
+}
+
+bool deserializeHeader(Nexil::String const& path, Object& header, Nexil::RuntimeServices const* services)
+{
+    return withInputFile(path, services, [&](std::istream& file) { return readHeaderOnly(file, header); });
+}
+
+} // namespace Veldrin::IO

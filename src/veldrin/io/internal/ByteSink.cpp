@@ -1,0 +1,83 @@
+#include <veldrin/io/internal/ByteSink.h>
+
+#include <nexil/JobCancel.h>
+
+#include <algorithm>
+
+namespace Veldrin::IO {
+
+namespace {
+
+    constexpr std::size_t kBufferBytes = std::size_t(64) << 10;
+    // Runs from here on skip the buffer.
+    constexpr std::size_t kLongRunBytes = std::size_t(16) << 10;
+    // Bytes that are hashed and written at once: the stream finds them in the cache.
+    constexpr std::size_t kPieceBytes = std::size_t(512) << 10;
+
+} // namespace
+
+ByteSink::ByteSink(std::streambuf& stream, std::uint64_t position) : stream_(stream), streamPosition_(position)
+{
+    buffer_.reserve(kBufferBytes);
+}
+
+void ByteSink::write(char const* bytes, std::size_t byteCount)
+{
+    if (byteCount < kLongRunBytes) {
+        if (buffer_.size() + byteCount > kBufferBytes)
+            flush();
+        buffer_.insert(buffer_.end(), bytes, bytes + byteCount);
+        return;
+    }
+    flush();
+    while (byteCount != 0) {
+        Nexil::Internal::throwIfJobCancelled();
+        std::size_t const piece = std::min(byteCount, kPieceBytes);
+        if (isHashing_)
+            hash_.add(bytes, piece);
+        put(bytes, piece);
+        bytes += piece;
+        byteCount -= piece;
+    }
+}
+
+void ByteSink::beginItem(std::uint64_t hashSeed)
+{
+    hash_.restart(hashSeed);
+    hashed_ = buffer_.size();
+    isHashing_ = true;
+}
+
+std::uint64_t ByteSink::endItem()
+{
+    hashBuffered();
+    isHashing_ = false;
+    return hash_.digest();
+}
+
+void ByteSink::flush()
+{
+    hashBuffered();
+    put(buffer_.data(), buffer_.size());
+    buffer_.clear();
+    hashed_ = 0;
+}
+
+void ByteSink::hashBuffered()
+{
+    if (isHashing_)
+        hash_.add(buffer_.data() + hashed_, buffer_.size() - hashed_);
+    hashed_ = buffer_.size();
+}
+
+void ByteSink::put(char const* bytes, std::size_t byteCount)
+{
+    if (byteCount == 0)
+        return;
+    auto const put = stream_.sputn(bytes, static_cast<std::streamsize>(byteCount));
+    if (put != static_cast<std::streamsize>(byteCount))
+        throw WriteFailure();
+    streamPosition_ += byteCount;
+}
+
+} // namespace Veldrin::IO
