@@ -8,6 +8,17 @@
 /// Typed reading and storing of properties.
 namespace Veldrin {
 
+namespace Internal {
+
+    template <class T>
+    struct WritablePointer : std::false_type {};
+    template <class T>
+    struct WritablePointer<Nexil::MutablePtr<T>> : std::true_type {
+        using Shared = Nexil::Ptr<T>;
+    };
+
+} // namespace Internal
+
 /// The value under `key` when it is exactly a T, else T(): null for pointers, "" for strings, 0 for numbers.
 template <class T>
 [[nodiscard]] T getPropertyAs(Object const& object, Nexil::String const& key)
@@ -27,9 +38,8 @@ bool setProperty(Object& object, Nexil::String const& key, T&& value)
     using Value = std::decay_t<T>;
     if constexpr (std::is_convertible_v<Value, Nexil::Ptr<Object>> && !std::is_same_v<Value, std::nullptr_t>)
         return object.setPropertyAny(key, Nexil::Ptr<Object>(std::forward<T>(value)));
-    else if constexpr (requires { typename Value::element_type; } &&
-                       std::is_same_v<Value, Nexil::MutablePtr<typename Value::element_type>>)
-        return object.setPropertyAny(key, Nexil::Ptr<typename Value::element_type>(std::forward<T>(value)));
+    else if constexpr (Internal::WritablePointer<Value>::value)
+        return object.setPropertyAny(key, typename Internal::WritablePointer<Value>::Shared(std::forward<T>(value)));
     else if constexpr (std::is_convertible_v<Value, char const*>)
         return object.setPropertyAny(key, Nexil::String(value));
     else
