@@ -45,7 +45,8 @@ namespace {
                                                           : Layout::Leaf::Unsigned;
             return {leaf, sizeof(T)};
         } else {
-            auto layout = layoutOf<typename std::conditional_t<std::is_same_v<T, Box3f>, Math::float3, T>::value_type>();
+            auto layout =
+                layoutOf<typename std::conditional_t<std::is_same_v<T, Box3f>, Math::float3, T>::value_type>();
             constexpr unsigned int leafCount = sizeof(T) / sizeof(typename T::value_type);
             if constexpr (requires { T::kColumns; })
                 layout.columns = T::kColumns;

@@ -30,24 +30,17 @@ namespace {
         // keeps the key in its place meanwhile.
         if (!setProperty(obj, name, ObjectPtr()))
             return false;
-        ObjectPtr original;
-        if (part.useCount() > 1)
-            original = part;
+        auto const original = part.useCount() > 1 ? part : ObjectPtr();
+        Nexil::MutablePtr<Object> writable;
         bool isSet = false;
         try {
-            Nexil::MutablePtr<Object> writable(std::move(part));
-            try {
-                isSet = writable->setPropertyAny(key, std::move(value));
-            } catch (...) {
-                part = std::move(writable);
-                throw;
-            }
-            part = std::move(writable);
+            writable = Nexil::MutablePtr<Object>(std::move(part));
+            isSet = writable->setPropertyAny(key, std::move(value));
         } catch (...) {
-            setProperty(obj, name, original ? std::move(original) : std::move(part));
+            setProperty(obj, name, original ? original : ObjectPtr(std::move(writable)));
             throw;
         }
-        setProperty(obj, name, !isSet && original ? std::move(original) : std::move(part));
+        setProperty(obj, name, isSet || !original ? ObjectPtr(std::move(writable)) : original);
         return isSet;
     }
 

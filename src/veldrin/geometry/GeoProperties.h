@@ -55,7 +55,7 @@ VELDRIN_API bool setElementCount(Nexil::String const& name, unsigned int count, 
 
 /// "indices" of the range under `name`; null when there is no range.
 [[nodiscard]] VELDRIN_API Nexil::Ptr<Nexil::Array<unsigned int>> getRangeGeoPropIndices(Object const& obj,
-                                                                                      Nexil::String const& name);
+                                                                                        Nexil::String const& name);
 
 /// Replaces "indices" of the object under `name`; false when there is no such object. Null counts as an empty array.
 /// Places, addresses and other holders as in `setElementCount`.
@@ -64,24 +64,24 @@ VELDRIN_API bool setRangeGeoPropIndices(Nexil::String const& name, Nexil::Ptr<Ne
 
 /// Names of the properties that hold an object which is a `prototype`, in the order of `keys()`.
 [[nodiscard]] VELDRIN_API Nexil::Array<Nexil::String> getGeoPropNamesByPrototype(Object const& obj,
-                                                                               Object const& prototype);
+                                                                                 Object const& prototype);
 
 /// The same objects themselves.
 [[nodiscard]] VELDRIN_API Nexil::Array<Nexil::Ptr<Object>> getGeoPropsByPrototype(Object const& obj,
-                                                                                Object const& prototype);
+                                                                                  Object const& prototype);
 
 /// Names of the properties that hold an object whose "target" equals `target`, in the order of `keys()`.
 [[nodiscard]] VELDRIN_API Nexil::Array<Nexil::String> getGeoPropNamesByTarget(Object const& obj,
-                                                                            Nexil::String const& target);
+                                                                              Nexil::String const& target);
 
 /// The same objects themselves.
 [[nodiscard]] VELDRIN_API Nexil::Array<Nexil::Ptr<Object>> getGeoPropsByTarget(Object const& obj,
-                                                                             Nexil::String const& target);
+                                                                               Nexil::String const& target);
 
 /// Names of the data geo properties that match `pattern`, in the order of `keys()`: '*' stands for any run of
 /// characters, '?' for exactly one. None for the empty pattern.
 [[nodiscard]] VELDRIN_API Nexil::Array<Nexil::String> getGeoPropsByName(Object const& obj,
-                                                                      Nexil::String const& pattern);
+                                                                        Nexil::String const& pattern);
 
 /// The object of `obj` that `geoProp` targets; null when the target is missing, empty, of the wrong type, or names
 /// nothing.

@@ -98,8 +98,8 @@ namespace {
     bool storePointCloud(Positions positions, Object& pointCloud)
     {
         auto const points = component(positions->size());
-        return storeParts(pointCloud, {{sPointComp, points},
-                                       {sPointPosition, positionsOver(sPointComp, std::move(positions))}});
+        return storeParts(pointCloud,
+                          {{sPointComp, points}, {sPointPosition, positionsOver(sPointComp, std::move(positions))}});
     }
 
     bool storeStrand(Positions positions, Indices strandOffset, Object& strand)

@@ -85,15 +85,17 @@ namespace {
         {0, 1, 0},
     };
 
+    // clang-format off
     constexpr unsigned int kSphereCorners[] = {
         // quads, ring by ring
         0, 1, 6, 5, 1, 2, 7, 6, 2, 3, 8, 7, 3, 4, 9, 8, 4, 0, 5, 9,
         5, 6, 11, 10, 6, 7, 12, 11, 7, 8, 13, 12, 8, 9, 14, 13, 9, 5, 10, 14,
         10, 11, 16, 15, 11, 12, 17, 16, 12, 13, 18, 17, 13, 14, 19, 18, 14, 10, 15, 19,
-        // triangles around the poles
+        // triangles around the lower and the upper pole
         1, 0, 20, 2, 1, 20, 3, 2, 20, 4, 3, 20, 0, 4, 20,
         15, 16, 21, 16, 17, 21, 17, 18, 21, 18, 19, 21, 19, 15, 21,
     };
+    // clang-format on
 
     template <class T, std::size_t Count>
     Nexil::Ptr<Nexil::Array<T>> arrayOf(T const (&values)[Count])

@@ -17,7 +17,8 @@ namespace {
     using ObjectPtr = Nexil::Ptr<Object>;
 
     /// Places in the list of geometry types.
-    enum Kind : unsigned int { kVolume, kInstances, kMesh, kStrand, kPointCloud, kKindCount };
+    enum class Kind : unsigned int { Volume, Instances, Mesh, Strand, PointCloud };
+    constexpr unsigned int kKindCount = 5;
 
     struct Registry {
         Nexil::Ptr<Nexil::Array<ObjectPtr>> geometryTypes;
@@ -48,10 +49,10 @@ namespace {
     {
         return made([kind](Object& geometry) {
             switch (kind) {
-            case kVolume: return populateVolume(geometry);
-            case kInstances: return populateInstances(geometry);
-            case kMesh: return populateMesh(geometry);
-            case kStrand: return populateStrand(geometry);
+            case Kind::Volume: return populateVolume(geometry);
+            case Kind::Instances: return populateInstances(geometry);
+            case Kind::Mesh: return populateMesh(geometry);
+            case Kind::Strand: return populateStrand(geometry);
             default: return populatePointCloud(geometry);
             }
         });
@@ -124,7 +125,7 @@ namespace {
 
     ObjectPtr geometryType(Kind kind)
     {
-        return (*registry().geometryTypes)[kind];
+        return (*registry().geometryTypes)[static_cast<unsigned int>(kind)];
     }
 
 } // namespace
@@ -136,27 +137,27 @@ Nexil::Ptr<Nexil::Array<Nexil::Ptr<Object>>> getGeometryTypes()
 
 Nexil::Ptr<Object> getVolumePrototype()
 {
-    return geometryType(kVolume);
+    return geometryType(Kind::Volume);
 }
 
 Nexil::Ptr<Object> getInstancesPrototype()
 {
-    return geometryType(kInstances);
+    return geometryType(Kind::Instances);
 }
 
 Nexil::Ptr<Object> getMeshPrototype()
 {
-    return geometryType(kMesh);
+    return geometryType(Kind::Mesh);
 }
 
 Nexil::Ptr<Object> getStrandPrototype()
 {
-    return geometryType(kStrand);
+    return geometryType(Kind::Strand);
 }
 
 Nexil::Ptr<Object> getPointCloudPrototype()
 {
-    return geometryType(kPointCloud);
+    return geometryType(Kind::PointCloud);
 }
 
 Nexil::Ptr<Object> getLevelSetPrototype()

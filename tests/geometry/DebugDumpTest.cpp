@@ -1,0 +1,195 @@
+#include <support/Geometry.h>
+#include <veldrin/geometry/GeoLocation.h>
+#include <veldrin/geometry/internal/ValueTypes.h>
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cmath>
+#include <locale>
+
+namespace {
+
+using namespace Veldrin;
+using ObjectPtr = Nexil::Ptr<Object>;
+
+ObjectPtr holding(Nexil::Any value)
+{
+    auto object = createObject();
+    object->setPropertyAny("v", std::move(value));
+    return object;
+}
+
+/// How one value is written, type name included.
+std::string written(Nexil::Any value, unsigned long long maxElements = 3)
+{
+    auto const text = support::dump(*holding(std::move(value)), maxElements);
+    std::string const before = "{\n    v: ";
+    std::string const after = "\n}";
+    EXPECT_EQ(text.substr(0, before.size()), before);
+    EXPECT_EQ(text.substr(text.size() - after.size()), after);
+    return text.substr(before.size(), text.size() - before.size() - after.size());
+}
+
+enum class Unheard { Of };
+
+TEST(DebugDump, ValuesReadAsWritten)
+{
+    using namespace Math;
+    struct Case {
+        Nexil::Any value;
+        char const* text;
+    };
+    using Geometry::Common::DataInterpolationMode;
+    Case const cases[] = {
+        {static_cast<unsigned char>(65), "65 (unsigned char)"},
+        {static_cast<signed char>(-65), "-65 (signed char)"},
+        {static_cast<unsigned short>(65535), "65535 (unsigned short)"},
+        {static_cast<short>(-32768), "-32768 (short)"},
+        {0xFFFFFFFFu, "4294967295 (unsigned int)"},
+        {-1234567, "-1234567 (int)"},
+        {0xFFFFFFFFFFFFFFFFull, "18446744073709551615 (unsigned long long)"},
+        {-9223372036854775807ll, "-9223372036854775807 (long long)"},
+        {7ul, "7 (unsigned long)"},
+        {true, "1 (bool)"},
+        {false, "0 (bool)"},
+        {0.1f, "0.1 (float)"},
+        {1234567.0f, "1.23457e+06 (float)"},
+        {-INFINITY, "-inf (float)"},
+        {1.0 / 3, "0.333333 (double)"},
+        {Nexil::String("a, \"b\"\n"), "a, \"b\"\n (string)"},
+        {float2{1, 2}, "{1f, 2f} (Math::float2)"},
+        {double3{1, -2.5, 3}, "{1, -2.5, 3} (Math::double3)"},
+        {uchar4{1, 2, 3, 255}, "{1, 2, 3, 255} (Math::uchar4)"},
+        {bool2{true, false}, "{1, 0} (Math::bool2)"},
+        {float3x2{{{1, 2, 3}, {4, 5, 6}}}, "{{1f, 2f, 3f}, {4f, 5f, 6f}} (Math::float3x2)"},
+        {short2x3{{{1, 2}, {3, 4}, {5, 6}}}, "{{1, 2}, {3, 4}, {5, 6}} (Math::short2x3)"},
+        {quatf{1, 2, 3, 4}, "{1f, 2f, 3f, 4f} (Math::quatf)"},
+        {quatd{1, 2, 3, 4}, "{1, 2, 3, 4} (Math::quatd)"},
+        {bbox<float3, float>{{1, 2, 3}, {4, 5, 6}}, "{{1f, 2f, 3f}, {4f, 5f, 6f}} (Math::bbox<Math::float3, float>)"},
+        {DataInterpolationMode::Nearest, "Nearest (Geometry::Common::DataInterpolationMode)"},
+        {DataInterpolationMode::Linear, "Linear (Geometry::Common::DataInterpolationMode)"},
+        {DataInterpolationMode::DefaultValue, "DefaultValue (Geometry::Common::DataInterpolationMode)"},
+        {static_cast<DataInterpolationMode>(9), "9 (Geometry::Common::DataInterpolationMode)"},
+        {Nexil::Any(), "(unknown data type)"},
+        {ObjectPtr(), "(unknown data type) (Nexil::Ptr<Veldrin::Object>)"},
+        {Geometry::Common::GeoLocation(), "(unknown data type) (Veldrin::Geometry::Common::GeoLocation)"},
+        {support::array<int>({}), "[  ] 0 elements (array<int>)"},
+        {Nexil::Ptr<Nexil::Array<int>>(), "[  ] 0 elements (array<int>)"},
+        {support::array<float>({1, 2}), "[ 1, 2 ] 2 elements (array<float>)"},
+        {support::array<float>({1, 2, 3}), "[ 1, 2, 3 ] 3 elements (array<float>)"},
+        {support::array<float>({1, 2, 3, 4, 5}), "[ 1, 2, 3, ... ] 5 elements (array<float>)"},
+        {support::array<bool>({true, false}), "[ 1, 0 ] 2 elements (array<bool>)"},
+        {support::array<Nexil::String>({"a", "", "b", "c"}), "[ a, , b, ... ] 4 elements (array<string>)"},
+        {support::array<float2>({{1, 2}, {3, 4}}), "[ {1f, 2f}, {3f, 4f} ] 2 elements (array<Math::float2>)"},
+        {support::array<double2x2>({{{{1, 2}, {3, 4}}}}), "[ {{1, 2}, {3, 4}} ] 1 elements (array<Math::double2x2>)"},
+        {support::array<Nexil::Any>({1, 2}),
+         "[ ... ] 2 elements (array<unknown data type>) (Nexil::Ptr<Nexil::Array<Nexil::Any> >)"},
+        {support::array<Nexil::Any>({}),
+         "[] 0 elements (array<unknown data type>) (Nexil::Ptr<Nexil::Array<Nexil::Any> >)"},
+        {Nexil::Ptr<Nexil::Array<ObjectPtr>>(),
+         "[] 0 elements (array<unknown data type>) (Nexil::Ptr<Nexil::Array<Nexil::Ptr<Veldrin::Object> > >)"},
+    };
+    for (Case const& c : cases)
+        EXPECT_EQ(written(c.value), c.text);
+    EXPECT_NE(written(Unheard::Of).find("(unknown data type) ("), std::string::npos);
+    EXPECT_EQ(written(support::array<int>({1, 2, 3, 4, 5}), 0), "[ ... ] 5 elements (array<int>)");
+    EXPECT_EQ(written(support::array<int>({1, 2}), ~0ull), "[ 1, 2 ] 2 elements (array<int>)");
+}
+
+TEST(DebugDump, EveryValueTypeAndItsArrayIsKnownByItsName)
+{
+    unsigned int typeCount = 0;
+    auto const endsWith = [](std::string const& text, std::string const& end) {
+        return text.size() >= end.size() && text.substr(text.size() - end.size()) == end;
+    };
+    Geometry::Internal::forEachValueType([&]<class T>(unsigned int code, char const* name) {
+        EXPECT_EQ(code, typeCount++);
+        auto const single = written(T());
+        EXPECT_TRUE(endsWith(single, std::string(" (") + name + ")")) << single;
+        auto const value = single.substr(0, single.rfind(" (" + std::string(name)));
+        EXPECT_EQ(written(support::array<T>({T(), T()})),
+                  "[ " + value + ", " + value + " ] 2 elements (array<" + name + ">)");
+        // As many numbers as the type has.
+        auto const numberCount = static_cast<std::size_t>(std::count(value.begin(), value.end(), ',')) + 1;
+        if constexpr (std::is_same_v<T, Geometry::Internal::Box3f>) {
+            EXPECT_EQ(numberCount, 6u);
+        } else if constexpr (requires { typename T::value_type; }) {
+            EXPECT_EQ(numberCount, sizeof(T) / sizeof(typename T::value_type)) << name;
+        } else {
+            EXPECT_EQ(numberCount, 1u) << name;
+        }
+    });
+    EXPECT_EQ(typeCount, Geometry::Internal::kValueTypeCount);
+}
+
+TEST(DebugDump, ObjectsAndListsNestByFourBlanks)
+{
+    EXPECT_EQ(support::dump(*createObject()), "{\n}");
+    auto const inner = holding(1);
+    auto const outer = createObject();
+    setProperty(*outer, "one", inner);
+    setProperty(*outer, "none", support::array<ObjectPtr>({}));
+    setProperty(*outer, "list", support::array<ObjectPtr>({inner, nullptr, inner}));
+    setProperty(*outer, "deep", holding(Nexil::Any(inner)));
+    EXPECT_EQ(support::dump(*outer), "{\n"
+                                     "    one: \n"
+                                     "    {\n"
+                                     "        v: 1 (int)\n"
+                                     "    }\n"
+                                     "    none:     [\n"
+                                     "    ]\n"
+                                     "    list:     [\n"
+                                     "        {\n"
+                                     "            v: 1 (int)\n"
+                                     "        },\n"
+                                     "        (unknown data type),\n"
+                                     "        {\n"
+                                     "            v: 1 (int)\n"
+                                     "        }    ]\n"
+                                     "    deep: \n"
+                                     "    {\n"
+                                     "        v: \n"
+                                     "        {\n"
+                                     "            v: 1 (int)\n"
+                                     "        }\n"
+                                     "    }\n"
+                                     "}");
+}
+
+TEST(DebugDump, DeepAndMultiplyingObjectsAreCut)
+{
+    auto deep = holding(1);
+    for (int level = 0; level < 5000; ++level)
+        deep = holding(Nexil::Any(std::move(deep)));
+    auto const text = support::dump(*deep);
+    EXPECT_EQ(std::count(text.begin(), text.end(), '{'), 1001);
+    EXPECT_NE(text.find("\n" + std::string(4 * 1001, ' ') + "...\n"), std::string::npos);
+
+    // Two to the power of sixty objects, were each written wherever it is met.
+    auto doubled = holding(1);
+    for (int level = 0; level < 60; ++level) {
+        auto both = createObject();
+        setProperty(*both, "a", doubled);
+        setProperty(*both, "b", doubled);
+        doubled = std::move(both);
+    }
+    auto const bounded = support::dump(*doubled);
+    EXPECT_NE(bounded.find("..."), std::string::npos);
+    EXPECT_LT(std::count(bounded.begin(), bounded.end(), '{'), 11000);
+}
+
+TEST(DebugDump, TheGlobalLocaleChangesNothing)
+{
+    struct Grouping : std::numpunct<char> {
+        char do_decimal_point() const override { return ','; }
+        char do_thousands_sep() const override { return '.'; }
+        std::string do_grouping() const override { return "\3"; }
+    };
+    auto const former = std::locale::global(std::locale(std::locale::classic(), new Grouping));
+    auto const text = written(support::array<double>({1234567.5, 1e4, 2, 3}));
+    std::locale::global(former);
+    EXPECT_EQ(text, "[ 1.23457e+06, 10000, 2, ... ] 4 elements (array<double>)");
+}
+
+} // namespace

@@ -1,0 +1,191 @@
+#include <support/Geometry.h>
+#include <veldrin/geometry/Prototypes.h>
+
+#include <gmock/gmock.h>
+
+#include "AllocationCount.h"
+
+namespace {
+
+using namespace Veldrin;
+using namespace Veldrin::Geometry;
+using testing::ElementsAre;
+
+template <class T>
+Nexil::Ptr<Nexil::Array<T>> zeros(std::uint64_t count)
+{
+    Nexil::Array<T> array;
+    array.resize(count);
+    return Nexil::makePtr<Nexil::Array<T>>(std::move(array));
+}
+
+/// An array that says it has more elements than there is memory for. Its second word is its size.
+template <class T>
+Nexil::Ptr<Nexil::Array<T>> claiming(std::uint64_t count)
+{
+    Nexil::Array<T> array{T()};
+    auto shared = Nexil::makeMutable<Nexil::Array<T>>(std::move(array));
+    reinterpret_cast<std::uint64_t*>(shared.get())[1] = count;
+    return shared;
+}
+
+constexpr std::uint64_t k4G = 1ull << 32;
+
+/// The dump of a property that holds these lines.
+std::string block(std::string const& name, std::string const& lines)
+{
+    return "    " + name + ": \n    {\n" + lines + "    }\n";
+}
+
+std::string component(std::string const& name)
+{
+    return block(name, "        count: 0 (unsigned int)\n");
+}
+
+std::string data(std::string const& name, std::string const& values, std::string const& target,
+                 std::string const& defaultValue)
+{
+    return block(
+        name, "        data: " + values + "\n        target: " + target +
+                  " (string)\n        depends_on: [  ] 0 elements (array<string>)\n        default: " + defaultValue +
+                  "\n        interpolation_mode: Linear (Geometry::Common::DataInterpolationMode)\n");
+}
+
+TEST(Population, EmptyFormsHoldExactlyTheseProperties)
+{
+    auto const points = component("point_component");
+    auto const positions = data("point_position", "[  ] 0 elements (array<Math::float3>)", "point_component",
+                                "{0f, 0f, 0f} (Math::float3)");
+    auto const offsets = [](char const* name, char const* target) {
+        return data(name, "[ 0 ] 1 elements (array<unsigned int>)", target, "4294967295 (unsigned int)");
+    };
+    auto const volume = component("voxel_component") + block("voxel_tile_tree",
+                                                             "        indices: [  ] 0 elements (array<unsigned int>)\n"
+                                                             "        target: voxel_component (string)\n"
+                                                             "        depends_on: [  ] 0 elements (array<string>)\n");
+    auto const channel = [](char const* name) {
+        return data(name, "[  ] 0 elements (array<float>)", "voxel_tile_tree", "0 (float)");
+    };
+    struct Case {
+        void (*populate)(Object&);
+        std::string text;
+    };
+    Case const cases[] = {
+        {&populateMesh, points + component("face_vertex_component") + component("face_component") + positions +
+                            data("face_vertex", "[  ] 0 elements (array<unsigned int>)", "face_vertex_component",
+                                 "4294967295 (unsigned int)") +
+                            offsets("face_offset", "face_component")},
+        {&populatePointCloud, points + positions},
+        {&populateStrand,
+         points + component("strand_component") + positions + offsets("strand_offset", "strand_component")},
+        {&populateVolume, volume},
+        {&populateLevelSet, volume + channel("voxel_signed_distance")},
+        {&populateFogVolume, volume + channel("voxel_fog_density")},
+        {&populateInstances,
+         data("instance_shape", "        [\n        ]", "", "(unknown data type) (Nexil::Ptr<Veldrin::Object>)")},
+    };
+    for (auto const& [populate, text] : cases)
+        EXPECT_EQ(support::dump(*support::filled(populate)), "{\n" + text + "}");
+}
+
+TEST(Population, ArraysAreMovedInAndNothingGrowsWithTheirSize)
+{
+    std::uint64_t allocations[2];
+    std::uint64_t const sizes[] = {10, 1000000};
+    for (int i = 0; i < 2; ++i) {
+        auto positions = zeros<Math::float3>(sizes[i]);
+        auto corners = zeros<unsigned int>(sizes[i]);
+        auto offsets = zeros<unsigned int>(sizes[i] + 1);
+        void const* const addresses[] = {positions->data(), corners->data(), offsets->data()};
+        auto mesh = createObject();
+
+        auto const before = support::allocationCount();
+        ASSERT_TRUE(populateMesh(std::move(positions), std::move(corners), std::move(offsets), *mesh));
+        allocations[i] = support::allocationCount() - before;
+
+        EXPECT_FALSE(positions || corners || offsets);
+        EXPECT_EQ(support::arrayIn<Math::float3>(*mesh, sPointPosition)->data(), addresses[0]);
+        EXPECT_EQ(support::arrayIn<unsigned int>(*mesh, sFaceVertex)->data(), addresses[1]);
+        EXPECT_EQ(support::arrayIn<unsigned int>(*mesh, sFaceOffset)->data(), addresses[2]);
+        EXPECT_EQ(getElementCount(*mesh, sPointComp), sizes[i]);
+        EXPECT_EQ(getElementCount(*mesh, sFaceVertexComp), sizes[i]);
+        EXPECT_EQ(getElementCount(*mesh, sFaceComp), sizes[i]);
+        // The stored objects have one holder, so that a later write copies nothing.
+        auto const* const count = support::part(*mesh, sPointComp).get();
+        ASSERT_TRUE(setElementCount(sPointComp, 5, *mesh));
+        EXPECT_EQ(support::part(*mesh, sPointComp).get(), count);
+    }
+    EXPECT_EQ(allocations[0], allocations[1]);
+}
+
+TEST(Population, PointCloudAndStrandsCountTheirElements)
+{
+    auto cloud = createObject();
+    ASSERT_TRUE(populatePointCloud(zeros<Math::float3>(4), *cloud));
+    EXPECT_EQ(getElementCount(*cloud, sPointComp), 4u);
+    EXPECT_TRUE(Object::isA(*cloud, *getPointCloudPrototype()));
+
+    auto strands = createObject();
+    ASSERT_TRUE(populateStrand(zeros<Math::float3>(5), support::array<unsigned int>({0, 2, 5}), *strands));
+    EXPECT_EQ(getElementCount(*strands, sPointComp), 5u);
+    EXPECT_EQ(getElementCount(*strands, sStrandComp), 2u);
+    EXPECT_THAT(support::valuesIn<unsigned int>(*strands, sStrandOffset), ElementsAre(0, 2, 5));
+    EXPECT_TRUE(Object::isA(*strands, *getStrandPrototype()));
+}
+
+TEST(Population, ArraysThatAreMissingEmptyOrTooLongLeaveTheObjectUntouched)
+{
+    auto const points = [] { return zeros<Math::float3>(3); };
+    auto const indices = [] { return zeros<unsigned int>(3); };
+    auto const object = createObject();
+    setProperty(*object, "kept", 1);
+    for (auto const& bad :
+         {Nexil::Ptr<Nexil::Array<unsigned int>>(), zeros<unsigned int>(0), claiming<unsigned int>(k4G + 1)}) {
+        EXPECT_FALSE(populateMesh(points(), bad, indices(), *object));
+        EXPECT_FALSE(populateMesh(points(), indices(), bad, *object));
+        EXPECT_FALSE(populateStrand(points(), bad, *object));
+    }
+    for (auto const& bad :
+         {Nexil::Ptr<Nexil::Array<Math::float3>>(), zeros<Math::float3>(0), claiming<Math::float3>(k4G)}) {
+        EXPECT_FALSE(populateMesh(bad, indices(), indices(), *object));
+        EXPECT_FALSE(populateStrand(bad, indices(), *object));
+        EXPECT_FALSE(populatePointCloud(bad, *object));
+    }
+    EXPECT_EQ(support::dump(*object), "{\n    kept: 1 (int)\n}");
+
+    // The longest that fit: offsets are one more than what they count.
+    EXPECT_TRUE(populateMesh(claiming<Math::float3>(k4G - 1), claiming<unsigned int>(k4G - 1),
+                             claiming<unsigned int>(k4G), *object));
+    for (char const* component : {sPointComp, sFaceVertexComp, sFaceComp})
+        EXPECT_EQ(getElementCount(*object, component), k4G - 1) << component;
+}
+
+TEST(Population, RepopulatingReplacesInPlaceAndKeepsOtherProperties)
+{
+    auto object = createObject();
+    setProperty(*object, sPointPosition, 7);
+    setProperty(*object, "kept", 1);
+    populateMesh(*object);
+    auto const keys = support::names(object->keys());
+    EXPECT_THAT(keys, ElementsAre("point_position", "kept", "point_component", "face_vertex_component",
+                                  "face_component", "face_vertex", "face_offset"));
+    EXPECT_TRUE(Object::isA(*object, *getMeshPrototype()));
+}
+
+TEST(Population, TrivialIndicesCountUpAndReuseTheArray)
+{
+    Nexil::Array<unsigned int> indices{9, 9, 9, 9};
+    auto const* const storage = indices.data();
+    populateTrivialRangeIndices(3, indices);
+    EXPECT_THAT(std::vector<unsigned int>(indices.begin(), indices.end()), ElementsAre(0, 1, 2));
+    EXPECT_EQ(indices.data(), storage);
+    populateTrivialRangeIndices(100000, indices);
+    EXPECT_EQ(indices.size(), 100000u);
+    EXPECT_EQ(indices[99999], 99999u);
+    populateTrivialRangeIndices(k4G + 1, indices);
+    EXPECT_EQ(indices.size(), 100000u);
+    populateTrivialRangeIndices(0, indices);
+    EXPECT_TRUE(indices.empty());
+}
+
+} // namespace

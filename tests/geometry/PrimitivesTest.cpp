@@ -1,0 +1,146 @@
+#include <support/Geometry.h>
+#include <veldrin/geometry/Prototypes.h>
+
+#include <gmock/gmock.h>
+
+#include <map>
+#include <set>
+
+namespace {
+
+using namespace Veldrin;
+using namespace Veldrin::Geometry;
+using Math::float3;
+
+/// The area vector of a polygon around its first corner: twice its area long, towards where it is counter-clockwise.
+float3 areaVector(std::vector<float3> const& points, std::vector<unsigned int> const& face)
+{
+    float3 sum;
+    for (std::size_t i = 2; i < face.size(); ++i)
+        sum = sum + cross(points[face[i - 1]] - points[face[0]], points[face[i]] - points[face[0]]);
+    return sum;
+}
+
+float3 center(std::vector<float3> const& points, std::vector<unsigned int> const& face)
+{
+    float3 sum;
+    for (unsigned int corner : face)
+        sum = sum + points[corner];
+    return sum * (1.0f / static_cast<float>(face.size()));
+}
+
+/// Every edge has one face on either side, running against each other, and the surface is a sphere's.
+void expectClosedSphere(Object const& mesh, std::size_t pointCount, std::size_t faceCount)
+{
+    auto const faces = support::facesOf(mesh);
+    ASSERT_EQ(faces.size(), faceCount);
+    ASSERT_EQ(getElementCount(mesh, sFaceComp), faceCount);
+    ASSERT_EQ(getElementCount(mesh, sPointComp), pointCount);
+    std::map<std::pair<unsigned int, unsigned int>, int> edges;
+    std::set<unsigned int> used;
+    for (auto const& face : faces)
+        for (std::size_t i = 0; i < face.size(); ++i) {
+            ++edges[{face[i], face[(i + 1) % face.size()]}];
+            used.insert(face[i]);
+        }
+    for (auto const& [edge, count] : edges) {
+        EXPECT_EQ(count, 1) << edge.first << " " << edge.second;
+        EXPECT_EQ(edges.count({edge.second, edge.first}), 1u) << edge.first << " " << edge.second;
+    }
+    EXPECT_EQ(used.size(), pointCount);
+    EXPECT_EQ(pointCount + faceCount, edges.size() / 2 + 2);
+}
+
+TEST(Primitives, ACubeHasItsTablesAndFacesOutwards)
+{
+    auto const cube = support::filled([](Object& object) { populateCubeMesh(2, object); });
+    EXPECT_TRUE(Object::isA(*cube, *getMeshPrototype()));
+    expectClosedSphere(*cube, 8, 6);
+    auto const points = support::valuesIn<float3>(*cube, sPointPosition);
+    std::vector<float3> const expected{{-1, -1, -1}, {1, -1, -1}, {1, -1, 1}, {-1, -1, 1},
+                                       {-1, 1, -1},  {1, 1, -1},  {1, 1, 1},  {-1, 1, 1}};
+    EXPECT_EQ(points, expected);
+    support::Polygons const faces{{0, 1, 2, 3}, {4, 7, 6, 5}, {2, 6, 7, 3}, {0, 4, 5, 1}, {4, 0, 3, 7}, {1, 5, 6, 2}};
+    EXPECT_EQ(support::facesOf(*cube), faces);
+
+    auto const normals = support::valuesIn<float3>(*cube, sFaceVertexNormal);
+    auto const indices = support::valuesIn<unsigned int>(*cube, "face_vertex_normal_index", sIndices);
+    ASSERT_EQ(normals.size(), 6u);
+    ASSERT_EQ(indices.size(), 24u);
+    for (unsigned int face = 0; face < 6; ++face) {
+        // A face's area is 4.
+        EXPECT_EQ(areaVector(points, faces[face]), normals[face] * 8.0f) << face;
+        EXPECT_EQ(center(points, faces[face]), normals[face]) << face;
+        for (unsigned int corner = 4 * face; corner < 4 * face + 4; ++corner)
+            EXPECT_EQ(indices[corner], face);
+    }
+    EXPECT_EQ(support::names(getTargetChain(*cube, sFaceVertexNormal)),
+              (std::vector<std::string>{"face_vertex_normal", "face_vertex_normal_index", "face_vertex_component"}));
+    EXPECT_EQ(support::names(cube->keys()).back(), "face_vertex_normal");
+    EXPECT_TRUE(getRangeGeoProperty(*cube, "face_vertex_normal_index"));
+}
+
+TEST(Primitives, APlaneOfOneQuadIsTheDefault)
+{
+    for (unsigned int subdivisions : {0u, 1u}) {
+        auto const plane = createObject();
+        ASSERT_TRUE(populatePlaneMesh(2, subdivisions, *plane));
+        EXPECT_EQ(support::valuesIn<float3>(*plane, sPointPosition),
+                  (std::vector<float3>{{-1, 0, 1}, {1, 0, 1}, {-1, 0, -1}, {1, 0, -1}}));
+        EXPECT_EQ(support::facesOf(*plane), (support::Polygons{{0, 1, 3, 2}}));
+        EXPECT_EQ(plane->size(), 6u);
+    }
+}
+
+TEST(Primitives, APlaneTooLargeForItsCountsLeavesTheObjectUntouched)
+{
+    // 32768: corners. 65535: points. 65536 and more: products that wrap around in 32 and in 64 bits.
+    for (unsigned int subdivisions : {32768u, 65535u, 65536u, 0x80000000u, 0xFFFFFFFFu}) {
+        auto const plane = createObject();
+        EXPECT_FALSE(populatePlaneMesh(1, subdivisions, *plane)) << subdivisions;
+        EXPECT_TRUE(plane->empty());
+    }
+}
+
+TEST(Primitives, ASphereIsClosedFacesOutwardsAndCarriesItsNormals)
+{
+    auto const sphere = support::filled([](Object& object) { populateSphereMesh(2, object); });
+    EXPECT_TRUE(Object::isA(*sphere, *getMeshPrototype()));
+    expectClosedSphere(*sphere, 22, 25);
+    auto const points = support::valuesIn<float3>(*sphere, sPointPosition);
+    auto const faces = support::facesOf(*sphere);
+    for (std::size_t face = 0; face < faces.size(); ++face) {
+        EXPECT_EQ(faces[face].size(), face < 15 ? 4u : 3u);
+        EXPECT_GT(dot(areaVector(points, faces[face]), center(points, faces[face])), 0.1f) << face;
+    }
+    auto const normals = support::valuesIn<float3>(*sphere, sPointNormal);
+    ASSERT_EQ(normals.size(), 22u);
+    for (std::size_t i = 0; i < 22; ++i) {
+        EXPECT_NEAR(length(points[i]), 2, 2e-6f) << i;
+        EXPECT_NEAR(length(normals[i]), 1, 2e-6f) << i;
+        EXPECT_GT(dot(points[i], normals[i]), 1.95f) << i;
+    }
+    // Entries that break the table's symmetry, or that no invariant above would miss.
+    EXPECT_EQ(points[1], (float3{-0.475528f, -0.809017f, -0.345492f} * 2.0f));
+    EXPECT_EQ(points[17], (float3{-0.475528f, 0.809017f, 0.345491f} * 2.0f));
+    EXPECT_EQ(normals[2], (float3{-0.564703f, -0.716086f, 0.410281f}));
+    EXPECT_EQ(normals[9], (float3{0.961091f, -0.276231f, 0}));
+    EXPECT_EQ(getTargetComponent(*sphere, sPointNormal), "point_component");
+}
+
+TEST(Primitives, ANegativeRadiusMirrorsPointsAndNegatesNormals)
+{
+    auto const outside = support::filled([](Object& object) { populateSphereMesh(1, object); });
+    auto const inside = support::filled([](Object& object) { populateSphereMesh(-1, object); });
+    for (char const* name : {sPointPosition, sPointNormal}) {
+        auto const a = support::valuesIn<float3>(*outside, name);
+        auto const b = support::valuesIn<float3>(*inside, name);
+        ASSERT_EQ(a.size(), 22u);
+        for (std::size_t i = 0; i < a.size(); ++i)
+            EXPECT_EQ(a[i] * -1.0f, b[i]) << name << " " << i;
+    }
+    auto const nothing = support::filled([](Object& object) { populateSphereMesh(0, object); });
+    EXPECT_EQ(support::valuesIn<float3>(*nothing, sPointNormal), support::valuesIn<float3>(*outside, sPointNormal));
+}
+
+} // namespace

@@ -1,0 +1,120 @@
+#include <support/Geometry.h>
+#include <veldrin/geometry/Prototypes.h>
+
+#include <gmock/gmock.h>
+
+#include <barrier>
+#include <thread>
+
+namespace {
+
+using namespace Veldrin;
+using namespace Veldrin::Geometry;
+
+using ObjectPtr = Nexil::Ptr<Object>;
+
+struct KindOfGeometry {
+    void (*populate)(Object&);
+    ObjectPtr (*prototype)();
+};
+
+KindOfGeometry const kKinds[] = {
+    {&populateVolume, &getVolumePrototype},
+    {&populateInstances, &getInstancesPrototype},
+    {&populateMesh, &getMeshPrototype},
+    {&populateStrand, &getStrandPrototype},
+    {&populatePointCloud, &getPointCloudPrototype},
+    {&populateLevelSet, &getLevelSetPrototype},
+    {&populateFogVolume, &getFogVolumePrototype},
+};
+
+TEST(Prototypes, EachKindIsToldFromTheOthers)
+{
+    // Rows: volume, instances, mesh, strand, point cloud, level set, fog volume. What has points is a point cloud too.
+    char const* const isKind[] = {"1000000", "0100000", "0010100", "0001100", "0000100", "1000010", "1000001"};
+    for (std::size_t i = 0; i < std::size(kKinds); ++i) {
+        auto const object = support::filled(kKinds[i].populate);
+        setProperty(*object, "anything", 1);
+        setProperty(*object, "more", ObjectPtr());
+        std::string row;
+        for (auto const& kind : kKinds)
+            row += Object::isA(*object, *kind.prototype()) ? '1' : '0';
+        EXPECT_EQ(row, isKind[i]) << i;
+    }
+    auto const types = getGeometryTypes();
+    ASSERT_EQ(types->size(), 5u);
+    for (std::size_t i = 0; i < 5; ++i)
+        EXPECT_EQ((*types)[i], kKinds[i].prototype()) << i;
+}
+
+TEST(Prototypes, AWrongTypeAnywhereInsideIsNotOfTheKind)
+{
+    auto const spoil = [](char const* part, char const* key, Nexil::Any&& value) {
+        auto const mesh = support::filled([](Object& object) { populateCubeMesh(1, object); });
+        Nexil::MutablePtr<Object> own(support::part(*mesh, part));
+        own->setPropertyAny(key, std::move(value));
+        setProperty(*mesh, part, std::move(own));
+        return Object::isA(*mesh, *getMeshPrototype());
+    };
+    EXPECT_TRUE(spoil(sPointPosition, sDefault, Math::float3{1, 2, 3}));
+    EXPECT_FALSE(spoil(sPointPosition, sData, support::array<Math::float4>({})));
+    EXPECT_FALSE(spoil(sPointPosition, sInterp, 1u));
+    EXPECT_FALSE(spoil(sPointPosition, sTarget, Nexil::Any()));
+    EXPECT_FALSE(spoil(sFaceOffset, sDefault, -1));
+    EXPECT_FALSE(spoil(sFaceComp, sCount, 6));
+}
+
+TEST(Prototypes, DataIsAskedForByName)
+{
+    auto const generic = getDataGeoPropPrototype(sGenericDataGeoProp);
+    EXPECT_EQ(getDataGeoPropPrototype("no_such_property"), generic);
+    EXPECT_NE(getDataGeoPropPrototype(""), generic);
+    EXPECT_TRUE(Object::isA(*getDataGeoPropPrototype(""), *generic));
+    EXPECT_TRUE(Object::isA(*generic, *getDataGeoPropPrototype("")));
+    // Components and ranges of the prototypes are no data.
+    for (char const* name : {sPointComp, sVoxelTileTree, sVoxelSignedDistance, sCount})
+        EXPECT_EQ(getDataGeoPropPrototype(name), generic) << name;
+    EXPECT_EQ(getDataGeoPropPrototype(sPointPosition), support::part(*getMeshPrototype(), sPointPosition));
+    EXPECT_EQ(getDataGeoPropPrototype(sStrandOffset), support::part(*getStrandPrototype(), sStrandOffset));
+    EXPECT_EQ(getDataGeoPropPrototype(sInstanceShape), support::part(*getInstancesPrototype(), sInstanceShape));
+
+    EXPECT_EQ(getElementCount(*getComponentGeoPropPrototype()), 0u);
+    EXPECT_TRUE(getComponentGeoPropPrototype()->hasProperty(sCount));
+}
+
+TEST(Prototypes, ClearingBuildsNewOnesAndLeavesThoseOfCallersAlone)
+{
+    auto const before = getMeshPrototype();
+    EXPECT_EQ(before, getMeshPrototype());
+    clearGeometryPrototypes();
+    clearGeometryPrototypes();
+    auto const after = getMeshPrototype();
+    EXPECT_NE(before, after);
+    EXPECT_EQ(support::dump(*before), support::dump(*after));
+}
+
+TEST(Prototypes, FirstQuestionsFromManyThreadsAgree)
+{
+    constexpr int threadCount = 4;
+    constexpr int roundCount = 50;
+    std::vector<std::vector<ObjectPtr>> answers(threadCount);
+    std::barrier turn(threadCount);
+    {
+        std::vector<std::jthread> threads;
+        for (int t = 0; t < threadCount; ++t)
+            threads.emplace_back([&, t] {
+                for (int round = 0; round < roundCount; ++round) {
+                    if (t == 0)
+                        clearGeometryPrototypes();
+                    turn.arrive_and_wait();
+                    answers[t].push_back(round % 2 ? getMeshPrototype() : getDataGeoPropPrototype(sFaceOffset));
+                    turn.arrive_and_wait();
+                }
+            });
+    }
+    for (int t = 1; t < threadCount; ++t)
+        EXPECT_TRUE(answers[t] == answers[0]) << t;
+    EXPECT_NE(answers[0][0], answers[0][2]);
+}
+
+} // namespace

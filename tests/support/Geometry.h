@@ -1,0 +1,117 @@
+#pragma once
+
+#include <nexil/Array.h>
+#include <veldrin/geometry/DebugDump.h>
+#include <veldrin/geometry/GeoProperties.h>
+#include <veldrin/geometry/Population.h>
+#include <veldrin/object/Properties.h>
+
+#include <tbb/global_control.h>
+
+#include <cstdint>
+#include <initializer_list>
+#include <string>
+#include <vector>
+
+/// Builders and readers of geometry for tests.
+namespace support {
+
+template <class T>
+Nexil::Ptr<Nexil::Array<T>> array(std::vector<T> const& values)
+{
+    Nexil::Array<T> made;
+    for (auto const& value : values)
+        made.push_back(value);
+    return Nexil::makePtr<Nexil::Array<T>>(std::move(made));
+}
+
+using Polygons = std::vector<std::vector<unsigned int>>;
+
+/// A mesh with these corners per face.
+inline Nexil::MutablePtr<Veldrin::Object> mesh(std::vector<Veldrin::Math::float3> const& points, Polygons const& faces)
+{
+    std::vector<unsigned int> corners;
+    std::vector<unsigned int> offsets{0};
+    for (auto const& face : faces) {
+        corners.insert(corners.end(), face.begin(), face.end());
+        offsets.push_back(static_cast<unsigned int>(corners.size()));
+    }
+    auto made = Veldrin::createObject();
+    Veldrin::Geometry::populateMesh(array(points), array(corners), array(offsets), *made);
+    return made;
+}
+
+/// An object filled by one of the populate functions.
+template <class Populate>
+Nexil::MutablePtr<Veldrin::Object> filled(Populate const& populate)
+{
+    auto object = Veldrin::createObject();
+    populate(*object);
+    return object;
+}
+
+/// The object stored under a name; null when there is none.
+inline Nexil::Ptr<Veldrin::Object> part(Veldrin::Object const& geometry, char const* name)
+{
+    return Veldrin::getPropertyAs<Nexil::Ptr<Veldrin::Object>>(geometry, name);
+}
+
+/// The array under `key` of the object under `name`; null when it is not there or of another type.
+template <class T>
+Nexil::Ptr<Nexil::Array<T>> arrayIn(Veldrin::Object const& geometry, char const* name,
+                                    char const* key = Veldrin::Geometry::sData)
+{
+    auto const object = part(geometry, name);
+    return object ? Veldrin::getPropertyAs<Nexil::Ptr<Nexil::Array<T>>>(*object, key) : nullptr;
+}
+
+/// Its elements; none when it is not there.
+template <class T>
+std::vector<T> valuesIn(Veldrin::Object const& geometry, char const* name, char const* key = Veldrin::Geometry::sData)
+{
+    auto const values = arrayIn<T>(geometry, name, key);
+    return values ? std::vector<T>(values->begin(), values->end()) : std::vector<T>();
+}
+
+/// The corners of each face.
+inline Polygons facesOf(Veldrin::Object const& mesh)
+{
+    auto const corners = valuesIn<unsigned int>(mesh, Veldrin::Geometry::sFaceVertex);
+    auto const offsets = valuesIn<unsigned int>(mesh, Veldrin::Geometry::sFaceOffset);
+    Polygons faces;
+    for (std::size_t face = 0; face + 1 < offsets.size(); ++face)
+        faces.emplace_back(corners.begin() + offsets[face], corners.begin() + offsets[face + 1]);
+    return faces;
+}
+
+inline std::vector<std::string> names(Nexil::Array<Nexil::String> const& list)
+{
+    std::vector<std::string> result;
+    for (Nexil::String const& name : list)
+        result.emplace_back(name.view());
+    return result;
+}
+
+/// The object's debug dump.
+inline std::string dump(Veldrin::Object const& object, unsigned long long maxElements = 8)
+{
+    struct Sink : Veldrin::Geometry::Internal::DebugDumpInterface {
+        void write(char const* bytes, std::uint64_t length) override { text.append(bytes, length); }
+        std::string text;
+    } sink;
+    Veldrin::Geometry::Internal::debugDumpToStream(sink, object, maxElements);
+    return sink.text;
+}
+
+/// Calls check() with the parallel loops on at most 1, 2, 3 and all threads in turn.
+template <class Check>
+void onThreadCounts(Check const& check)
+{
+    for (std::size_t threads : {1, 2, 3}) {
+        tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, threads);
+        check();
+    }
+    check();
+}
+
+} // namespace support

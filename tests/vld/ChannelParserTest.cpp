@@ -1,0 +1,72 @@
+#include <vld/ChannelParser.h>
+
+#include <gtest/gtest.h>
+
+#include <regex>
+#include <string>
+#include <vector>
+
+namespace {
+
+using VLD::Utils::ChannelParser;
+
+std::vector<std::string> wordsUpTo(std::size_t length, std::string const& letters)
+{
+    std::vector<std::string> words{""};
+    for (std::size_t first = 0, round = 0; round < length; ++round) {
+        std::size_t const last = words.size();
+        for (; first < last; ++first)
+            for (char letter : letters)
+                words.push_back(words[first] + letter);
+    }
+    return words;
+}
+
+std::regex regexOf(std::string const& pattern)
+{
+    std::string text;
+    for (char c : pattern)
+        text += c == '*' ? "[^]*" : c == '?' ? "[^]" : c == '.' ? "\\." : std::string(1, c);
+    return std::regex(text);
+}
+
+TEST(ChannelParser, AcceptsWhatTheEqualRegularExpressionAccepts)
+{
+    auto const names = wordsUpTo(5, "ab.");
+    for (std::string const& pattern : wordsUpTo(4, "a.*?")) {
+        ChannelParser parser;
+        ASSERT_EQ(parser.parses(pattern.c_str()), !pattern.empty());
+        auto const regex = regexOf(pattern);
+        for (std::string const& name : names)
+            ASSERT_EQ(parser.accepts(name.c_str()), !pattern.empty() && std::regex_match(name, regex))
+                << "'" << pattern << "' on '" << name << "'";
+    }
+}
+
+TEST(ChannelParser, ANameEqualToThePatternMatchesAndAnEmptyPatternEndsTheFormerOne)
+{
+    ChannelParser parser;
+    EXPECT_FALSE(parser.accepts("voxel_fuel"));
+    for (char const* text : {"voxel_fuel", "a*b", "?", "[a-z]+", "a\nb", "*"}) {
+        EXPECT_TRUE(parser.parses(text));
+        EXPECT_TRUE(parser.accepts(text)) << text;
+    }
+    EXPECT_FALSE(parser.parses(""));
+    EXPECT_FALSE(parser.accepts("voxel_fuel"));
+    EXPECT_FALSE(parser.accepts(""));
+}
+
+TEST(ChannelParser, ManyStarsAgainstALongNameEnd)
+{
+    std::string stars;
+    for (int i = 0; i < 40; ++i)
+        stars += "*a";
+    std::string const name(50000, 'a');
+    ChannelParser parser;
+    parser.parses(stars.c_str());
+    EXPECT_TRUE(parser.accepts(name.c_str()));
+    parser.parses((stars + "b").c_str());
+    EXPECT_FALSE(parser.accepts(name.c_str()));
+}
+
+} // namespace
