@@ -93,8 +93,8 @@ def addresses_item(addresses, level=0):
     return frame(362, obj(serialize_handle_addresses=frame(123, addresses_of(addresses, level))))
 
 
-def mark(item, role):
-    return xxhash.xxh3_64_intdigest(item) & ~3 | role
+def mark(item, role, entries=1, compressed=False):
+    return xxhash.xxh3_64_intdigest(item, 8 * entries + 4 * compressed + role) & ~3 | role
 
 
 def stream(items, entries=None, table=None, offset=None, head=None, **options):
@@ -104,14 +104,15 @@ def stream(items, entries=None, table=None, offset=None, head=None, **options):
     """
     head = header(**options) if head is None else head
     hashed = options.get("version", 6) > 5
+    compressed = options.get("level", 0) > 0
     entries = [(number, 1) for number in range(len(items))] if entries is None else entries
     position, positions = len(head) + 9, []
     for item in items:
         positions.append(position)
         position += len(item)
     if table is None:
-        table = b"".join(pack(positions[number]) + pack(mark(items[number], role) if hashed else role)
-                         for number, role in entries)
+        marks = [mark(items[number], role, len(entries), compressed) if hashed else role for number, role in entries]
+        table = b"".join(pack(positions[number]) + pack(mark) for (number, _), mark in zip(entries, marks))
     offset = b"\xcf" + struct.pack(">Q", position) if offset is None else offset
     return head + offset + b"".join(items) + table
 
@@ -430,6 +431,11 @@ def bad_tables():
         [array, frame(362, obj(a=frame(122, pack(1)), b=frame(122, pack(2))))], [(1, 1), (0, 0), (0, 0)]), HANDLES
     yield "table_twin_mark_differs", stream([item], table=record + pack(first) + pack(mark(other, 1))), HANDLES
     yield "checksum_item_flipped", patched(good, first + 5, good[first + 5] ^ 1), SUM
+    slots = stream([item], [(0, 1), (0, 1)])
+    yield "checksum_last_record_cut", slots[:-10], SUM
+    sharing = stream([item, frame(362, obj(held=frame(362, pack(1))))], [(1, 1), (0, 0)])
+    yield "checksum_role_changed", patched(sharing, len(sharing) - 1, sharing[-1] | 1), SUM
+    yield "checksum_level_changed", patched(good, 59, 0x01), SUM
     yield "checksum_mark_flipped", patched(good, len(good) - 1, good[-1] ^ 4), SUM
     packed = one(frame(122, u32s(range(400), 9)), level=9)
     yield "checksum_chunk_flipped", patched(packed, 250, packed[250] ^ 1), SUM

@@ -239,7 +239,8 @@ class Stream:
         for position, end in self.ends.items():
             mark = self.records[self.sharers[position][0]][1]
             if self.version > 5:
-                check(xxhash.xxh3_64_intdigest(self.data[position:end]) >> 2 == mark >> 2, "Checksum mismatch")
+                seed = 8 * len(self.records) + 4 * (self.level > 0) + (mark & 3)
+                check(xxhash.xxh3_64_intdigest(self.data[position:end], seed) >> 2 == mark >> 2, "Checksum mismatch")
             item, stop = decode(self.data, position, end)
             check(stop == end, "Corrupt handles")
             check(is_list(item, 2) and is_uint(item[0]))
