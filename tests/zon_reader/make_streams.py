@@ -435,7 +435,7 @@ def bad_tables():
     yield "checksum_last_record_cut", slots[:-10], SUM
     sharing = stream([item, frame(362, obj(held=frame(362, pack(1))))], [(1, 1), (0, 0)])
     yield "checksum_role_changed", patched(sharing, len(sharing) - 1, sharing[-1] | 1), SUM
-    yield "checksum_level_changed", patched(good, 59, 0x01), SUM
+    yield "checksum_level_changed", patched(good, 60, 0x01), SUM
     yield "checksum_mark_flipped", patched(good, len(good) - 1, good[-1] ^ 4), SUM
     packed = one(frame(122, u32s(range(400), 9)), level=9)
     yield "checksum_chunk_flipped", patched(packed, 250, packed[250] ^ 1), SUM
