@@ -1,14 +1,12 @@
 #pragma once
 
 #include <veldrin/io/internal/ByteSink.h>
-#include <veldrin/io/internal/Msgpack.h>
+#include <veldrin/io/internal/Packer.h>
 
 #include <cstddef>
 #include <cstdint>
 
 namespace Veldrin::IO {
-
-using Packer = msgpack::packer<ByteSink>;
 
 /// Writes plain values as a chunk list, [count, [chunk, ...]]. Throws `Nexil::String`.
 ///

@@ -140,13 +140,20 @@ namespace {
                 V5::FileEntry const& entry = entries_[index];
                 if (items_.empty() || items_.back().position != entry.position)
                     items_.push_back({entry.position, entry.mark});
-                else if (items_.back().mark != entry.mark || roleOf(entry) != EntryRole::TopLevel)
+                else if (comparedMark(items_.back().mark) != comparedMark(entry.mark) ||
+                         roleOf(entry) != EntryRole::TopLevel)
                     throwCorruptHandles();
                 itemOfEntry_[index] = items_.size() - 1;
             }
             std::uint64_t const first = items_.empty() ? itemsEnd_ : items_.front().position;
             if (first != itemsBegin_ || (!items_.empty() && items_.back().position >= itemsEnd_))
                 throwCorruptHandles();
+        }
+
+        /// What of a mark has a meaning: all of it with hashes, the role alone without.
+        [[nodiscard]] std::uint64_t comparedMark(std::uint64_t mark) const noexcept
+        {
+            return hasHashes_ ? mark : mark & kRoleMask;
         }
 
         void readItem(std::size_t number)

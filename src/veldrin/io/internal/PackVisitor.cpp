@@ -68,11 +68,11 @@ void PackVisitor::packObject(Object const& object)
     properties.reserve(keys.size());
     for (Nexil::String const& key : keys) {
         Nexil::Any value = object.getProperty(key);
-        StreamType const& type = streamTypeOf(value);
-        if (!value.empty() && type.code == TypeCode::kUnknown)
+        StreamType const* const type = value.empty() ? nullptr : &streamTypeOf(value);
+        if (type && type->code == TypeCode::kUnknown)
             warnOfUnknown(key, value);
         else
-            properties.push_back({key, std::move(value), value.empty() ? nullptr : &type});
+            properties.push_back({key, std::move(value), type});
     }
     if (properties.size() > kMaxItems / 2)
         throw Nexil::String("Object has too many properties");
@@ -120,7 +120,7 @@ void PackVisitor::packPayload(Nexil::Any const& value, StreamType const& type)
     for (auto const id : location.ids)
         packer_.pack_unsigned_int(id);
     for (auto const parameter : location.params)
-        packer_.pack_float(parameter);
+        packer_.packFloat(parameter);
     packElement(location.indices);
     packElement(location.weights);
 }
@@ -208,8 +208,8 @@ void PackVisitor::packScalar(unsigned int code, std::byte const* bytes)
     case 5: packer_.pack_short(loadAs<short>(bytes)); break;
     case 6: packer_.pack_int(loadAs<int>(bytes)); break;
     case 7: packer_.pack_long_long(loadAs<long long>(bytes)); break;
-    case 8: packer_.pack_float(loadAs<float>(bytes)); break;
-    case 9: packer_.pack_double(loadAs<double>(bytes)); break;
+    case 8: packer_.packFloat(loadAs<float>(bytes)); break;
+    case 9: packer_.packDouble(loadAs<double>(bytes)); break;
     default: loadAs<unsigned char>(bytes) != 0 ? packer_.pack_true() : packer_.pack_false(); break;
     }
 }
