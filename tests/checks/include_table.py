@@ -52,7 +52,7 @@ TABLE = {
     "veldrin/volume": Row(GEOMETRY, VOLUME_BASE),
     # Validators and the stream know volumes as geometry objects, through the bridge.
     "veldrin/validation": Row(GEOMETRY, VOLUME_BASE + ["veldrin/volume"]),
-    "veldrin/io": Row(GEOMETRY, VOLUME_BASE + ["veldrin/volume"], ["msgpack.hpp", "blosc.h", "xxhash.h"]),
+    "veldrin/io": Row(GEOMETRY, VOLUME_BASE + ["veldrin/volume"], ["msgpack.hpp", "blosc.h", "xxhash.h", "xxh_x86dispatch.h"]),
     # The header that includes every installed one.
     "veldrin": Row(GEOMETRY, ["nexil", "lattix", "vld", "veldrin/*"]),
 }
@@ -60,7 +60,7 @@ TABLE = {
 # Folders every row may use inside the libraries, though nothing of it is installed.
 SHARED_PRIVATE = "nexil/parallel"
 # What the libraries are built with is nothing that programs on top of them may lean on.
-OUR_OWN_SYSTEMS = ["tbb/*", "oneapi/tbb/*", "msgpack.hpp", "blosc.h", "xxhash.h"]
+OUR_OWN_SYSTEMS = ["tbb/*", "oneapi/tbb/*", "msgpack.hpp", "blosc.h", "xxhash.h", "xxh_x86dispatch.h"]
 
 INCLUDE = re.compile(r'^\s*#\s*include\s*([<"])([^>"]+)[>"]')
 SOURCES = (".h", ".cpp")

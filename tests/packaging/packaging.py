@@ -56,6 +56,13 @@ def build_consumer(work, source, cmake, compiler, *definitions):
     return os.path.join(build, "consumer")
 
 
+def settings_of(build, *names):
+    """-D options that repeat settings of a build, so that the compiler cache has seen the same commands."""
+    with open(os.path.join(build, "CMakeCache.txt"), encoding="utf-8") as cache:
+        entries = dict(re.findall(r"^(\w+):\w+=(.*)$", cache.read(), re.MULTILINE))
+    return [f"-D{name}={entries[name]}" for name in names if entries.get(name)]
+
+
 def main():
     if len(sys.argv) != 6:
         sys.exit(__doc__)
@@ -65,7 +72,8 @@ def main():
         if way == "subdirectory":
             launcher = shutil.which("ccache")
             consumer = build_consumer(work, os.path.join(here, "subdirectory"), cmake, compiler,
-                                      f"-DVELDRIN_SOURCE={source}", "-DCMAKE_BUILD_TYPE=Release",
+                                      f"-DVELDRIN_SOURCE={source}",
+                                      *settings_of(build, "CMAKE_BUILD_TYPE", "VELDRIN_WARNINGS_AS_ERRORS"),
                                       *([f"-DCMAKE_CXX_COMPILER_LAUNCHER={launcher}"] if launcher else []))
             environment = None
         else:
