@@ -1,0 +1,148 @@
+#include <support/StreamDescription.h>
+#include <support/Streams.h>
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <sys/resource.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace {
+
+namespace fs = std::filesystem;
+
+std::string valid(std::string const& name)
+{
+    return support::fileBytes(VELDRIN_TEST_CORPUS "/streams/valid/" + name + ".zon");
+}
+
+/// Small streams of both kinds of chunks that together hold sharing, repeated and null slots, handles, every framing.
+std::vector<std::string> sweptStreams()
+{
+    std::vector<std::string> streams;
+    for (char const* name : {"v6_walk", "v6_slots", "v6_slot_in_slot", "v6_handles", "v6_handles_level9", "v6_empty",
+                             "v6_shared_everywhere", "v6_names"})
+        for (int const level : {0, 9}) {
+            auto const objects = support::read(valid(name)).objects;
+            streams.push_back(support::written(objects, level));
+        }
+    streams.push_back(valid("v6_handles"));
+    streams.push_back(valid("v6_handles_level9"));
+    return streams;
+}
+
+/// A refusal says why in one message, or nothing when the version reads as 0.
+void expectRefusedOrEqual(std::string const& bytes, std::string const& original, std::string const& what)
+{
+    auto const result = support::read(bytes);
+    if (result.isRead)
+        EXPECT_EQ(support::describeObjects(result.objects), original) << what;
+    else
+        EXPECT_LE(result.errors.size(), 1u) << what;
+    EXPECT_TRUE(result.isRead || result.objects.empty()) << what;
+    EXPECT_TRUE(!result.isRead || result.errors.empty()) << what;
+}
+
+TEST(HostileStream, NoBeginningOfAStreamIsReadAsSomethingElse)
+{
+    for (std::string const& stream : sweptStreams()) {
+        std::string const original = support::describeObjects(support::read(stream).objects);
+        for (std::size_t size = 0; size < stream.size(); ++size) {
+            auto const result = support::read(stream.substr(0, size));
+            EXPECT_FALSE(result.isRead) << size << " of " << stream.size();
+            EXPECT_EQ(result.errors.size(), 1u) << size << " of " << stream.size();
+        }
+    }
+}
+
+TEST(HostileStream, NoFlippedByteIsReadAsSomethingElse)
+{
+    for (std::string const& stream : sweptStreams()) {
+        std::string const original = support::describeObjects(support::read(stream).objects);
+        for (std::size_t at = 0; at < stream.size(); ++at)
+            for (int const flip : {0x01, 0x02, 0x04, 0x08, 0x10, 0x20, 0x40, 0x80, 0xFF}) {
+                std::string flipped = stream;
+                flipped[at] = static_cast<char>(flipped[at] ^ flip);
+                expectRefusedOrEqual(flipped, original, "byte " + std::to_string(at) + " ^ " + std::to_string(flip));
+            }
+    }
+}
+
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr bool kMeasuresMemory = false; // the sanitizer's own shadow would be measured
+#else
+constexpr bool kMeasuresMemory = true;
+#endif
+
+/// Peak memory in KiB that a process of its own needs to read the bytes, beyond what it has before.
+long peakKibibytes(std::string const& bytes)
+{
+    int channel[2];
+    if (pipe(channel) != 0)
+        return -1;
+    pid_t const child = fork();
+    if (child == 0) {
+        rusage before{};
+        getrusage(RUSAGE_SELF, &before);
+        support::read(bytes);
+        rusage after{};
+        getrusage(RUSAGE_SELF, &after);
+        long const grown = after.ru_maxrss - before.ru_maxrss;
+        _exit(write(channel[1], &grown, sizeof(grown)) == sizeof(grown) ? 0 : 1);
+    }
+    close(channel[1]);
+    long grown = -1;
+    int status = 0;
+    bool const isTold = ::read(channel[0], &grown, sizeof(grown)) == sizeof(grown);
+    close(channel[0]);
+    waitpid(child, &status, 0);
+    return isTold && WIFEXITED(status) ? grown : -1;
+}
+
+TEST(HostileStream, NoStreamTakesMuchMoreMemoryThanItsSize)
+{
+    if (!kMeasuresMemory)
+        GTEST_SKIP() << "memory is measured in builds without sanitizers";
+    std::vector<std::pair<std::string, std::string>> bombs;
+    for (auto const& entry : fs::directory_iterator(VELDRIN_TEST_CORPUS "/streams/bad"))
+        if (entry.path().extension() == ".zon" && entry.path().filename().string().find("bomb") != std::string::npos)
+            bombs.emplace_back(entry.path().filename().string(), support::fileBytes(entry.path().string()));
+    ASSERT_GT(bombs.size(), 5u);
+    auto expectModest = [](std::string const& name, std::string const& bytes) {
+        long const peak = peakKibibytes(bytes);
+        ASSERT_GE(peak, 0) << name;
+        EXPECT_LE(peak, static_cast<long>(300 * bytes.size() / 1024) + 64 * 1024) << name << " of " << bytes.size();
+    };
+    for (auto const& [name, bytes] : bombs)
+        expectModest(name, bytes);
+
+    // What expands most: a million of the smallest values, in the old form that needs no checksum.
+    std::string const header = valid("v2");
+    auto const headerSize = header.find("compression_level") + 17 + 3;
+    auto old = [&](std::string const& values) { return header.substr(0, headerSize) + values; };
+    auto list = [](char const* code, std::string const& element) {
+        std::string bytes = std::string("\x92\xA1p\x92", 4) + code + std::string("\xDD\x00\x0F\x42\x40", 5);
+        for (int i = 0; i < 1000000; ++i)
+            bytes += element;
+        return bytes;
+    };
+    std::vector<std::pair<std::string, std::string>> dense;
+    dense.emplace_back("empty objects", old(list("\xCD\x01\x6B", "\x90")));
+    dense.emplace_back("empty strings", old(list("\xCC\x83", "\xA0")));
+    dense.emplace_back("empty arrays", old(list("\xCC\xF2", std::string("\x92\x00\x90", 3))));
+    dense.emplace_back("null pointers", old(list("\xCC\xF2", "\xC0")));
+    std::string properties("\xDD\x00\x1E\x84\x80", 5);
+    for (int i = 0; i < 1000000; ++i) {
+        std::string const name = std::to_string(i);
+        properties += static_cast<char>(0xA0 + name.size()) + name + std::string("\x92\x0A\xC3");
+    }
+    dense.emplace_back("properties", old(properties));
+    for (auto const& [name, bytes] : dense) {
+        EXPECT_TRUE(support::read(bytes).isRead) << name;
+        expectModest(name, bytes);
+    }
+}
+
+} // namespace
