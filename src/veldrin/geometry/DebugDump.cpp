@@ -11,6 +11,8 @@
 #include <type_traits>
 #include <unordered_map>
 #include <unordered_set>
+#include <utility>
+#include <vector>
 
 namespace Veldrin::Geometry::Internal {
 
@@ -136,7 +138,30 @@ namespace {
 
         std::string text() && { return std::move(text_).str(); }
 
-        void writeObject(Object const& object, unsigned int depth)
+        // Objects and lists wait on a stack of their own: a thousand levels are too many for small thread stacks.
+        void write(Object const& object)
+        {
+            openObject(object, nullptr, 0);
+            while (!open_.empty()) {
+                if (open_.back().list)
+                    continueList(open_.back());
+                else
+                    continueObject(open_.back());
+            }
+        }
+
+    private:
+        /// An object or a list whose next key or element is still to be written.
+        struct Open {
+            Object const* object;
+            ObjectPtr holder;
+            Nexil::Array<Nexil::String> keys;
+            ObjectListPtr list;
+            unsigned int depth;
+            std::uint64_t next = 0;
+        };
+
+        void openObject(Object const& object, ObjectPtr holder, unsigned int depth)
         {
             indent(depth);
             if (depth > kMostLevels || isOneRepeatTooMany(object)) {
@@ -144,17 +169,51 @@ namespace {
                 return;
             }
             text_ << "{\n";
-            for (Nexil::String const& key : object.keys()) {
-                indent(depth + 1);
-                text_ << key << ": ";
-                writeProperty(object.getProperty(key), depth);
-                text_ << '\n';
-            }
-            indent(depth);
-            text_ << '}';
+            open_.push_back({&object, std::move(holder), object.keys(), nullptr, depth});
         }
 
-    private:
+        void openList(ObjectListPtr list, unsigned int depth)
+        {
+            indent(depth);
+            text_ << "[\n";
+            open_.push_back({nullptr, nullptr, {}, std::move(list), depth});
+        }
+
+        void continueObject(Open& open)
+        {
+            if (open.next != 0)
+                text_ << '\n';
+            if (open.next == open.keys.size()) {
+                indent(open.depth);
+                text_ << '}';
+                open_.pop_back();
+                return;
+            }
+            Nexil::String const& key = open.keys[open.next++];
+            indent(open.depth + 1);
+            text_ << key << ": ";
+            writeProperty(open.object->getProperty(key), open.depth);
+        }
+
+        void continueList(Open& open)
+        {
+            if (open.next == open.list->size()) {
+                indent(open.depth);
+                text_ << ']';
+                open_.pop_back();
+                return;
+            }
+            if (open.next != 0)
+                text_ << ",\n";
+            ObjectPtr element = (*open.list)[open.next++];
+            if (Object const* object = element.get()) {
+                openObject(*object, std::move(element), open.depth + 1);
+            } else {
+                indent(open.depth + 1);
+                text_ << "(unknown data type)";
+            }
+        }
+
         void indent(unsigned int depth)
         {
             for (unsigned int i = 0; i < depth; ++i)
@@ -178,9 +237,9 @@ namespace {
                 text_ << " (Geometry::Common::DataInterpolationMode)";
             } else if (auto const* object = value.get<ObjectPtr>(); object && *object) {
                 text_ << '\n';
-                writeObject(**object, depth + 1);
+                openObject(**object, *object, depth + 1);
             } else if (auto const* list = value.get<ObjectListPtr>(); list && *list) {
-                writeList(**list, depth);
+                openList(*list, depth + 1);
             } else {
                 if (!Nexil::AnyArray::is_any_array(value))
                     text_ << "(unknown data type)";
@@ -190,24 +249,6 @@ namespace {
                     text_ << "[] 0 elements (array<unknown data type>)";
                 writeSpelledType(value);
             }
-        }
-
-        void writeList(Nexil::Array<ObjectPtr> const& list, unsigned int depth)
-        {
-            indent(depth + 1);
-            text_ << "[\n";
-            for (std::uint64_t i = 0; i < list.size(); ++i) {
-                if (i != 0)
-                    text_ << ",\n";
-                if (list[i]) {
-                    writeObject(*list[i], depth + 2);
-                } else {
-                    indent(depth + 2);
-                    text_ << "(unknown data type)";
-                }
-            }
-            indent(depth + 1);
-            text_ << ']';
         }
 
         void writeKnown(Row const& row, Nexil::Any const& value)
@@ -320,6 +361,7 @@ namespace {
 
         std::ostringstream text_;
         unsigned long long maxElements_;
+        std::vector<Open> open_;
         std::unordered_set<Object const*> written_;
         unsigned int repeatCount_ = 0;
     };
@@ -334,7 +376,7 @@ DebugDumpInterface::~DebugDumpInterface() = default;
 void debugDumpToStream(DebugDumpInterface& sink, Object const& object, unsigned long long maxElements)
 {
     Dump dump(maxElements);
-    dump.writeObject(object, 0);
+    dump.write(object);
     std::string const text = std::move(dump).text();
     sink.write(text.data(), text.size());
 }
