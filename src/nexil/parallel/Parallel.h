@@ -1,13 +1,16 @@
 #pragma once
 
 #include <nexil/JobCancel.h>
+#include <nexil/parallel/PlainThreads.h>
 
 #include <tbb/blocked_range.h>
 #include <tbb/parallel_for.h>
+#include <tbb/parallel_invoke.h>
 #include <tbb/parallel_reduce.h>
 #include <tbb/parallel_sort.h>
 #include <tbb/task_group.h>
 
+#include <algorithm>
 #include <cstddef>
 #include <utility>
 
@@ -32,6 +35,9 @@ void forRange(std::size_t count, std::size_t grain, Body const& body)
         body(std::size_t(0), count);
         return;
     }
+#if defined(NEXIL_PARALLEL_ON_PLAIN_THREADS)
+    PlainThreads::forRange(0, count, grain, PlainThreads::threadCount(), body);
+#else
     tbb::task_group_context context(tbb::task_group_context::isolated);
     tbb::parallel_for(
         tbb::blocked_range<std::size_t>(0, count, grain),
@@ -40,6 +46,19 @@ void forRange(std::size_t count, std::size_t grain, Body const& body)
             body(range.begin(), range.end());
         },
         tbb::auto_partitioner(), context);
+#endif
+}
+
+/// Runs both, one beside the other where a thread is free.
+template <class First, class Second>
+void invoke(First const& first, Second const& second)
+{
+#if defined(NEXIL_PARALLEL_ON_PLAIN_THREADS)
+    PlainThreads::runBoth(first, second);
+#else
+    tbb::task_group_context context(tbb::task_group_context::isolated);
+    tbb::parallel_invoke(first, second, context);
+#endif
 }
 
 /// Folds chunk(begin, end) results left to right over fixed ranges of `grain`: one value for every thread count.
@@ -47,6 +66,9 @@ template <class Value, class Chunk, class Unite>
 [[nodiscard]] Value reduceInOrder(std::size_t count, std::size_t grain, Value const& identity, Chunk const& chunk,
                                   Unite const& unite)
 {
+#if defined(NEXIL_PARALLEL_ON_PLAIN_THREADS)
+    return PlainThreads::reduceInOrder(0, count, grain, PlainThreads::threadCount(), identity, chunk, unite);
+#else
     tbb::task_group_context context(tbb::task_group_context::isolated);
     return tbb::parallel_deterministic_reduce(
         tbb::blocked_range<std::size_t>(0, count, grain), identity,
@@ -55,16 +77,21 @@ template <class Value, class Chunk, class Unite>
             return chunk(range.begin(), range.end(), std::move(value));
         },
         unite, tbb::simple_partitioner(), context);
+#endif
 }
 
 /// Sorts [first, last). Not stable: the order must be total, or equal elements indistinguishable.
 template <class Iterator, class Less>
 void sort(Iterator first, Iterator last, Less const& less)
 {
+#if defined(NEXIL_PARALLEL_ON_PLAIN_THREADS)
+    std::sort(first, last, less);
+#else
     tbb::task_group_context context(tbb::task_group_context::isolated);
     // tbb::parallel_sort takes no context; a loop of one task lends it this one.
     tbb::parallel_for(
         0, 1, [&](int) { tbb::parallel_sort(first, last, less); }, tbb::simple_partitioner(), context);
+#endif
 }
 
 } // namespace Nexil::parallel

@@ -149,7 +149,7 @@ bool serialize(Objects const& objects, Nexil::String const& path, SerializationO
 {
     WriterContext const context{options, false, {}, services};
     return runReported(services, Nexil::String("Cannot write to file: ") + path, [&] {
-        auto const memory = std::make_unique<char[]>(kFileBufferBytes);
+        auto const memory = std::make_unique_for_overwrite<char[]>(kFileBufferBytes);
         std::ofstream file;
         // Once a file is open the buffer can no longer be set.
         file.rdbuf()->pubsetbuf(memory.get(), kFileBufferBytes);

@@ -1,6 +1,7 @@
 #include <veldrin/io/internal/ByteSink.h>
 
 #include <nexil/JobCancel.h>
+#include <nexil/parallel/Parallel.h>
 
 #include <algorithm>
 
@@ -11,8 +12,10 @@ namespace {
     constexpr std::size_t kBufferBytes = std::size_t(64) << 10;
     // Runs from here on skip the buffer.
     constexpr std::size_t kLongRunBytes = std::size_t(16) << 10;
-    // Bytes that are hashed and written at once: the stream finds them in the cache.
-    constexpr std::size_t kPieceBytes = std::size_t(512) << 10;
+    // Bytes that the stream gets at once: between two of them cancellation is asked for.
+    constexpr std::size_t kPieceBytes = std::size_t(1) << 20;
+    // Runs from here on are hashed beside being written: hashing takes a fifth of the time of writing.
+    constexpr std::size_t kHashBesideFromBytes = std::size_t(1) << 20;
 
 } // namespace
 
@@ -30,14 +33,21 @@ void ByteSink::write(char const* bytes, std::size_t byteCount)
         return;
     }
     flush();
-    while (byteCount != 0) {
-        Nexil::Internal::throwIfJobCancelled();
-        std::size_t const piece = std::min(byteCount, kPieceBytes);
+    auto hashRun = [&] {
         if (isHashing_)
-            hash_.add(bytes, piece);
-        put(bytes, piece);
-        bytes += piece;
-        byteCount -= piece;
+            hash_.add(bytes, byteCount);
+    };
+    auto putRun = [&] {
+        for (std::size_t done = 0; done < byteCount; done += kPieceBytes) {
+            Nexil::Internal::throwIfJobCancelled();
+            put(bytes + done, std::min(byteCount - done, kPieceBytes));
+        }
+    };
+    if (byteCount >= kHashBesideFromBytes) {
+        Nexil::parallel::invoke(putRun, hashRun);
+    } else {
+        hashRun();
+        putRun();
     }
 }
 
