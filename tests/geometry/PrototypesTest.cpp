@@ -95,13 +95,13 @@ TEST(Prototypes, ClearingBuildsNewOnesAndLeavesThoseOfCallersAlone)
 
 TEST(Prototypes, FirstQuestionsFromManyThreadsAgree)
 {
-    constexpr int threadCount = 4;
+    constexpr std::size_t threadCount = 4;
     constexpr int roundCount = 50;
     std::vector<std::vector<ObjectPtr>> answers(threadCount);
     std::barrier turn(threadCount);
     {
         std::vector<std::jthread> threads;
-        for (int t = 0; t < threadCount; ++t)
+        for (std::size_t t = 0; t < threadCount; ++t)
             threads.emplace_back([&, t] {
                 for (int round = 0; round < roundCount; ++round) {
                     if (t == 0)
@@ -112,7 +112,7 @@ TEST(Prototypes, FirstQuestionsFromManyThreadsAgree)
                 }
             });
     }
-    for (int t = 1; t < threadCount; ++t)
+    for (std::size_t t = 1; t < threadCount; ++t)
         EXPECT_TRUE(answers[t] == answers[0]) << t;
     EXPECT_NE(answers[0][0], answers[0][2]);
 }

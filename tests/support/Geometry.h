@@ -107,7 +107,7 @@ inline std::string dump(Veldrin::Object const& object, unsigned long long maxEle
 template <class Check>
 void onThreadCounts(Check const& check)
 {
-    for (std::size_t threads : {1, 2, 3}) {
+    for (std::size_t const threads : {1u, 2u, 3u}) {
         tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, threads);
         check();
     }
