@@ -165,8 +165,14 @@ void append(benchmark::State& state)
     }
     state.SetItemsProcessed(state.iterations() * count);
 }
-BENCHMARK(append<Nexil::Array<int>>)->Arg(1000)->Arg(100000000)->Unit(benchmark::kMillisecond);
-BENCHMARK(append<std::vector<int>>)->Arg(1000)->Arg(100000000)->Unit(benchmark::kMillisecond);
+/// The best of several runs counts: under a hypervisor the others also pay for memory that the host has to find first.
+void quickestOfSeveral(benchmark::internal::Benchmark* bench)
+{
+    bench->Arg(1000)->Arg(100000000)->Unit(benchmark::kMillisecond)->Repetitions(5)->ReportAggregatesOnly();
+    bench->ComputeStatistics("min", [](std::vector<double> const& times) { return *std::ranges::min_element(times); });
+}
+BENCHMARK(append<Nexil::Array<int>>)->Apply(quickestOfSeveral);
+BENCHMARK(append<std::vector<int>>)->Apply(quickestOfSeveral);
 
 void populatePlane(benchmark::State& state)
 {
