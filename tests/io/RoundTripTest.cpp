@@ -9,6 +9,8 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <xxhash.h>
+
 namespace {
 
 using Veldrin::createObject;
