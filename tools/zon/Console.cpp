@@ -1,0 +1,89 @@
+#include "Console.h"
+
+#include <fmt/format.h>
+
+#include <unistd.h>
+
+#include <cstdlib>
+#include <system_error>
+
+namespace Zon {
+
+namespace {
+
+    bool hasColor(std::FILE* stream)
+    {
+        char const* const noColor = std::getenv("NO_COLOR");
+        char const* const terminal = std::getenv("TERM");
+        return !(noColor && *noColor) && !(terminal && std::string_view(terminal) == "dumb") &&
+               isatty(fileno(stream)) == 1;
+    }
+
+    constexpr std::uint64_t kBarWidth = 40;
+
+} // namespace
+
+std::string colored(std::FILE* stream, Color color, std::string_view text)
+{
+    if (!hasColor(stream))
+        return std::string(text);
+    int const code = color == Color::Green ? 32 : color == Color::Red ? 31 : color == Color::Yellow ? 33 : 1;
+    return fmt::format("\033[{}m{}\033[0m", code, text);
+}
+
+void error(std::string_view text)
+{
+    fmt::print(stderr, "zon: {} {}\n", colored(stderr, Color::Red, "error:"), text);
+}
+
+void warn(std::string_view text)
+{
+    fmt::print(stderr, "zon: {} {}\n", colored(stderr, Color::Yellow, "warning:"), text);
+}
+
+std::string errorText(int errorNumber)
+{
+    return std::generic_category().message(errorNumber);
+}
+
+std::string counted(std::uint64_t count, std::string_view noun)
+{
+    return fmt::format("{} {}{}", count, noun, count == 1 ? "" : "s");
+}
+
+std::string byteText(std::uint64_t bytes)
+{
+    if (bytes < 1024)
+        return fmt::format("{} B", bytes);
+    double value = static_cast<double>(bytes) / 1024;
+    char const* const units[] = {"KiB", "MiB", "GiB", "TiB"};
+    std::size_t unit = 0;
+    for (; value >= 1024 && unit + 1 < std::size(units); ++unit)
+        value /= 1024;
+    return fmt::format("{:.1f} {}", value, units[unit]);
+}
+
+Progress::Progress(std::string_view label, std::uint64_t total)
+    : label_(label), total_(total), isVisible_(total > 0 && isatty(STDERR_FILENO) == 1)
+{
+}
+
+Progress::~Progress()
+{
+    if (isVisible_ && nextUpdate_ > 0)
+        fmt::print(stderr, "\r\033[K");
+}
+
+void Progress::update(std::uint64_t done)
+{
+    if (!isVisible_ || done < nextUpdate_)
+        return;
+    std::uint64_t const percent = total_ < 100 ? done * 100 / total_ : done / (total_ / 100);
+    std::uint64_t const shown = percent < 100 ? percent : 100;
+    nextUpdate_ = done + total_ / 100 + 1;
+    std::string const bar(shown * kBarWidth / 100, '=');
+    fmt::print(stderr, "\r{} [{:<40}] {:3}%", label_, bar, shown);
+    std::fflush(stderr);
+}
+
+} // namespace Zon

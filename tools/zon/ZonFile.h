@@ -1,0 +1,48 @@
+#pragma once
+
+#include <nexil/Array.h>
+#include <nexil/Ptr.h>
+#include <nexil/RuntimeMessage.h>
+#include <veldrin/object/Object.h>
+
+#include <cstdint>
+#include <string>
+
+/// Reading and writing whole zon files for the subcommands.
+namespace Zon {
+
+using Objects = Nexil::Array<Nexil::Ptr<Veldrin::Object>>;
+
+/// Keeps the library's message of a failure and passes its warnings on.
+class Messages : public Nexil::RuntimeServices {
+public:
+    void logMessage(Nexil::RuntimeMessage message) const override;
+    /// The last error; a text of its own when there was none.
+    [[nodiscard]] std::string errorText() const;
+
+private:
+    mutable std::string error_;
+};
+
+struct ZonHeader {
+    unsigned int version = 0;
+    int level = 0;
+    bool hasHandles = false;
+    /// Position of the first byte behind the header.
+    std::uint64_t size = 0;
+    std::uint64_t fileSize = 0;
+};
+
+/// Errors: Failure when the file cannot be opened or is no zon stream.
+[[nodiscard]] ZonHeader readZonHeader(std::string const& path);
+
+/// Errors: Failure with the library's message.
+[[nodiscard]] Objects readZon(std::string const& path);
+
+/// Writes beside the target and renames. Errors: Failure; the target is as before then.
+void writeZon(Objects const& objects, std::string const& path, int level);
+
+/// Bytes that a stream of these objects takes at this level, without writing one.
+[[nodiscard]] std::uint64_t streamSize(Objects const& objects, int level);
+
+} // namespace Zon

@@ -1,0 +1,55 @@
+#include "Command.h"
+#include "Console.h"
+
+#include <CLI/CLI.hpp>
+
+#include <cerrno>
+#include <cstdio>
+#include <exception>
+#include <new>
+
+namespace {
+
+using namespace Zon;
+
+ExitCode runSubcommand(Run const& run)
+{
+    try {
+        auto const code = run();
+        // A report that did not arrive is a failure whatever it said.
+        if (std::fflush(stdout) != 0 || std::ferror(stdout))
+            throw Failure("standard output: " + errorText(errno));
+        return code;
+    } catch (Failure const& failure) {
+        error(failure.what());
+    } catch (std::bad_alloc const&) {
+        error("out of memory");
+    } catch (std::exception const& exception) {
+        error(exception.what());
+    }
+    return kFailure;
+}
+
+} // namespace
+
+int main(int argumentCount, char** arguments)
+{
+    CLI::App app("Reads, writes and compares zon files: geometry objects in a compressed, checked stream.", "zon");
+    app.require_subcommand(1);
+    app.footer("Exit codes: 0 done; 1 differences, or a damaged file; 2 wrong usage, or a file that cannot be read or "
+               "written.\n'zon SUBCOMMAND --help' tells more.");
+    Run run;
+    addImport(app, run);
+    addExport(app, run);
+    addMake(app, run);
+    addInfo(app, run);
+    addDump(app, run);
+    addVerify(app, run);
+    addDiff(app, run);
+    try {
+        app.parse(argumentCount, arguments);
+    } catch (CLI::ParseError const& wrongUsage) {
+        return app.exit(wrongUsage) == 0 ? kDone : kFailure;
+    }
+    return runSubcommand(run);
+}
