@@ -11,6 +11,7 @@
 #include <fmt/format.h>
 #include <fmt/ranges.h>
 
+#include <algorithm>
 #include <bit>
 #include <cmath>
 #include <cstring>
@@ -165,7 +166,8 @@ namespace {
             if (!element.empty())
                 path.emplace_back(element);
             for (; place != kTop; place = places_[place].parent)
-                path.insert(path.begin(), places_[place].name);
+                path.push_back(places_[place].name);
+            std::reverse(path.begin(), path.end());
             report(std::move(path), std::move(what), std::move(first), std::move(second));
         }
 

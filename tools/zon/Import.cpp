@@ -9,8 +9,10 @@
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
+#include <cctype>
 #include <filesystem>
 #include <memory>
+#include <system_error>
 
 namespace Zon {
 
@@ -65,7 +67,9 @@ namespace {
             objects.push_back(makeObject(std::move(part)));
         }
         writeZon(objects, options.output, options.level);
-        auto const bytes = std::filesystem::file_size(options.output);
+        std::error_code isNoFile; // a pipe or a device has no size
+        auto const size = std::filesystem::file_size(options.output, isNoFile);
+        std::uint64_t const bytes = isNoFile ? 0 : size;
         if (options.wantsJson) {
             Json const json{{"input", options.input}, {"output", options.output}, {"level", options.level},
                             {"objects", parts},       {"not_kept", file.leftOut}, {"bytes", bytes}};

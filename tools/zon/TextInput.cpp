@@ -1,7 +1,6 @@
 #include "TextInput.h"
 
 #include "Command.h"
-#include "Console.h"
 
 #include <fmt/format.h>
 
@@ -142,6 +141,7 @@ std::string_view Words::next()
             return word;
         if (!lines_.next())
             return {};
+        progress_.update(lines_.position());
         rest_ = lines_.current();
         if (hasComments_)
             rest_ = rest_.substr(0, rest_.find('#'));

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "Console.h"
+
 #include <cstddef>
 #include <cstdint>
 #include <optional>
@@ -53,7 +55,7 @@ class Words {
 public:
     /// skippedLines: so many lines at the start are passed over.
     Words(std::string const& path, std::string_view text, bool hasComments, std::uint64_t skippedLines = 0)
-        : path_(path), lines_(text), hasComments_(hasComments)
+        : path_(path), lines_(text), progress_("reading", text.size()), hasComments_(hasComments)
     {
         while (lines_.number() < skippedLines && lines_.next()) {
         }
@@ -76,6 +78,7 @@ private:
     std::string const& path_;
     Lines lines_;
     std::string_view rest_;
+    Progress progress_;
     bool hasComments_;
 };
 

@@ -129,11 +129,13 @@ void writeZon(Objects const& objects, std::string const& path, int level)
     Messages messages;
     errno = 0;
     if (!Veldrin::IO::serialize(objects, Nexil::String(std::string_view(file.pathToWrite())), options, &messages)) {
-        // The library names the file that it was given, which the user has never heard of.
-        auto text = messages.errorText();
-        if (auto const at = text.find(": " + file.pathToWrite()); at != std::string::npos)
-            text = fmt::format("{}{}", text.substr(0, at), text.substr(at + 2 + file.pathToWrite().size()));
-        throw Failure(fmt::format("{}: {}{}", path, text, errno == ENOSPC ? " (" + errorText(ENOSPC) + ")" : ""));
+        // What the system said is not part of the library's message, and the file it names is not the one asked for.
+        int const systemError = errno;
+        bool const isWriteFault = messages.errorText().starts_with("Cannot ");
+        throw Failure(fmt::format("{}: {}", path,
+                                  isWriteFault && systemError != 0 ? "cannot be written: " + errorText(systemError)
+                                  : isWriteFault                   ? "cannot be written"
+                                                                   : messages.errorText()));
     }
     file.commit();
 }

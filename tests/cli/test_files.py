@@ -1,0 +1,160 @@
+"""How the tool treats files, terminals and wrong usage."""
+import os
+import pty
+import resource
+import signal
+import stat
+import subprocess
+
+import tool
+
+
+def terminal_output(command, folder, **environment):
+    """What the command prints, stdout and stderr being one terminal."""
+    ours, theirs = pty.openpty()
+    process = subprocess.Popen(command, cwd=folder, stdin=subprocess.DEVNULL, stdout=theirs, stderr=theirs,
+                               env={**{k: v for k, v in os.environ.items() if k != "NO_COLOR"}, "TERM": "xterm",
+                                    **environment})
+    os.close(theirs)
+    output = b""
+    while True:
+        try:
+            piece = os.read(ours, 65536)
+        except OSError:  # the other side was closed
+            break
+        if not piece:
+            break
+        output += piece
+    os.close(ours)
+    process.wait(timeout=60)
+    return output
+
+
+class Usage(tool.ToolTest):
+    def test_help_is_no_failure_and_wrong_usage_is(self):
+        for command in ([], ["import"], ["export"], ["make"], ["make", "cube"], ["info"], ["dump"], ["verify"], ["diff"]):
+            self.assertIn("--help", self.zon(*command, "--help").stdout)
+        for command in ([], ["nonsense"], ["make"], ["make", "torus", "x.zon"], ["info"], ["diff", "only-one.zon"],
+                        ["make", "cube", "x.zon", "--level", "10"], ["make", "cube", "x.zon", "--size", "nan"],
+                        ["make", "plane", "x.zon", "--subdivisions", "0"], ["make", "sphere", "x.zon", "--size", "1"],
+                        ["import", "a.obj", "x.zon", "--level", "fast"], ["diff", "a", "b", "--tolerance", "-1"]):
+            result = self.zon(*command, code=2)
+            self.assertEqual(result.stdout, "", command)
+            self.assertNotEqual(result.stderr, "", command)
+        self.assertEqual(self.names(), [])
+
+    def test_unreadable_files_name_themselves_and_the_reason(self):
+        self.write("text.zon", "no zon at all")
+        self.write("mesh.xyz", "0 0 0")
+        os.mkdir(self.folder / "folder.off")
+        for command, words in ((["info", "none.zon"], "none.zon: cannot be read: No such file"),
+                               (["verify", "none.zon"], "none.zon: cannot be read: No such file"),
+                               (["dump", "."], ".: cannot be read: Is a directory"),
+                               (["diff", "text.zon", "text.zon"], "text.zon: bad header"),
+                               (["verify", "text.zon"], "text.zon: no zon file"),
+                               (["import", "none.off", "x.zon"], "none.off: cannot be read: No such file"),
+                               (["import", "folder.off", "x.zon"], "folder.off: cannot be read: Is a directory"),
+                               (["import", "mesh.xyz", "x.zon"], "mesh.xyz: meshes are read from")):
+            self.assertIn(words, self.zon(*command, code=2).stderr)
+
+    def test_a_report_that_cannot_be_printed_is_a_failure(self):
+        self.zon("make", "cube", "cube.zon")
+        with open("/dev/full", "w") as full:
+            result = subprocess.run([tool.ZON, "dump", "cube.zon"], cwd=self.folder, stdout=full,
+                                    stderr=subprocess.PIPE, encoding="utf-8")
+        self.assertEqual((result.returncode, "No space left" in result.stderr), (2, True))
+
+
+class Output(tool.ToolTest):
+    def test_unusual_paths(self):
+        for name in ("a b.zon", "c++.zon", "Ü-測試.zon", "-dash.zon", "x" * 251 + ".zon"):
+            os.mkdir(self.folder / "dir +ö") if not (self.folder / "dir +ö").exists() else None
+            for path in ("./" + name, "dir +ö/" + name):
+                self.zon("make", "cube", path)
+                self.zon("export", path, path[:-8] + ".obj" if len(name) > 200 else path + ".obj")
+                self.zon("import", path[:-8] + ".obj" if len(name) > 200 else path + ".obj", "./back.zon")
+                self.zon("diff", path, "back.zon")
+
+    def test_a_file_that_cannot_be_written_leaves_the_old_one_and_nothing_else(self):
+        self.zon("make", "plane", "big.zon", "--subdivisions", "300", "--level", "0")
+        self.write("old.zon", "old")
+        self.write("old.obj", "old")
+        before = self.names()
+
+        def limit():
+            resource.setrlimit(resource.RLIMIT_FSIZE, (4096, 4096))
+            signal.signal(signal.SIGXFSZ, signal.SIG_IGN)
+        for command in (["make", "plane", "old.zon", "--subdivisions", "300", "--level", "0"],
+                        ["make", "plane", "new.zon", "--subdivisions", "300", "--level", "0"],
+                        ["export", "big.zon", "old.obj"]):
+            result = self.zon(*command, code=2, preexec_fn=limit, restore_signals=False)
+            target = next(word for word in command if word.startswith(("old", "new")))
+            self.assertIn(f"{target}: cannot be written: File too large", result.stderr)
+        self.assertEqual(self.names(), before)
+        self.assertEqual((self.folder / "old.zon").read_text() + (self.folder / "old.obj").read_text(), "oldold")
+
+    def test_a_full_disk(self):
+        self.assertIn("/dev/full: cannot be written: No space left",
+                      self.zon("make", "cube", "/dev/full", code=2).stderr)
+        disk = self.folder / "disk"
+        disk.mkdir()
+        if subprocess.run(["mount", "-t", "tmpfs", "-o", "size=64k", "none", disk], capture_output=True).returncode:
+            self.skipTest("no file system may be mounted here")
+        self.addCleanup(subprocess.run, ["umount", disk], check=True)
+        (disk / "old.zon").write_text("old")
+        error = self.zon("make", "plane", "disk/old.zon", "--subdivisions", "300", "--level", "0", code=2).stderr
+        self.assertIn("disk/old.zon: cannot be written: No space left", error)
+        self.assertEqual(([path.name for path in disk.iterdir()], (disk / "old.zon").read_text()), (["old.zon"], "old"))
+
+    def test_what_cannot_be_a_target(self):
+        os.mkdir(self.folder / "folder")
+        for target, reason in (("folder", "Is a directory"), ("none/x.zon", "No such file"), ("", "no name")):
+            self.assertIn(reason, self.zon("make", "cube", target, code=2).stderr)
+
+    def test_links_and_modes_stay(self):
+        self.zon("make", "cube", "real.zon")
+        os.chmod(self.folder / "real.zon", 0o640)
+        os.symlink("real.zon", self.folder / "link.zon")
+        self.zon("make", "sphere", "link.zon")
+        self.assertTrue((self.folder / "link.zon").is_symlink())
+        self.assertEqual(stat.S_IMODE(os.stat(self.folder / "real.zon").st_mode), 0o640)
+        self.assertEqual(self.objects("real.zon")[0][2]["point_component"], 22)
+        self.assertEqual(self.names(), ["link.zon", "real.zon"])
+        previous = os.umask(0o027)
+        try:
+            self.zon("make", "cube", "new.zon")
+        finally:
+            os.umask(previous)
+        self.assertEqual(stat.S_IMODE(os.stat(self.folder / "new.zon").st_mode), 0o640)
+
+    def test_json_stands_alone_on_stdout(self):
+        self.write("a.off", "COFF 3 1 0\n0 0 0 1 1 1\n1 0 0 1 1 1\n0 1 0 1 1 1\n3 0 1 2\n")
+        report = self.json("import", "a.off", "a.zon", "--level", "4")
+        self.assertEqual(report["not_kept"], ["colours"])
+        self.assertEqual([(o["kind"], o["name"], o["points"], o["faces"], o["corners"]) for o in report["objects"]],
+                         [("mesh", None, 3, 1, 3)])
+        self.assertEqual(report["bytes"], (self.folder / "a.zon").stat().st_size)
+        self.zon("make", "sphere", "s.zon")
+        report = self.json("export", "s.zon", "s.obj")
+        self.assertEqual((report["objects"], report["bytes"]), (1, (self.folder / "s.obj").stat().st_size))
+        self.assertEqual(len(report["not_kept"]), 1)
+
+
+class Terminal(tool.ToolTest):
+    def test_colours_only_on_a_terminal_and_not_against_the_user_s_will(self):
+        self.zon("make", "cube", "cube.zon")
+        command = [tool.ZON, "verify", "cube.zon"]
+        self.assertIn(b"\033[32mok", terminal_output(command, self.folder))
+        self.assertNotIn(b"\033", terminal_output(command, self.folder, NO_COLOR="1"))
+        self.assertNotIn(b"\033", terminal_output(command, self.folder, TERM="dumb"))
+        self.assertNotIn("\033", self.zon("verify", "cube.zon").stdout)
+
+    def test_progress_only_on_a_terminal(self):
+        self.write("a.off", "OFF 5000 0 0\n" + "0.125 0.25 0.5\n" * 5000)
+        command = [tool.ZON, "import", "a.off", "a.zon"]
+        self.assertIn(b"99%", terminal_output(command, self.folder))
+        self.assertEqual(self.zon(*command[1:]).stderr, "")
+
+
+if __name__ == "__main__":
+    tool.main()
