@@ -1,5 +1,8 @@
 #include <veldrin/object/internal/ObjectAccess.h>
 
+#include <cstddef>
+#include <functional>
+#include <unordered_set>
 #include <vector>
 
 namespace Veldrin {
@@ -13,7 +16,21 @@ namespace {
     struct Pair {
         ObjectPtr object;
         ObjectPtr prototype;
+
+        friend bool operator==(Pair const&, Pair const&) = default;
     };
+
+    struct PairHash {
+        std::size_t operator()(Pair const& pair) const noexcept
+        {
+            std::hash<Object const*> const hash;
+            return hash(pair.object.get()) * 31 + hash(pair.prototype.get());
+        }
+    };
+
+    // Ordinary objects hold a handful of others, and looking a pair up costs as much as comparing it. Beyond that many,
+    // objects that share their parts would be compared once for every path that leads to them.
+    constexpr std::size_t kMostPairsNotRemembered = 64;
 
     class Comparison {
     public:
@@ -24,6 +41,8 @@ namespace {
             while (!pending_.empty()) {
                 Pair const pair = std::move(pending_.back());
                 pending_.pop_back();
+                if (++comparedCount_ > kMostPairsNotRemembered && !compared_.insert(pair).second)
+                    continue;
                 if (!compareTop(*pair.object, *pair.prototype))
                     return false;
             }
@@ -46,7 +65,7 @@ namespace {
                 bool const isObject = info.type == Nexil::TypeId::of<ObjectPtr>();
                 if (!compareInfo(object.propertyInfo(key), info.type))
                     return false;
-                if (isObject && !compareObjects(object.getProperty(key), prototype.getProperty(key)))
+                if (isObject && !compareFetched(object, key, prototype.getProperty(key)))
                     return false;
             }
             return true;
@@ -57,13 +76,13 @@ namespace {
         {
             if (!objectTable) {
                 return compareInfo(object.propertyInfo(key), wanted.type()) &&
-                       (!wanted.holds<ObjectPtr>() || compareObjects(object.getProperty(key), wanted));
+                       (!wanted.holds<ObjectPtr>() || compareFetched(object, key, wanted));
             }
             auto const* value = objectTable->find(key.view());
             if (!value)
                 return false;
             if (wanted.holds<ObjectPtr>())
-                return value->holds<ObjectPtr>() && compareObjects(*value, wanted);
+                return compareObjects(value->get<ObjectPtr>(), wanted.get<ObjectPtr>());
             return compareInfo({true, Nexil::AnyArray::is_any_array(*value), value->type(), 0}, wanted.type());
         }
 
@@ -76,19 +95,33 @@ namespace {
             return info.isArray && wanted == Nexil::TypeId::of<AnyArrayPtr>();
         }
 
-        bool compareObjects(Nexil::Any const& value, Nexil::Any const& wanted)
+        bool compareFetched(Object const& object, Nexil::String const& key, Nexil::Any const& wanted)
         {
-            auto const& object = *value.get<ObjectPtr>();
-            auto const& prototype = *wanted.get<ObjectPtr>();
-            if (!prototype || object == prototype)
+            // Where the prototype's object is null the type alone decides, and that was compared.
+            auto const* prototype = wanted.get<ObjectPtr>();
+            if (prototype && !*prototype)
                 return true;
-            if (!object)
+            Nexil::Any const value = object.getProperty(key);
+            return compareObjects(value.get<ObjectPtr>(), prototype);
+        }
+
+        /// Null arguments stand for values that are no objects, whatever was promised of them.
+        bool compareObjects(ObjectPtr const* object, ObjectPtr const* prototype)
+        {
+            if (!object || !prototype)
                 return false;
-            pending_.push_back({object, prototype});
+            if (!*prototype || *object == *prototype)
+                return true;
+            if (!*object)
+                return false;
+            pending_.push_back({*object, *prototype});
             return true;
         }
 
         std::vector<Pair> pending_;
+        // The pointers in it keep addresses from being given to other objects while the question lasts.
+        std::unordered_set<Pair, PairHash> compared_;
+        std::size_t comparedCount_ = 0;
     };
 
 } // namespace
