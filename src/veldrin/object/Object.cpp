@@ -1,4 +1,4 @@
-#include <veldrin/object/Object.h>
+#include <veldrin/object/internal/ObjectAccess.h>
 
 namespace Veldrin {
 
@@ -69,10 +69,13 @@ bool Object::setPropertyAny(Nexil::String const& key, Nexil::Any&& value)
 
 PropertyInfo Object::propertyInfo(Nexil::String const& key) const
 {
+    auto const describe = [](Nexil::Any const& value) -> PropertyInfo {
+        return {true, Nexil::AnyArray::is_any_array(value), value.type(), Nexil::AnyArray::get_any_array_size(value)};
+    };
+    if (!ObjectAccess::table(*this))
+        return hasProperty(key) ? describe(getProperty(key)) : PropertyInfo();
     auto const* value = properties_.find(key.view());
-    if (!value)
-        return {};
-    return {true, Nexil::AnyArray::is_any_array(*value), value->type(), Nexil::AnyArray::get_any_array_size(*value)};
+    return value ? describe(*value) : PropertyInfo();
 }
 
 Nexil::MutablePtr<Object> createObject()

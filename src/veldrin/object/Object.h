@@ -61,6 +61,8 @@ public:
     virtual bool setPropertyAny(Nexil::String const& key, Nexil::Any&& value);
 
     /// Type and size of a property. Never builds or copies data: constant time, whatever stands behind the property.
+    ///
+    /// A class that computes its properties overrides this one too; where it does not, its `getProperty` is asked.
     [[nodiscard]] virtual PropertyInfo propertyInfo(Nexil::String const& key) const;
 
     /// True when `object` holds every property of `prototype` with a value of the same exact type; further properties do
@@ -69,7 +71,8 @@ public:
     /// Two wildcards: an empty value in the prototype accepts any value under its key; an (even null) pointer to an array
     /// of `Any` accepts any array. A null object never stands for the object that a prototype has; where the prototype's
     /// own object is null, the type alone decides. An object is always of its own kind.
-    /// Cost: constant per property of the prototype; sizes of arrays do not matter, nesting needs no stack.
+    /// Cost: constant per property of the prototype, each pair of objects compared once however often they are shared;
+    /// sizes of arrays do not matter, nesting needs no stack.
     [[nodiscard]] static bool isA(Object const& object, Object const& prototype);
 
 private:

@@ -2,6 +2,7 @@
 
 #include <veldrin/object/Object.h>
 
+#include <cstddef>
 #include <type_traits>
 #include <utility>
 
@@ -36,7 +37,8 @@ template <class T>
 bool setProperty(Object& object, Nexil::String const& key, T&& value)
 {
     using Value = std::decay_t<T>;
-    if constexpr (std::is_convertible_v<Value, Nexil::Ptr<Object>> && !std::is_same_v<Value, std::nullptr_t>)
+    static_assert(!std::is_same_v<Value, std::nullptr_t>, "say of which type the null pointer is");
+    if constexpr (std::is_convertible_v<Value, Nexil::Ptr<Object>>)
         return object.setPropertyAny(key, Nexil::Ptr<Object>(std::forward<T>(value)));
     else if constexpr (Internal::WritablePointer<Value>::value)
         return object.setPropertyAny(key, typename Internal::WritablePointer<Value>::Shared(std::forward<T>(value)));

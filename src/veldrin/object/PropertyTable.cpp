@@ -98,9 +98,13 @@ void PropertyTable::closeGaps() noexcept
 {
     std::erase_if(slots_, [](Slot const& slot) { return slot.isGap; });
     gapCount_ = 0;
-    if (cells_.empty())
+    if (slots_.size() <= kMostUnhashedSlots) {
+        cells_.clear();
         return;
-    // The cells are already enough for more slots than are left.
+    }
+    // As few cells as the slots need, so that closing the next gaps costs no more than opening them did. There were at
+    // least as many already, and giving some up needs no memory.
+    cells_.resize(std::min(cells_.size(), cellCountFor(slots_.size())));
     std::fill(cells_.begin(), cells_.end(), Cell());
     for (std::size_t slot = 0; slot < slots_.size(); ++slot)
         placeInCells(cells_, Nexil::Internal::seededHash(slots_[slot].name.view()), slot);

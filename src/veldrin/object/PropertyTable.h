@@ -7,6 +7,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 namespace Veldrin::Internal {
@@ -24,6 +25,23 @@ public:
         Nexil::Any value;
         bool isGap = false;
     };
+
+    PropertyTable() = default;
+    PropertyTable(PropertyTable const&) = default;
+    PropertyTable(PropertyTable&& other) noexcept { swap(other); }
+    PropertyTable& operator=(PropertyTable other) noexcept
+    {
+        swap(other);
+        return *this;
+    }
+    ~PropertyTable() = default;
+
+    void swap(PropertyTable& other) noexcept
+    {
+        slots_.swap(other.slots_);
+        cells_.swap(other.cells_);
+        std::swap(gapCount_, other.gapCount_);
+    }
 
     /// Number of properties.
     [[nodiscard]] std::size_t size() const noexcept { return slots_.size() - gapCount_; }
