@@ -7,8 +7,10 @@ namespace Veldrin::Math {
 
 namespace {
 
-    struct Segment {
-        double t0, t1, t2, t3; // times of the control points, not decreasing
+    // The control points between two keys. Times are fractions of the segment, so that keys far from time 0 lose no
+    // precision; since both inner ones lie within 0 and 1, time grows with the parameter even where they cross.
+    struct BezierSegment {
+        double t1, t2;
         double v0, v1, v2, v3;
     };
 
@@ -18,65 +20,71 @@ namespace {
         return w * w * w * a + 3 * w * w * u * b + 3 * w * u * u * c + u * u * u * d;
     }
 
-    Segment bezierSegment(FCurve::Key const& from, FCurve::Key const& to) noexcept
+    BezierSegment bezierSegment(FCurve::Key const& from, FCurve::Key const& to) noexcept
     {
-        return {from.time,
-                std::clamp(from.time + from.out.time, from.time, to.time),
-                std::clamp(to.time + to.in.time, from.time, to.time),
-                to.time,
-                from.value,
-                from.value + from.out.value,
-                to.value + to.in.value,
-                to.value};
+        double const span = to.time - from.time;
+        auto const fraction = [span](double time) { return time > 0 ? std::min(time / span, 1.0) : 0.0; };
+        return {fraction(from.out.time),     1 - fraction(-to.in.time), from.value,
+                from.value + from.out.value, to.value + to.in.value,    to.value};
     }
 
-    double evaluateBezier(Segment const& s, double time) noexcept
+    double evaluateBezier(BezierSegment const& s, double fraction) noexcept
     {
-        // Time grows with the parameter because the control times lie within the segment; halving finds the parameter
-        // to the last bit in about 60 steps, whatever the tangents.
+        // Halving finds the parameter to the last bit whatever the tangents are.
         double low = 0;
         double high = 1;
         for (;;) {
             double const middle = low + (high - low) / 2;
             if (middle <= low || middle >= high)
                 break;
-            (bezier(s.t0, s.t1, s.t2, s.t3, middle) <= time ? low : high) = middle;
+            (bezier(0, s.t1, s.t2, 1, middle) <= fraction ? low : high) = middle;
         }
         return bezier(s.v0, s.v1, s.v2, s.v3, low);
     }
 
     double evaluateSegment(FCurve::Key const& from, FCurve::Key const& to, double time) noexcept
     {
+        // A key's own value comes back exactly, next to an infinite one too.
+        if (time == from.time)
+            return from.value;
+        double const fraction = (time - from.time) / (to.time - from.time);
         switch (from.interpolation) {
         case FCurve::Interpolation::Constant: return from.value;
-        case FCurve::Interpolation::Linear:
-            return from.value + (to.value - from.value) * ((time - from.time) / (to.time - from.time));
-        case FCurve::Interpolation::Bezier: return evaluateBezier(bezierSegment(from, to), time);
+        case FCurve::Interpolation::Linear: return from.value + (to.value - from.value) * fraction;
+        case FCurve::Interpolation::Bezier: return evaluateBezier(bezierSegment(from, to), fraction);
         }
         return from.value;
     }
 
-    double slope(double rise, double run) noexcept
-    {
-        return run != 0 ? rise / run : 0;
-    }
-
+    // The slope at a key points to the first control point that lies at another time.
     double slopeAtStart(FCurve::Key const& from, FCurve::Key const& to) noexcept
     {
+        double const span = to.time - from.time;
         if (from.interpolation == FCurve::Interpolation::Constant)
             return 0;
-        if (from.interpolation == FCurve::Interpolation::Bezier && from.out.time > 0)
-            return slope(from.out.value, from.out.time);
-        return slope(to.value - from.value, to.time - from.time);
+        if (from.interpolation == FCurve::Interpolation::Bezier) {
+            auto const s = bezierSegment(from, to);
+            if (s.t1 > 0)
+                return (s.v1 - s.v0) / (s.t1 * span);
+            if (s.t2 > 0)
+                return (s.v2 - s.v0) / (s.t2 * span);
+        }
+        return (to.value - from.value) / span;
     }
 
     double slopeAtEnd(FCurve::Key const& from, FCurve::Key const& to) noexcept
     {
+        double const span = to.time - from.time;
         if (from.interpolation == FCurve::Interpolation::Constant)
             return 0;
-        if (from.interpolation == FCurve::Interpolation::Bezier && to.in.time < 0)
-            return slope(to.in.value, to.in.time);
-        return slope(to.value - from.value, to.time - from.time);
+        if (from.interpolation == FCurve::Interpolation::Bezier) {
+            auto const s = bezierSegment(from, to);
+            if (s.t2 < 1)
+                return (s.v3 - s.v2) / ((1 - s.t2) * span);
+            if (s.t1 < 1)
+                return (s.v3 - s.v1) / ((1 - s.t1) * span);
+        }
+        return (to.value - from.value) / span;
     }
 
 } // namespace
@@ -130,8 +138,8 @@ double FCurve::evaluate(double time) const noexcept
 
 double FCurve::evaluateInside(double time) const noexcept
 {
-    auto const* const next = std::upper_bound(keys_.begin(), keys_.end(), time,
-                                              [](double t, Key const& key) { return t < key.time; });
+    auto const* const next =
+        std::upper_bound(keys_.begin(), keys_.end(), time, [](double t, Key const& key) { return t < key.time; });
     if (next == keys_.begin())
         return keys_[0].value;
     if (next == keys_.end())
@@ -144,17 +152,21 @@ double FCurve::evaluateOutside(double time, bool isBefore) const noexcept
     Key const& first = keys_[0];
     Key const& last = keys_[keys_.size() - 1];
     Key const& end = isBefore ? first : last;
+    auto const mode = isBefore ? preExtrapolation_ : postExtrapolation_;
+    if (mode == Extrapolation::Constant)
+        return end.value;
+    if (mode == Extrapolation::Linear) {
+        double const rate = isBefore ? slopeAtStart(first, keys_[1]) : slopeAtEnd(keys_[keys_.size() - 2], last);
+        return rate == 0 ? end.value : end.value + rate * (time - end.time);
+    }
     double const span = last.time - first.time;
     double const rounds = std::floor((time - first.time) / span);
+    if (!std::isfinite(rounds * span))
+        return end.value;
     double const phase = std::clamp(time - rounds * span, first.time, last.time);
-    switch (isBefore ? preExtrapolation_ : postExtrapolation_) {
-    case Extrapolation::Constant: return end.value;
-    case Extrapolation::Linear: {
-        auto const count = keys_.size();
-        double const rate =
-            isBefore ? slopeAtStart(first, keys_[1]) : slopeAtEnd(keys_[count - 2], keys_[count - 1]);
-        return end.value + rate * (time - end.time);
-    }
+    switch (mode) {
+    case Extrapolation::Constant:
+    case Extrapolation::Linear: break;
     case Extrapolation::Cycle: return evaluateInside(phase);
     case Extrapolation::CycleOffset: return evaluateInside(phase) + rounds * (last.value - first.value);
     case Extrapolation::Oscillate:
@@ -250,8 +262,7 @@ bool deserializeFCurve(SerializationData const& data, FCurve& curve)
     for (SerializationData const& node : *keys) {
         FCurve::Key key;
         bool const isBehindLast =
-            readKey(node, key) &&
-            (result.keys().empty() || result.keys()[result.keys().size() - 1].time < key.time);
+            readKey(node, key) && (result.keys().empty() || result.keys()[result.keys().size() - 1].time < key.time);
         if (!isBehindLast || !result.setKey(key))
             return false;
     }

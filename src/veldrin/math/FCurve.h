@@ -73,7 +73,8 @@ public:
     void setPreExtrapolation(Extrapolation mode) noexcept { preExtrapolation_ = mode; }
     void setPostExtrapolation(Extrapolation mode) noexcept { postExtrapolation_ = mode; }
 
-    /// The curve's value at `time`; 0 without keys, the key's value with one.
+    /// The curve's value at `time`; 0 without keys, the key's value with one. A time that is no number reads as the first
+    /// key's, and one too far away to have a place in a round as the end key's.
     ///
     /// Within a Bezier segment tangent times are clamped to the segment, so that the curve stays a function of time.
     /// Cost: logarithmic in the number of keys.
