@@ -95,7 +95,8 @@ namespace Internal {
 
 /// One value of any copyable type, or nothing.
 ///
-/// Every `Ptr`, `String` and other value of up to 32 bytes is held without the heap, larger ones on it.
+/// Every `Ptr`, `String` and other value of up to 32 bytes, with an alignment of up to 8 and a move that does not throw,
+/// is held without the heap; others on it.
 /// Copying copies the value (a `Ptr` shares what it points to); moving never throws and leaves the source empty.
 /// Errors: std::bad_alloc and what the value's copy constructor throws; the target is unchanged then.
 class Any {
@@ -134,7 +135,8 @@ public:
     Any& operator=(Any&& other) noexcept
     {
         if (this != &other) {
-            reset();
+            // The old value goes last: `other` may be a part of it.
+            Any const old(std::move(*this));
             operations_ = std::exchange(other.operations_, nullptr);
             if (operations_)
                 operations_->move(other.storage_, storage_);
@@ -171,7 +173,11 @@ public:
     template <class T>
     [[nodiscard]] bool holds() const noexcept
     {
-        return operations_ == &Internal::anyOperations<T> || (operations_ && operations_->type == typeid(T));
+        // What cannot be copied is never held, but may be asked for.
+        if constexpr (std::is_copy_constructible_v<T>)
+            return operations_ == &Internal::anyOperations<T> || (operations_ && operations_->type == typeid(T));
+        else
+            return false;
     }
 
 private:

@@ -111,29 +111,9 @@ public:
 
     [[nodiscard]] Internal::UntypedTypeRep const& elementType() const noexcept { return type_; }
 
-    void push_back(T const& value)
-    {
-        if (size_ == capacity_) {
-            T copy(value); // `value` may be an element of this array
-            grow();
-            std::construct_at(data_ + size_, std::move(copy));
-        } else {
-            std::construct_at(data_ + size_, value);
-        }
-        ++size_;
-    }
-
-    void push_back(T&& value)
-    {
-        if (size_ == capacity_) {
-            T moved(std::move(value));
-            grow();
-            std::construct_at(data_ + size_, std::move(moved));
-        } else {
-            std::construct_at(data_ + size_, std::move(value));
-        }
-        ++size_;
-    }
+    /// Appends `value`, which may be an element of this array.
+    void push_back(T const& value) { append(value); }
+    void push_back(T&& value) { append(std::move(value)); }
 
     /// Capacity for at least `count` elements; exactly that many when it must grow.
     void reserve(std::uint64_t count)
@@ -192,11 +172,28 @@ private:
         std::uint64_t capacity;
     };
 
-    void grow() { relocate(capacity_ + std::max<std::uint64_t>(capacity_, 1)); }
+    template <class Source>
+    void append(Source&& value)
+    {
+        if (size_ == capacity_) {
+            Storage fresh(type_, capacity_ + std::max<std::uint64_t>(capacity_, 1));
+            // Before the others move, so that a failure changes nothing and `value` may be one of them.
+            std::construct_at(fresh.data + size_, std::forward<Source>(value));
+            moveInto(fresh);
+        } else {
+            std::construct_at(data_ + size_, std::forward<Source>(value));
+        }
+        ++size_;
+    }
 
     void relocate(std::uint64_t capacity)
     {
         Storage fresh(type_, capacity);
+        moveInto(fresh);
+    }
+
+    void moveInto(Storage& fresh) noexcept
+    {
         if constexpr (std::is_trivially_copyable_v<T>) {
             if (size_ != 0)
                 std::memcpy(static_cast<void*>(fresh.data), data_, size_ * sizeof(T));

@@ -21,6 +21,8 @@
 ///
 /// Threads: copies of one pointer value may be made and dropped on many threads at once. One `Ptr` variable is, like an
 /// int, not to be written by two threads without a lock.
+/// Destruction: what a value holds the last `Ptr` to is destroyed right after the value itself, not within its
+/// destructor, so that long chains need no stack. Its destructor must not use anything that its holder owned.
 namespace Nexil {
 
 template <class T>
@@ -211,7 +213,8 @@ public:
         }
         block_ = shared.block_->clone();
         // Both blocks are of one type, so the copy lies where the original lies within its block.
-        auto const offset = reinterpret_cast<char const*>(shared.object_) - reinterpret_cast<char const*>(shared.block_);
+        auto const offset =
+            reinterpret_cast<char const*>(shared.object_) - reinterpret_cast<char const*>(shared.block_);
         object_ = reinterpret_cast<T*>(reinterpret_cast<char*>(block_) + offset);
         shared.reset();
     }

@@ -16,9 +16,12 @@ CompositeSerializationData::~CompositeSerializationData() = default;
 bool CompositeSerializationData::get(String const& name, SerializationData& child) const
 {
     auto const* found = find(name);
-    if (found)
-        child = *found;
-    return found != nullptr;
+    if (!found)
+        return false;
+    // Copied before anything is given up: `child` may be the node that this composite is part of.
+    SerializationData copy(*found);
+    child = std::move(copy);
+    return true;
 }
 
 SerializationData const* CompositeSerializationData::find(String const& name) const
@@ -29,10 +32,16 @@ SerializationData const* CompositeSerializationData::find(String const& name) co
 
 SerializationData& CompositeSerializationData::operator[](String const& name)
 {
-    auto const [place, isNew] = indexOfName_.try_emplace(name, children_.size());
-    if (isNew)
-        children_.emplace_back(name, SerializationData());
-    return children_[place->second].second;
+    if (auto const place = indexOfName_.find(name); place != indexOfName_.end())
+        return children_[place->second].second;
+    children_.emplace_back(name, SerializationData());
+    try {
+        indexOfName_.emplace(name, children_.size() - 1);
+    } catch (...) {
+        children_.pop_back();
+        throw;
+    }
+    return children_.back().second;
 }
 
 std::size_t CompositeSerializationData::size() const noexcept

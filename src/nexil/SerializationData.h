@@ -57,11 +57,12 @@ public:
     CompositeSerializationData& operator=(CompositeSerializationData&&) noexcept;
     ~CompositeSerializationData();
 
-    /// Copies the child `name` into `child`; false, and `child` untouched, when there is none.
+    /// Copies the child `name` into `child`; false, and `child` untouched, when there is none. `child` may be the node
+    /// that holds this composite, which walks down one level and ends this composite.
     bool get(String const& name, SerializationData& child) const;
     /// The child `name`; null when there is none.
     [[nodiscard]] SerializationData const* find(String const& name) const;
-    /// The child `name`, made as nothing when there is none.
+    /// The child `name`, made as nothing when there is none. The reference lasts until the next new name.
     SerializationData& operator[](String const& name);
 
     [[nodiscard]] std::size_t size() const noexcept;
@@ -91,8 +92,7 @@ public:
     [[nodiscard]] SerializationData const* begin() const noexcept;
     [[nodiscard]] SerializationData const* end() const noexcept;
 
-    friend VELDRIN_PLATFORM_API bool operator==(SequenceSerializationData const& a,
-                                                SequenceSerializationData const& b);
+    friend VELDRIN_PLATFORM_API bool operator==(SequenceSerializationData const& a, SequenceSerializationData const& b);
 
 private:
     std::vector<SerializationData> children_;

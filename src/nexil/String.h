@@ -1,5 +1,6 @@
 #pragma once
 
+#include <concepts>
 #include <cstddef>
 #include <functional>
 #include <ostream>
@@ -22,9 +23,11 @@ public:
     explicit String(std::string_view text) : text_(text) {}
     explicit String(std::string&& text) noexcept : text_(std::move(text)) {}
 
-    String& operator=(char const* text)
+    // A template, so that `text = {}` means the empty string and not a null pointer.
+    template <std::convertible_to<char const*> Text>
+    String& operator=(Text const& text)
     {
-        text_ = text;
+        text_ = static_cast<char const*>(text);
         return *this;
     }
 
