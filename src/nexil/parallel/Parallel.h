@@ -18,9 +18,9 @@
 ///
 ///     parallel::forRange(faceCount, grain::kFaces, [&](std::size_t begin, std::size_t end) { ... });
 ///
-/// Every call runs in a task context of its own, so that neither side's cancellation cuts the other short; asks for
-/// cancellation once per chunk; and passes on the first exception of a body. Ranges of one grain or less stay on the
-/// calling thread.
+/// Every call runs in a task context of its own, so that neither side's cancellation cuts the other short, and passes on
+/// the first exception of a body. Loops and reductions ask for cancellation once per chunk. Ranges of one grain or less
+/// stay on the calling thread. A grain is at least 1.
 namespace Nexil::parallel {
 
 /// Calls body(begin, end) over disjoint chunks that cover [0, count). Where the cuts lie depends on the schedule, so
@@ -61,11 +61,16 @@ void invoke(First const& first, Second const& second)
 #endif
 }
 
-/// Folds chunk(begin, end) results left to right over fixed ranges of `grain`: one value for every thread count.
+/// Joins the results of chunk(begin, end, identity) by unite(left, right): one value for every thread count.
+///
+/// [0, count) is halved until no range is longer than `grain`, and results are joined along the same halvings, the left
+/// one first, so `unite` needs to be neither commutative nor exactly associative. `identity` where count is 0.
 template <class Value, class Chunk, class Unite>
 [[nodiscard]] Value reduceInOrder(std::size_t count, std::size_t grain, Value const& identity, Chunk const& chunk,
                                   Unite const& unite)
 {
+    if (count == 0)
+        return identity;
 #if defined(NEXIL_PARALLEL_ON_PLAIN_THREADS)
     return PlainThreads::reduceInOrder(0, count, grain, PlainThreads::threadCount(), identity, chunk, unite);
 #else
