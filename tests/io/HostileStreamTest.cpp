@@ -1,6 +1,8 @@
 #include <support/StreamDescription.h>
 #include <support/Streams.h>
 
+#include <veldrin/object/Properties.h>
+
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -67,6 +69,57 @@ TEST(HostileStream, NoFlippedByteIsReadAsSomethingElse)
                 flipped[at] = static_cast<char>(flipped[at] ^ flip);
                 expectRefusedOrEqual(flipped, original, "byte " + std::to_string(at) + " ^ " + std::to_string(flip));
             }
+    }
+}
+
+TEST(HostileStream, AChunkThatGrowsBetweenTwoLooksStaysWithinItsArray)
+{
+    /// A file that somebody else writes to: a byte grows after some looks at it.
+    class Changing : public std::stringbuf {
+    public:
+        Changing(std::string const& bytes, std::size_t at, int looks)
+            : std::stringbuf(bytes, std::ios::in), at_(at), looks_(looks)
+        {
+        }
+
+    protected:
+        std::streamsize xsgetn(char* target, std::streamsize count) override
+        {
+            auto const from = static_cast<std::size_t>(gptr() - eback());
+            std::streamsize const got = std::stringbuf::xsgetn(target, count);
+            if (at_ >= from && at_ < from + static_cast<std::size_t>(got) && looks_-- <= 0)
+                ++target[at_ - from];
+            return got;
+        }
+
+    private:
+        std::size_t at_;
+        int looks_;
+    };
+    Nexil::Array<unsigned char> values;
+    values.resize(300000);
+    std::uint32_t state = 1;
+    for (std::size_t i = 0; i < values.size(); ++i)
+        values[i] = i % 16 < 8 ? 0 : static_cast<unsigned char>((state = state * 1664525 + 1013904223) >> 24);
+    auto object = Veldrin::createObject();
+    Veldrin::setProperty(*object, "values", Nexil::makePtr<Nexil::Array<unsigned char>>(values));
+    std::string bytes = support::written({Nexil::Ptr<Veldrin::Object>(std::move(object))}, 1);
+    // In version 5, which has no checksums, an array and its only chunk that pretend to be 65536 bytes shorter.
+    bytes[bytes.find("file_version") + 14] = 5;
+    std::size_t const count = bytes.find(std::string("\xCE\x00\x04\x93\xE0", 5));
+    std::size_t const declaredSize = bytes.find(std::string("\xE0\x93\x04\x00", 4));
+    ASSERT_LT(count, declaredSize);
+    ASSERT_NE(declaredSize, std::string::npos);
+    bytes[count + 2] = 3;
+    bytes[declaredSize + 2] = 3;
+    for (int looks = 0; looks < 4; ++looks) {
+        Changing buffer(bytes, declaredSize + 2, looks);
+        std::istream stream(&buffer);
+        Nexil::InputStream input(stream);
+        support::Objects out;
+        support::Messages messages;
+        EXPECT_FALSE(Veldrin::IO::deserialize(input, out, {}, &messages)) << looks;
+        EXPECT_EQ(messages.errors().size(), 1u) << looks;
     }
 }
 

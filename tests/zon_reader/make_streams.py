@@ -339,6 +339,15 @@ def fake_chunk(declared, length=16, fmt=2, flags=0x21, block=None, said=None):
     return (head + bytes(max(0, length - 16)))[:length]
 
 
+def zeros_in_one_block(size):
+    """A compressed chunk of zeros in a single block, which the compressor itself would cut."""
+    # LZ4: a zero, a match with it that is as long as it takes, five zeros for the end.
+    more = size - 1 - 19 - 5
+    block = b"\x1f\0\1\0" + b"\xff" * (more // 255) + bytes([more % 255]) + b"\x50" + bytes(5)
+    body = struct.pack("<II", 20, len(block)) + block
+    return struct.pack("<BBBBIII", 2, 1, 0x31, 4, size, size, 16 + len(body)) + body
+
+
 def with_chunk(chunk, count=4, version=6):
     inner = seq(pack(count), seq(pack(chunk)))
     inner = inner if version < 3 else seq(pack(0), inner)
@@ -593,6 +602,8 @@ def bad_arrays():
             ("payload_cut", patched(good[:-8], 12, *struct.pack("<I", len(good) - 8)))]:
         declared = struct.unpack("<I", chunk[4:8])[0] if len(chunk) > 8 else 16
         yield f"packed_{name}", with_chunk(chunk, declared // 4 or 1), DECOMPRESS
+    # Sound but for its one large block, for which the decompressor takes three times the memory of what it holds.
+    yield "bomb_block", with_chunk(zeros_in_one_block((4 << 20) + 4), (1 << 20) + 1), DECOMPRESS
     # Sound chunks of other codecs: the decompressor would take them.
     for codec in blosc.compressor_list():
         if not codec.startswith("lz4"):

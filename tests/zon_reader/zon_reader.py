@@ -26,8 +26,9 @@ def value_size(code):
 def declared_size(chunk):
     """The size that a compressed chunk promises, if its header can be believed."""
     size, block, length = (int.from_bytes(chunk[at:at + 4], "little") for at in (4, 8, 12))
-    good = len(chunk) >= 16 and chunk[0] == 2 and length == len(chunk) and (chunk[2] & 2 or chunk[2] >> 5 == 1)
-    good = good and 1 <= size <= 255 * length and 1 <= block <= size and not (chunk[2] & 2 and size != length - 16)
+    good = len(chunk) >= 16 and chunk[0] == 2 and chunk[3] and length == len(chunk)
+    good = good and (chunk[2] & 2 or chunk[2] >> 5 == 1) and 1 <= size <= 255 * length
+    good = good and 1 <= block <= min(size, 1 << 22) and not (chunk[2] & 2 and size != length - 16)
     check(good, "Decompression error")
     return size
 

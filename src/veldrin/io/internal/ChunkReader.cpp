@@ -96,14 +96,15 @@ namespace {
         std::uint64_t loadCompressed(msgpack::object const& chunk, std::byte* target)
         {
             std::uint64_t const size = item_.binarySize(chunk);
+            // From the header that was held against the array: a file can change between two looks at it.
+            auto const decoded = static_cast<std::size_t>(decodedSize(chunk));
             auto const* bytes = item_.binaryInMemory(chunk);
             if (!bytes) {
                 Nexil::Internal::resizeUninitialized(compressed_, size);
                 item_.readBinary(chunk, compressed_.data());
                 bytes = compressed_.data();
             }
-            auto const decoded = readCompressedHeader(bytes, size).decodedSize;
-            decompressChunk(bytes, static_cast<std::size_t>(size), target, static_cast<std::size_t>(decoded));
+            decompressChunk(bytes, static_cast<std::size_t>(size), target, decoded);
             return decoded;
         }
 

@@ -17,12 +17,26 @@ namespace {
     constexpr std::uint8_t kFlagStored = 0x02;
     constexpr unsigned int kCodecShift = 5;
     constexpr unsigned int kCodecLz4 = 1;
+    constexpr int kMaxLevel = 9;
     constexpr std::uint64_t kMaxRatio = 255;
+    // Four times the largest block that the compressor chooses.
+    constexpr std::uint64_t kMaxBlockSize = std::uint64_t(4) << 20;
+    // Decompressing less than this takes no longer than starting a thread.
+    constexpr std::uint64_t kBytesPerThread = std::uint64_t(64) << 10;
 
     int threadCount() noexcept
     {
         // More than 256 threads make chunks of several blocks fail.
         return static_cast<int>(std::clamp(std::thread::hardware_concurrency(), 1u, 256u));
+    }
+
+    /// Each thread decompresses into two blocks of its own, and blocks are as large as a file says: together they stay
+    /// below 32 MiB and an eighth of the result. Nor do many short chunks of many blocks start a thread for each.
+    int decompressionThreads(std::uint64_t decodedSize, std::uint64_t blockSize) noexcept
+    {
+        std::uint64_t const memory = (std::uint64_t(32) << 20) + decodedSize / 8;
+        std::uint64_t const most = std::min(memory / (2 * blockSize), decodedSize / kBytesPerThread);
+        return static_cast<int>(std::clamp<std::uint64_t>(most, 1, static_cast<std::uint64_t>(threadCount())));
     }
 
     std::uint32_t littleEndian32(std::byte const* bytes) noexcept
@@ -37,6 +51,9 @@ namespace {
 
 std::size_t compressChunk(int level, std::size_t elementSize, void const* bytes, std::size_t byteCount, void* target)
 {
+    // The compressor refuses other levels too, but complains on the standard error stream.
+    if (level > kMaxLevel)
+        throw Nexil::String("compression error");
     int const result = blosc_compress_ctx(level, BLOSC_SHUFFLE, elementSize, byteCount, bytes, target,
                                           byteCount + kMaxCompressionOverhead, BLOSC_LZ4_COMPNAME, 0, threadCount());
     // Beyond its own limit on the size the compressor answers 0.
@@ -58,8 +75,9 @@ CompressedHeader readCompressedHeader(std::byte const* header, std::uint64_t chu
                          littleEndian32(header + 12) == chunkSize &&
                          (isStored || flags >> kCodecShift == kCodecLz4) && decodedSize >= 1 &&
                          decodedSize <= kMaxRatio * chunkSize && blockSize >= 1 && blockSize <= decodedSize &&
+                         blockSize <= kMaxBlockSize &&
                          (!isStored || decodedSize + kCompressedHeaderSize == chunkSize);
-    return {isSound, decodedSize};
+    return {isSound, decodedSize, blockSize};
 }
 
 void decompressChunk(std::byte const* chunk, std::size_t chunkSize, std::byte* target, std::size_t decodedSize)
@@ -71,7 +89,8 @@ void decompressChunk(std::byte const* chunk, std::size_t chunkSize, std::byte* t
                          blosc_cbuffer_validate(chunk, chunkSize, &validatedSize) == 0 && validatedSize == decodedSize;
     if (!isSound)
         throw Nexil::String("Decompression error");
-    int const result = blosc_decompress_ctx(chunk, target, decodedSize, threadCount());
+    int const result = blosc_decompress_ctx(chunk, target, decodedSize,
+                                            decompressionThreads(decodedSize, header.blockSize));
     if (result < 0 || static_cast<std::size_t>(result) != decodedSize)
         throw Nexil::String("Decompression error");
 }

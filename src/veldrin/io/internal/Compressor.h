@@ -22,11 +22,13 @@ struct CompressedHeader {
     bool isSound = false;
     /// Bytes after decompression.
     std::uint64_t decodedSize = 0;
+    /// Bytes after decompression of each block but the last.
+    std::uint64_t blockSize = 0;
 };
 
 /// Reads the header of a chunk of `chunkSize` bytes of which at least min(chunkSize, kCompressedHeaderSize) are at
-/// `header`. Sound is: known format, codec LZ4 or stored bytes, its size the chunk's, block size within the decoded size,
-/// and decoded size at most 255 times the chunk's, which is the most that the codec can reach.
+/// `header`. Sound is: known format, codec LZ4 or stored bytes, its size the chunk's, block size within the decoded size and
+/// 4 MiB, and decoded size at most 255 times the chunk's, which is the most that the codec can reach.
 [[nodiscard]] CompressedHeader readCompressedHeader(std::byte const* header, std::uint64_t chunkSize) noexcept;
 
 /// Decompresses a chunk into exactly `decodedSize` bytes, once more checking its header. Throws "Decompression error".
