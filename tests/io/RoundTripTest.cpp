@@ -178,6 +178,41 @@ TEST(StreamRoundTrip, AnObjectThatHoldsItselfIsRefused)
     const_cast<Veldrin::Object&>(*inner).eraseProperty("outer");
 }
 
+TEST(StreamRoundTrip, AClassThatMakesItsPropertiesUpIsAskedOnce)
+{
+    /// Answers a new array at every question, and a new object of its class.
+    class Inventor : public Veldrin::Object {
+    public:
+        explicit Inventor(int depth) : depth_(depth) {}
+        [[nodiscard]] Nexil::Array<Nexil::String> keys() const override { return {"numbers", "next"}; }
+        [[nodiscard]] Nexil::Any getProperty(Nexil::String const& key) const override
+        {
+            if (key == "numbers")
+                return support::array<int>({1, depth_});
+            return depth_ == 0 ? ObjectPtr() : ObjectPtr(Nexil::makePtr<Inventor>(depth_ - 1));
+        }
+
+    private:
+        int depth_;
+    };
+    // Values become entries of their own from the 33rd level on.
+    for (int const levels : {0, 31, 32, 33, 300}) {
+        ObjectPtr held = Nexil::makePtr<Inventor>(1);
+        for (int i = 0; i < levels; ++i)
+            held = objectWith("next", held);
+        ObjectPtr back = readOne(support::written({held}));
+        for (int i = 0; back && i < levels + 1; ++i)
+            back = getPropertyAs<ObjectPtr>(*back, "next");
+        ASSERT_TRUE(back) << levels;
+        EXPECT_EQ(*getPropertyAs<Nexil::Ptr<Nexil::Array<int>>>(*back, "numbers"), (Nexil::Array<int>{1, 0}));
+
+        back = readOne(support::written({ObjectPtr(Nexil::makePtr<Inventor>(levels))}));
+        for (int i = 0; back && i < levels; ++i)
+            back = getPropertyAs<ObjectPtr>(*back, "next");
+        EXPECT_TRUE(back && back->hasProperty("numbers")) << levels;
+    }
+}
+
 TEST(StreamRoundTrip, UnknownTypesAreLeftOutWithAWarning)
 {
     struct Secret {
@@ -294,14 +329,76 @@ TEST(StreamFailure, NamesThePathAndLeavesTheOutputAlone)
     support::Messages messages;
     support::Objects out{ObjectPtr()};
     Veldrin::Object header;
+    EXPECT_FALSE(Veldrin::IO::deserialize("/dev", out, {}, &messages));
     EXPECT_FALSE(Veldrin::IO::deserialize("/no/such/file", out, {}, &messages));
     EXPECT_FALSE(Veldrin::IO::deserializeHeader("/no/such/file", header, &messages));
     EXPECT_FALSE(Veldrin::IO::deserialize("/dev/null", out, {}, &messages));
-    EXPECT_THAT(messages.errors(), testing::ElementsAre("Cannot open file for reading: /no/such/file",
+    EXPECT_THAT(messages.errors(), testing::ElementsAre("Cannot read from file: /dev",
+                                                        "Cannot open file for reading: /no/such/file",
                                                         "Cannot open file for reading: /no/such/file",
                                                         "Unknown msgpack error occurred"));
     EXPECT_EQ(out.size(), 1u);
     EXPECT_TRUE(header.empty());
+}
+
+TEST(StreamFailure, StreamsInOddStatesAnswerFalseWithOneMessage)
+{
+    /// Throws what no library throws.
+    class Thrower : public std::streambuf {
+        std::streamsize xsputn(char const*, std::streamsize) override { throw 5; }
+        std::streamsize xsgetn(char*, std::streamsize) override { throw 5; }
+        pos_type seekoff(off_type, std::ios_base::seekdir, std::ios_base::openmode) override { return 0; }
+    };
+    support::Objects const objects{objectWith("n", 1)};
+    std::string const bytes = support::written(objects);
+    auto expectRefusals = [&](std::streambuf& buffer, char const* writing, char const* reading) {
+        std::iostream stream(&buffer);
+        Nexil::OutputStream output(stream);
+        Nexil::InputStream input(stream);
+        support::Messages messages;
+        support::Objects out;
+        EXPECT_FALSE(Veldrin::IO::serialize(objects, output, {}, &messages));
+        EXPECT_FALSE(Veldrin::IO::deserialize(input, out, {}, &messages));
+        EXPECT_THAT(messages.errors(), testing::ElementsAre(writing, reading));
+        EXPECT_TRUE(out.empty());
+    };
+    constexpr char kUnknown[] = "Unknown msgpack error occurred";
+    Thrower thrower;
+    expectRefusals(thrower, kUnknown, kUnknown);
+    std::stringbuf readAlready(bytes, std::ios::in);
+    readAlready.pubseekoff(0, std::ios::end, std::ios::in);
+    expectRefusals(readAlready, "Cannot write to stream", kUnknown);
+    // The table offset cannot be put in its place here.
+    std::filebuf appending;
+    std::string const path = testing::TempDir() + "veldrin_appended.zon";
+    ASSERT_TRUE(appending.open(path, std::ios::out | std::ios::binary | std::ios::app));
+    expectRefusals(appending, "Cannot write to stream", kUnknown);
+    std::remove(path.c_str());
+
+    std::istringstream strict(bytes.substr(0, 100));
+    strict.exceptions(std::ios::failbit | std::ios::badbit | std::ios::eofbit);
+    Nexil::InputStream input(strict);
+    support::Messages messages;
+    support::Objects out;
+    EXPECT_FALSE(Veldrin::IO::deserialize(input, out, {}, &messages));
+    EXPECT_THAT(messages.errors(), testing::ElementsAre("Corrupt stream header"));
+}
+
+TEST(StreamFailure, MoreChunksThanAFileCanCountAreRefused)
+{
+    // Memory that is never touched.
+    Nexil::Array<unsigned char> bytes;
+    Nexil::Internal::resizeUninitialized(bytes, (std::uint64_t(1) << 32) + 1);
+    support::Objects const objects{objectWith("bytes", Nexil::makePtr<Nexil::Array<unsigned char>>(std::move(bytes)))};
+    support::EnvironmentVariable const variable(kChunkLimit, "1");
+    for (auto const& [level, message] : {std::pair(0, "Array too large to serialize"), {1, "chunk limit exceeded"}}) {
+        support::Messages messages;
+        EXPECT_EQ(support::written(objects, level, &messages), "");
+        EXPECT_THAT(messages.errors(), testing::ElementsAre(message));
+    }
+    support::Messages messages;
+    EXPECT_EQ(support::written({objectWith("v", Veldrin::Math::float3{1, 2, 3})}, 10, &messages), "");
+    EXPECT_THAT(messages.errors(), testing::ElementsAre("compression error"));
 }
 
 TEST(StreamFailure, ACancelledJobAnswersFalseWithoutAMessage)

@@ -51,7 +51,8 @@ namespace {
             if (std::strcmp(error.what(), Nexil::Internal::kJobCancelledText) == 0)
                 return false;
             return report(services, "Unknown msgpack error occurred");
-        } catch (std::exception const&) {
+        } catch (...) {
+            // Also what a caller's own stream buffer or object class throws.
             return report(services, "Unknown msgpack error occurred");
         }
     }
@@ -114,7 +115,8 @@ namespace {
             InputMemoryBuf memory(bytes.data(), bytes.size());
             return readObjects(memory, 0, bytes.size(), out);
         }
-        buffer->pubseekpos(std::streampos(position), std::ios_base::in);
+        if (buffer->pubseekpos(std::streampos(position), std::ios_base::in) != std::streampos(position))
+            throwTruncated();
         return readObjects(*buffer, static_cast<std::uint64_t>(position), static_cast<std::uint64_t>(end), out);
     }
 

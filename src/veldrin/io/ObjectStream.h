@@ -38,7 +38,8 @@ VELDRIN_API bool serialize(Nexil::Array<Nexil::Ptr<Object>> const& objects, Nexi
                            SerializationOptions const& options, Nexil::RuntimeServices const* services);
 
 /// The same to a stream, which must be able to seek; positions in it count from its own start. The stream is left behind
-/// its table offset, so a caller who goes on writing seeks to the end first.
+/// its table offset, so a caller who goes on writing seeks to the end first. A reader takes everything up to the end for
+/// this one: what stood there before and reaches further must be cut off by the caller.
 VELDRIN_API bool serialize(Nexil::Array<Nexil::Ptr<Object>> const& objects, Nexil::OutputStream& stream,
                            SerializationOptions const& options, Nexil::RuntimeServices const* services);
 

@@ -26,16 +26,23 @@ bool ByteSource::fill()
 {
     std::uint64_t const next = position();
     std::size_t const wanted = static_cast<std::size_t>(std::min<std::uint64_t>(window_.size(), end_ - next));
-    if (streamPosition_ != next) {
-        stream_.pubseekpos(std::streampos(static_cast<std::streamoff>(next)), std::ios_base::in);
-        streamPosition_ = next;
-    }
+    moveStream(next);
     auto const got = wanted == 0 ? 0 : stream_.sgetn(window_.data(), static_cast<std::streamsize>(wanted));
     windowPosition_ = next;
     taken_ = 0;
     filled_ = static_cast<std::size_t>(std::max<std::streamsize>(got, 0));
     streamPosition_ += filled_;
     return filled_ != 0;
+}
+
+void ByteSource::moveStream(std::uint64_t position)
+{
+    if (streamPosition_ == position)
+        return;
+    auto const target = std::streampos(static_cast<std::streamoff>(position));
+    if (stream_.pubseekpos(target, std::ios_base::in) != target)
+        throwTruncated();
+    streamPosition_ = position;
 }
 
 int ByteSource::peek()
@@ -60,8 +67,7 @@ void ByteSource::read(void* target, std::size_t count)
     while (count != 0) {
         if (taken_ == filled_ && count >= window_.size()) {
             std::uint64_t const next = position();
-            if (streamPosition_ != next)
-                stream_.pubseekpos(std::streampos(static_cast<std::streamoff>(next)), std::ios_base::in);
+            moveStream(next);
             auto const got = stream_.sgetn(out, static_cast<std::streamsize>(count));
             filled_ = taken_ = 0;
             windowPosition_ = streamPosition_ = next + static_cast<std::uint64_t>(std::max<std::streamsize>(got, 0));

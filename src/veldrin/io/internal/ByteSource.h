@@ -41,6 +41,8 @@ public:
 private:
     /// Fills the window, at least one byte; false at the end.
     bool fill();
+    /// Brings the stream itself to `position`. Throws like `read` when it does not go there.
+    void moveStream(std::uint64_t position);
 
     std::streambuf& stream_;
     std::uint64_t end_;

@@ -24,6 +24,11 @@ namespace {
         return type.address(pointer, useCount) == nullptr;
     }
 
+    bool isPlain(Object const& object)
+    {
+        return typeid(object) == typeid(Object);
+    }
+
 } // namespace
 
 template <class Visit>
@@ -50,10 +55,11 @@ void ObjectGraph::visitHeld(Nexil::Any const& pointer, StreamType const& type, V
 
     if (type.code == TypeCode::kObject) {
         Object const& object = **pointer.get<ObjectPtr>();
-        // A class of its own may hand out one pointer at several places, or keep none of what it hands out.
-        tellsHolders = typeid(object) == typeid(Object);
-        for (Nexil::String const& key : object.keys())
-            visitValue(object.getProperty(key));
+        // A class of its own may hand out one pointer at several places.
+        tellsHolders = isPlain(object);
+        Object const& content = takeContent(object);
+        for (Nexil::String const& key : content.keys())
+            visitValue(content.getProperty(key));
     } else if (type.code == TypeCode::kObjectArray) {
         for (ObjectPtr const& element : **pointer.get<ArrayPtr<ObjectPtr>>()) {
             Nexil::Any const held = element;
@@ -105,6 +111,25 @@ bool ObjectGraph::findEntry(void const* address, std::uint64_t& entry) const
         return false;
     entry = place->second.entry;
     return true;
+}
+
+Object const& ObjectGraph::contentOf(Object const& object) const
+{
+    if (isPlain(object))
+        return object;
+    auto const place = contents_.find(&object);
+    return place == contents_.end() ? object : place->second;
+}
+
+Object const& ObjectGraph::takeContent(Object const& object)
+{
+    if (isPlain(object))
+        return object;
+    auto const [place, isNew] = contents_.try_emplace(&object);
+    if (isNew)
+        for (Nexil::String const& key : object.keys())
+            place->second.setPropertyAny(key, object.getProperty(key));
+    return place->second;
 }
 
 void ObjectGraph::countHolders(std::vector<Nexil::Any> pending)

@@ -17,6 +17,7 @@ namespace Veldrin::IO {
 /// Entries are the top-level objects, whatever is held more than once, and what lies deeper than kMaxInlineLevels below
 /// an entry. Everything else is written where it is held. Entries are ordered so that each comes behind those that it
 /// refers to.
+/// An object of a class of its own is asked for its properties once, as it may make them up anew each time.
 /// Cost: linear in the pointers held. Needs no stack for deep chains.
 class ObjectGraph {
 public:
@@ -38,10 +39,8 @@ public:
     /// True, and its number in `entry`, when the value at the address is an entry.
     [[nodiscard]] bool findEntry(void const* address, std::uint64_t& entry) const;
 
-    /// Calls visit(pointer, type, isExclusive) for every shareable pointer, null ones left out, that the value behind
-    /// `pointer` holds directly. isExclusive: the holder tells how often the pointed-to value is really held.
-    template <class Visit>
-    static void visitHeld(Nexil::Any const& pointer, StreamType const& type, Visit const& visit);
+    /// What is written for an object: the object itself, or the properties that its own class answered.
+    [[nodiscard]] Object const& contentOf(Object const& object) const;
 
 private:
     static constexpr std::uint64_t kNoEntry = ~std::uint64_t(0);
@@ -52,12 +51,18 @@ private:
         std::uint64_t entry = kNoEntry;
     };
 
+    /// Calls visit(pointer, type, tellsHolders) for every shareable pointer, null ones left out, that the value behind
+    /// `pointer` holds directly. tellsHolders: the pointer's use count tells how often the value is really held.
+    template <class Visit>
+    void visitHeld(Nexil::Any const& pointer, StreamType const& type, Visit const& visit);
+    Object const& takeContent(Object const& object);
     void countHolders(std::vector<Nexil::Any> pending);
     void orderEntries(std::uint64_t slotCount);
     void collectReferred(Nexil::Any const& pointer, unsigned int level, std::vector<std::uint64_t>& referred);
     std::uint64_t addEntry(Node& node, Nexil::Any const& pointer);
 
     std::unordered_map<void const*, Node> nodes_;
+    std::unordered_map<Object const*, Object> contents_; // of objects of other classes than Object
     std::vector<Entry> entries_;
     std::vector<std::uint64_t> writeOrder_;
 };

@@ -143,8 +143,10 @@ void PackVisitor::packPointee(Nexil::Any const& pointer, StreamType const& type)
         packer_.pack_nil();
         return;
     }
-    if (type.code == TypeCode::kObject)
-        return packObject(**pointer.get<ObjectPtr>());
+    if (type.code == TypeCode::kObject) {
+        Object const& object = **pointer.get<ObjectPtr>();
+        return packObject(graph_ ? graph_->contentOf(object) : object);
+    }
 
     constexpr unsigned char kBlob = 0;
     constexpr unsigned char kElementList = 1;

@@ -118,7 +118,9 @@ namespace {
 void writeStream(Nexil::Array<Nexil::Ptr<Object>> const& objects, WriterContext const& context, std::ostream& stream)
 {
     std::streambuf* const buffer = stream.rdbuf();
-    std::streamoff const start = buffer && stream.good() ? std::streamoff(buffer->pubseekoff(0, std::ios_base::cur, std::ios_base::out)) : -1;
+    std::streamoff start = -1;
+    if (buffer && stream.good())
+        start = std::streamoff(buffer->pubseekoff(0, std::ios_base::cur, std::ios_base::out));
     if (start < 0)
         throw WriteFailure();
     // Before the first byte: objects that cannot be written leave no half of a stream.
@@ -143,6 +145,10 @@ void writeStream(Nexil::Array<Nexil::Ptr<Object>> const& objects, WriterContext 
     writeTableOffset(offsetSink, tablePosition);
     offsetSink.flush();
     if (buffer->pubsync() != 0)
+        throw WriteFailure();
+    // A stream that appends wherever it stands has put the offset at its end.
+    auto const behindOffset = std::streampos(static_cast<std::streamoff>(offsetSink.position()));
+    if (buffer->pubseekoff(0, std::ios_base::cur, std::ios_base::out) != behindOffset)
         throw WriteFailure();
 }
 
