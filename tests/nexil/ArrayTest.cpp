@@ -1,0 +1,147 @@
+#include "Tracked.h"
+
+#include <nexil/Array.h>
+#include <nexil/String.h>
+
+#include <gmock/gmock.h>
+
+#include <limits>
+#include <vector>
+
+#if defined(__SANITIZE_ADDRESS__)
+// Counts that no machine can serve are answered as without the sanitizer.
+extern "C" __attribute__((visibility("default"))) char const* __asan_default_options()
+{
+    return "allocator_may_return_null=1";
+}
+#endif
+
+namespace {
+
+using Nexil::Array;
+using support::Tracked;
+using testing::ElementsAre;
+
+template <class T>
+bool isAligned(Array<T> const& array, std::uintptr_t alignment)
+{
+    return reinterpret_cast<std::uintptr_t>(array.data()) % alignment == 0;
+}
+
+TEST(Array, AppendingDoublesAndResizingTakesExactlyWhatIsAsked)
+{
+    Array<int> array;
+    std::vector<std::uint64_t> capacities;
+    for (int i = 0; i < 9; ++i) {
+        array.push_back(i);
+        capacities.push_back(array.capacity());
+    }
+    EXPECT_THAT(capacities, ElementsAre(1, 2, 4, 4, 8, 8, 8, 8, 16));
+    EXPECT_THAT(array, ElementsAre(0, 1, 2, 3, 4, 5, 6, 7, 8));
+
+    array.resize(21);
+    EXPECT_EQ(array.capacity(), 21u);
+    array.push_back(5);
+    EXPECT_EQ(array.capacity(), 42u);
+    array.resize(3);
+    // Storage that was used before is zero again.
+    array.resize(6);
+    EXPECT_THAT(array, ElementsAre(0, 1, 2, 0, 0, 0));
+    EXPECT_EQ(array.capacity(), 42u);
+}
+
+TEST(Array, AnElementOfItsOwnCanBeAppended)
+{
+    Nexil::String const text("longer than what a string holds without the heap");
+    Array<Nexil::String> array{text};
+    for (int i = 0; i < 40; ++i)
+        array.push_back(array[0]);
+    EXPECT_THAT(array, testing::AllOf(testing::SizeIs(41), testing::Each(text)));
+
+    Array<Tracked> tracked{5, 6};
+    ASSERT_EQ(tracked.capacity(), 2u);
+    tracked.push_back(std::move(tracked[0]));
+    EXPECT_THAT(tracked, ElementsAre(Tracked(-1), Tracked(6), Tracked(5)));
+}
+
+TEST(Array, AFailedCopyLeavesEverythingAsItWas)
+{
+    int const before = Tracked::alive;
+    {
+        Array<Tracked> array{1, 2, 3};
+        Tracked const fourth = 4;
+        {
+            support::FailingCopies const fail(0);
+            EXPECT_THROW(array.push_back(fourth), std::runtime_error);
+        }
+        EXPECT_THAT(array, ElementsAre(Tracked(1), Tracked(2), Tracked(3)));
+        EXPECT_EQ(array.capacity(), 3u);
+        Array<Tracked> target{9};
+        {
+            support::FailingCopies const fail(2);
+            EXPECT_THROW(target = array, std::runtime_error);
+        }
+        EXPECT_THAT(target, ElementsAre(Tracked(9)));
+        target = std::move(array);
+        EXPECT_EQ(array.size(), 0u);
+        EXPECT_EQ(array.data(), nullptr);
+        array.push_back(Tracked(3));
+        EXPECT_THAT(array, ElementsAre(Tracked(3)));
+        EXPECT_EQ(target[2].value, 3);
+    }
+    EXPECT_EQ(Tracked::alive, before);
+}
+
+TEST(Array, StorageKnowsItsElementType)
+{
+    struct alignas(256) Wide {
+        char bytes[300];
+    };
+    Array<Wide> wide;
+    EXPECT_EQ(wide.elementType().size, 512u);
+    EXPECT_EQ(wide.elementType().alignment, 256u);
+    EXPECT_TRUE(*wide.elementType().type == typeid(Wide));
+    for (int i = 0; i < 5; ++i) {
+        wide.push_back({});
+        EXPECT_TRUE(isAligned(wide, 256));
+    }
+
+    Array<bool> flags{true, false, true};
+    flags.push_back(true);
+    static_assert(std::is_same_v<decltype(flags[0]), bool&>);
+    EXPECT_EQ(flags.elementType().size, 1u);
+    EXPECT_EQ(std::string(reinterpret_cast<char const*>(flags.data()), 4), std::string("\1\0\1\1", 4));
+    EXPECT_FALSE(Array<int>({1, 2}) == Array<int>({1, 2, 0}));
+}
+
+TEST(Array, CountsThatNoMachineCanServeAreRefused)
+{
+    constexpr auto most = std::numeric_limits<std::uint64_t>::max();
+    Array<double> array{1, 2};
+    // The first two overflow when they become bytes, and would look small then.
+    for (std::uint64_t const count : {most / 8 + 2, most / 8 + (1u << 22), most, most / 2, most / 16, most >> 10}) {
+        EXPECT_THROW(array.resize(count), std::bad_alloc) << count;
+        EXPECT_THROW(Nexil::Internal::resizeUninitialized(array, count), std::bad_alloc) << count;
+    }
+    EXPECT_THAT(array, ElementsAre(1, 2));
+    EXPECT_EQ(array.capacity(), 2u);
+}
+
+TEST(Array, LargeBlocksStartOnAHugePageAndHoldWhatIsWritten)
+{
+    constexpr std::uint64_t count = (std::uint64_t(17) << 20) / 8 + 1;
+    Array<std::uint64_t> array;
+    array.resize(count);
+    EXPECT_TRUE(isAligned(array, std::uintptr_t(2) << 20));
+    EXPECT_EQ(std::ranges::count(array, 0u), static_cast<std::ptrdiff_t>(count));
+    for (std::uint64_t i = 0; i < count; ++i)
+        array[i] = i;
+    array.push_back(count);
+    EXPECT_EQ(array.capacity(), 2 * count);
+    std::uint64_t wrongCount = 0;
+    for (std::uint64_t i = 0; i <= count; ++i)
+        wrongCount += array[i] != i;
+    EXPECT_EQ(wrongCount, 0u);
+}
+
+} // namespace

@@ -1,0 +1,168 @@
+#include <nexil/parallel/Parallel.h>
+
+#include <gmock/gmock.h>
+#include <tbb/global_control.h>
+#include <tbb/info.h>
+
+#include <atomic>
+#include <cmath>
+#include <random>
+#include <stdexcept>
+#include <string>
+#include <thread>
+#include <vector>
+
+namespace {
+
+namespace parallel = Nexil::parallel;
+
+/// Calls run() under limits of 1, 2, 3 and all threads, and of more than there are processors.
+template <class Run>
+void onEveryThreadCount(Run const& run)
+{
+    for (std::size_t const threadCount : {1, 2, 3, tbb::info::default_concurrency(), 8}) {
+        SCOPED_TRACE(threadCount);
+        tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, threadCount);
+        run();
+    }
+}
+
+/// Cancels the running job for as long as it lives, from the question after `count` further ones on.
+struct CancelAfter {
+    explicit CancelAfter(int count)
+    {
+        questionsLeft = count;
+        Nexil::setJobCancelHook([] { return questionsLeft-- <= 0; });
+    }
+    ~CancelAfter() { Nexil::setJobCancelHook(nullptr); }
+    static inline std::atomic<int> questionsLeft = 0;
+};
+
+TEST(Parallel, ALoopCoversEachIndexOnce)
+{
+    onEveryThreadCount([] {
+        for (std::size_t const grain : {std::size_t(1), std::size_t(7), std::size_t(64)})
+            for (std::size_t const count : {std::size_t(0), std::size_t(1), grain - 1, grain, grain + 1, 2 * grain,
+                                            2 * grain + 1, 10 * grain + 3, std::size_t(5000)}) {
+                std::vector<int> visits(count);
+                std::atomic<int> wrongChunkCount = 0;
+                auto const caller = std::this_thread::get_id();
+                parallel::forRange(count, grain, [&](std::size_t begin, std::size_t end) {
+                    wrongChunkCount += begin >= end || end > count;
+                    wrongChunkCount += count <= grain && std::this_thread::get_id() != caller;
+                    for (std::size_t i = begin; i < end; ++i)
+                        ++visits[i];
+                });
+                EXPECT_EQ(wrongChunkCount, 0) << count << ' ' << grain;
+                EXPECT_THAT(visits, testing::Each(1)) << count << ' ' << grain;
+            }
+    });
+}
+
+/// What [begin, end) gives when it is halved down to ranges of 10: each join in brackets, with the indices in order.
+std::string joinsOf(std::size_t begin, std::size_t end)
+{
+    if (end - begin <= 10)
+        return std::to_string(begin) + '-' + std::to_string(end);
+    auto const middle = begin + (end - begin) / 2;
+    return '(' + joinsOf(begin, middle) + ' ' + joinsOf(middle, end) + ')';
+}
+
+TEST(Parallel, AReductionJoinsInOneOrderOnEveryThreadCount)
+{
+    onEveryThreadCount([] {
+        for (std::size_t const count : {0u, 1u, 9u, 10u, 11u, 21u, 1003u}) {
+            auto const joins = parallel::reduceInOrder(
+                count, 10, std::string(),
+                [](std::size_t begin, std::size_t end, std::string const& identity) {
+                    return identity + std::to_string(begin) + '-' + std::to_string(end);
+                },
+                [](std::string const& left, std::string const& right) { return '(' + left + ' ' + right + ')'; });
+            EXPECT_EQ(joins, count == 0 ? "" : joinsOf(0, count));
+        }
+        // So sums of floats of all magnitudes have one value.
+        auto const sum = parallel::reduceInOrder(
+            20'001, 64, 0.f,
+            [](std::size_t begin, std::size_t end, float part) {
+                for (std::size_t i = begin; i < end; ++i)
+                    part += std::ldexp(1.f, static_cast<int>(i * 7919 % 48));
+                return part;
+            },
+            std::plus());
+        static float const first = sum;
+        EXPECT_EQ(sum, first);
+    });
+}
+
+TEST(Parallel, ExceptionsAndCancellationLeaveTheCall)
+{
+    auto const loop = [](std::size_t count) { parallel::forRange(count, 10, [](std::size_t, std::size_t) {}); };
+    auto const reduce = [](std::size_t count) {
+        (void)parallel::reduceInOrder(
+            count, 10, 0, [](std::size_t, std::size_t, int sum) { return sum; }, [](int a, int b) { return a + b; });
+    };
+    auto const isCancellation = testing::ThrowsMessage<std::runtime_error>("Job cancelled");
+    onEveryThreadCount([&] {
+        for (std::size_t const count : {std::size_t(5), std::size_t(1000)}) {
+            for (int const questionCount : {0, count == 5 ? 0 : 3}) {
+                CancelAfter const cancel(questionCount);
+                EXPECT_THAT([&] { loop(count); }, isCancellation);
+                EXPECT_THAT([&] { reduce(count); }, isCancellation);
+            }
+            EXPECT_NO_THROW(loop(count));
+            auto const fail = [&](std::size_t begin, std::size_t end) {
+                if (begin <= count / 2 && count / 2 < end)
+                    throw std::invalid_argument("the middle");
+            };
+            EXPECT_THAT([&] { parallel::forRange(count, 10, fail); },
+                        testing::ThrowsMessage<std::invalid_argument>("the middle"));
+        }
+    });
+}
+
+TEST(Parallel, AnInnerLoopThatFailsDoesNotCutTheOuterOneShort)
+{
+    onEveryThreadCount([] {
+        std::vector<int> visits(300);
+        parallel::forRange(visits.size(), 1, [&](std::size_t begin, std::size_t end) {
+            for (std::size_t i = begin; i < end; ++i) {
+                EXPECT_THROW(
+                    parallel::forRange(50, 1, [](std::size_t, std::size_t) { throw std::invalid_argument("inside"); }),
+                    std::invalid_argument);
+                ++visits[i];
+            }
+        });
+        EXPECT_THAT(visits, testing::Each(1));
+    });
+}
+
+TEST(Parallel, InvokeRunsBothAndPassesOnTheFailureOfEither)
+{
+    onEveryThreadCount([] {
+        int first = 0;
+        int second = 0;
+        parallel::invoke([&] { first = 1; }, [&] { second = 2; });
+        EXPECT_EQ(first + second, 3);
+        auto const fail = [] { throw std::invalid_argument("this one"); };
+        EXPECT_THROW(parallel::invoke(fail, [] {}), std::invalid_argument);
+        EXPECT_THROW(parallel::invoke([] {}, fail), std::invalid_argument);
+    });
+}
+
+TEST(Parallel, SortsAsTheSerialSortDoes)
+{
+    std::mt19937 random(4);
+    onEveryThreadCount([&] {
+        for (std::size_t const count : {0u, 1u, 2u, 499u, 500u, 501u, 50'000u}) {
+            std::vector<unsigned int> numbers(count);
+            for (auto& number : numbers)
+                number = static_cast<unsigned int>(random() % (count + 1));
+            auto expected = numbers;
+            std::ranges::sort(expected, std::greater());
+            parallel::sort(numbers.begin(), numbers.end(), std::greater());
+            EXPECT_EQ(numbers, expected) << count;
+        }
+    });
+}
+
+} // namespace

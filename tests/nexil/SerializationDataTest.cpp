@@ -1,0 +1,65 @@
+#include <nexil/SerializationData.h>
+
+#include <gmock/gmock.h>
+
+namespace {
+
+using Nexil::CompositeSerializationData;
+using Nexil::LiteralSerializationData;
+using Nexil::SequenceSerializationData;
+using Nexil::SerializationData;
+
+TEST(SerializationData, LeavesReadAsWhatTheyAre)
+{
+    LiteralSerializationData const nothing;
+    LiteralSerializationData const integer(4'000'000'000u);
+    LiteralSerializationData const number(2.5);
+    EXPECT_TRUE(nothing.isNothing() && nothing.asInt() == 0 && nothing.asDouble() == 0);
+    EXPECT_TRUE(integer.isInt() && integer.asInt() == 4'000'000'000u && integer.asDouble() == 4e9);
+    EXPECT_TRUE(number.isDouble() && number.asInt() == 0 && number.asDouble() == 2.5);
+    EXPECT_FALSE(LiteralSerializationData(1u) == LiteralSerializationData(1.0));
+    EXPECT_TRUE(SerializationData().asLiteral()->isNothing());
+}
+
+TEST(SerializationData, CompositesKeepTheOrderOfTheirNames)
+{
+    CompositeSerializationData composite;
+    for (char const* name : {"z", "b", "a", "b", "c", "z"})
+        composite[name] = static_cast<unsigned int>(composite.size());
+    std::string names;
+    for (std::size_t i = 0; i < composite.size(); ++i)
+        names += composite.nameAt(i).c_str();
+    EXPECT_EQ(names, "zbac");
+    EXPECT_TRUE(composite.childAt(1) == SerializationData(3u));
+    SerializationData child = 7u;
+    EXPECT_FALSE(composite.get("missing", child));
+    EXPECT_TRUE(child == SerializationData(7u));
+    EXPECT_TRUE(composite.get("z", child));
+    EXPECT_TRUE(child == SerializationData(4u));
+}
+
+TEST(SerializationData, CopiesAreDeepAndAWalkerMayReplaceWhatItStandsOn)
+{
+    SerializationData tree = 1.5;
+    for (unsigned int depth = 0; depth < 12; ++depth) {
+        SequenceSerializationData list;
+        list.push_back(tree);
+        list.push_back(depth);
+        CompositeSerializationData level;
+        level["list"] = std::move(list);
+        level["down"] = std::move(tree);
+        tree = std::move(level);
+    }
+    SerializationData const copy = tree;
+    for (unsigned int depth = 12; depth-- > 0;) {
+        auto const* list = tree.asComposite()->find("list")->asSequence();
+        ASSERT_EQ(list->end() - list->begin(), 2);
+        EXPECT_TRUE(list->begin()[1] == SerializationData(depth));
+        EXPECT_TRUE(list->begin()[0] == *tree.asComposite()->find("down"));
+        ASSERT_TRUE(tree.asComposite()->get("down", tree));
+    }
+    EXPECT_TRUE(tree == SerializationData(1.5));
+    EXPECT_EQ(copy.asComposite()->size(), 2u);
+}
+
+} // namespace

@@ -1,0 +1,65 @@
+#include <nexil/JobCancel.h>
+#include <nexil/RuntimeMessage.h>
+#include <nexil/SeededHash.h>
+#include <nexil/TypeId.h>
+
+#include <gmock/gmock.h>
+
+#include <set>
+#include <string>
+#include <vector>
+
+namespace {
+
+TEST(Services, TheHostTakesMessagesAndCancelsJobs)
+{
+    using Nexil::RuntimeMessageCategory;
+    // Hosts compare the numbers.
+    EXPECT_EQ(RuntimeMessageCategory(1), RuntimeMessageCategory::Error);
+    EXPECT_EQ(RuntimeMessageCategory(2), RuntimeMessageCategory::Warning);
+    Nexil::RuntimeServices().logMessage({RuntimeMessageCategory::Info, "dropped"});
+
+    static bool isCancelled = false;
+    Nexil::setJobCancelHook([] { return isCancelled; });
+    EXPECT_FALSE(Nexil::isJobCancelled());
+    isCancelled = true;
+    EXPECT_TRUE(Nexil::isJobCancelled());
+    EXPECT_THAT([] { Nexil::Internal::throwIfJobCancelled(); },
+                testing::ThrowsMessage<std::runtime_error>("Job cancelled"));
+    Nexil::setJobCancelHook(nullptr);
+    EXPECT_FALSE(Nexil::isJobCancelled());
+}
+
+TEST(Services, TypesHaveReadableNames)
+{
+    auto const name = [](Nexil::TypeId type) { return Nexil::Internal::DebugTypeId::getTypeNameForDebugOnly(type); };
+    EXPECT_EQ(name({}), "");
+    EXPECT_EQ(name(Nexil::TypeId::of<unsigned int>()), "unsigned int");
+    EXPECT_EQ(name(Nexil::TypeId::of<Nexil::String>()), "Nexil::String");
+}
+
+TEST(Services, HashesTellNamesApartByEveryByteAndTheirLength)
+{
+    // Names of zeros differ by length alone, the others in one byte, at each place of each length.
+    std::set<std::uint64_t> hashes;
+    std::size_t nameCount = 0;
+    for (std::size_t length = 0; length <= 40; ++length)
+        for (std::size_t place = 0; place <= length; ++place) {
+            std::string name(length + 1, '\0');
+            name[place] = place < length ? '\x80' : '\0';
+            auto const hash = Nexil::Internal::seededHash({name.data(), length});
+            EXPECT_EQ(hash, Nexil::Internal::seededHash(name.substr(0, length))); // what lies behind does not count
+            hashes.insert(hash);
+            ++nameCount;
+        }
+    EXPECT_EQ(hashes.size(), nameCount);
+
+    // Each bit is set in about half of many names that count up: eight standard deviations to each side.
+    std::vector<int> setCounts(64);
+    for (int i = 0; i < 4096; ++i)
+        for (std::size_t bit = 0; bit < 64; ++bit)
+            setCounts[bit] += static_cast<int>(Nexil::Internal::seededHash("name_" + std::to_string(i)) >> bit & 1);
+    EXPECT_THAT(setCounts, testing::Each(testing::AllOf(testing::Gt(2048 - 256), testing::Lt(2048 + 256))));
+}
+
+} // namespace
