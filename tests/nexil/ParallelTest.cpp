@@ -20,7 +20,8 @@ namespace parallel = Nexil::parallel;
 template <class Run>
 void onEveryThreadCount(Run const& run)
 {
-    for (std::size_t const threadCount : {1, 2, 3, tbb::info::default_concurrency(), 8}) {
+    auto const all = static_cast<std::size_t>(tbb::info::default_concurrency());
+    for (std::size_t const threadCount : {std::size_t(1), std::size_t(2), std::size_t(3), all, std::size_t(8)}) {
         SCOPED_TRACE(threadCount);
         tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, threadCount);
         run();

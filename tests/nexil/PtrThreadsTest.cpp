@@ -14,14 +14,14 @@ namespace {
 using Nexil::MutablePtr;
 using Nexil::Ptr;
 
-constexpr int kThreadCount = 4;
+constexpr std::size_t kThreadCount = 4;
 constexpr int kRoundCount = 500;
 
 template <class Body>
 void onAllThreads(Body const& body)
 {
     std::vector<std::jthread> threads;
-    for (int t = 0; t < kThreadCount; ++t)
+    for (std::size_t t = 0; t < kThreadCount; ++t)
         threads.emplace_back([&body, t] { body(t); });
 }
 
@@ -45,17 +45,17 @@ TEST(PtrThreads, TheLastOfManyHoldersDestroysOnceAndSeesWhatTheOthersDid)
         std::atomic<int> destroyedCount = 0;
         int sum = 0;
         std::vector<Ptr<Witness>> held(kThreadCount, Nexil::makePtr<Witness>(&notes, &destroyedCount, &sum));
-        onAllThreads([&](int t) {
+        onAllThreads([&](std::size_t t) {
             for (int i = 0; i < 20; ++i) {
                 std::vector<Ptr<Witness>> const copies(5, held[t]);
                 Ptr<Witness> const assigned = copies.back();
                 EXPECT_GE(assigned.useCount(), 6u);
             }
-            notes[t] = t + 1;
+            notes[t] = 1;
             held[t].reset();
         });
         ASSERT_EQ(destroyedCount, 1);
-        ASSERT_EQ(sum, kThreadCount * (kThreadCount + 1) / 2);
+        ASSERT_EQ(sum, static_cast<int>(kThreadCount));
     }
 }
 
@@ -65,7 +65,7 @@ TEST(PtrThreads, WritersThatEachHoldACopyDoNotSeeEachOther)
     constexpr int kNumberCount = 100;
     std::vector<Ptr<Numbers>> held(kThreadCount);
     std::barrier turn(kThreadCount);
-    onAllThreads([&](int t) {
+    onAllThreads([&](std::size_t t) {
         for (int round = 0; round < kRoundCount; ++round) {
             if (t == 0) {
                 auto fresh = Nexil::makeMutable<Numbers>();
@@ -80,12 +80,12 @@ TEST(PtrThreads, WritersThatEachHoldACopyDoNotSeeEachOther)
             int wrongCount = 0;
             for (int& number : *own) {
                 wrongCount += number != round;
-                number = -1 - t;
+                number = -1 - static_cast<int>(t);
             }
             EXPECT_EQ(wrongCount, 0);
             held[t] = std::move(own);
             turn.arrive_and_wait();
-            EXPECT_EQ(std::ranges::count(*held[t], -1 - t), kNumberCount);
+            EXPECT_EQ(std::ranges::count(*held[t], -1 - static_cast<int>(t)), kNumberCount);
             turn.arrive_and_wait();
         }
     });
