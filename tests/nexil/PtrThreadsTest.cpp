@@ -31,6 +31,7 @@ struct Witness {
     std::atomic<int>* destroyedCount;
     int* sum;
 
+    Witness(std::vector<int> const* n, std::atomic<int>* d, int* s) : notes(n), destroyedCount(d), sum(s) {}
     ~Witness()
     {
         *sum = std::accumulate(notes->begin(), notes->end(), 0);
