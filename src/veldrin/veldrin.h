@@ -28,6 +28,7 @@
 #include <veldrin/geometry/Prototypes.h>
 #include <veldrin/io/InputMemoryBuf.h>
 #include <veldrin/io/ObjectStream.h>
+#include <veldrin/io/StreamInspection.h>
 #include <veldrin/io/StreamKeys.h>
 #include <veldrin/io/StreamOptions.h>
 #include <veldrin/math/BBox.h>

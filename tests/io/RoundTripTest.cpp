@@ -239,6 +239,21 @@ TEST(StreamRoundTrip, UnknownTypesAreLeftOutWithAWarning)
     EXPECT_THAT(refusal.errors(), testing::ElementsAre("Unserializable type found in an Any!"));
 }
 
+TEST(StreamRoundTrip, WhatCouldNotBeReadAgainIsNotWritten)
+{
+    support::Messages messages;
+    auto const mode = static_cast<Veldrin::Geometry::Common::DataInterpolationMode>(7);
+    EXPECT_EQ(support::written({objectWith("mode", mode)}, 9, &messages), "");
+    Nexil::String const cutPath("/dev/null\0more", 14);
+    support::Objects out;
+    EXPECT_FALSE(Veldrin::IO::serialize({objectWith("n", 1)}, cutPath, {}, &messages));
+    EXPECT_FALSE(Veldrin::IO::deserialize(cutPath, out, {}, &messages));
+    std::string const whole(cutPath.view());
+    EXPECT_THAT(messages.errors(),
+                testing::ElementsAre("Integral type overflow", "Cannot open file for writing: " + whole,
+                                     "Cannot open file for reading: " + whole));
+}
+
 TEST(StreamRoundTrip, HandlesStoreTheirAddressesAndComeBackAsObjects)
 {
     ObjectPtr const object = objectWith("n", 1);

@@ -5,6 +5,7 @@
 #include <veldrin/io/StreamKeys.h>
 #include <veldrin/io/internal/ByteSink.h>
 #include <veldrin/io/internal/ByteSource.h>
+#include <veldrin/io/internal/EntryPoint.h>
 #include <veldrin/io/internal/Msgpack.h>
 #include <veldrin/io/internal/StreamHeader.h>
 #include <veldrin/io/internal/StreamReader.h>
@@ -23,39 +24,6 @@ namespace {
     using Objects = Nexil::Array<Nexil::Ptr<Object>>;
 
     constexpr std::size_t kFileBufferBytes = std::size_t(2) << 20;
-
-    bool report(Nexil::RuntimeServices const* services, Nexil::String const& text)
-    {
-        if (services)
-            services->logMessage({Nexil::RuntimeMessageCategory::Error, text});
-        return false;
-    }
-
-    /// The shape of every entry point: does the work, and turns what it throws into false and a message.
-    /// ioMessage: what to say when the stream itself fails.
-    template <class Work>
-    bool runReported(Nexil::RuntimeServices const* services, Nexil::String const& ioMessage, Work const& work)
-    {
-        try {
-            return work();
-        } catch (Nexil::String const& text) {
-            return report(services, text);
-        } catch (WriteFailure const&) {
-            return report(services, ioMessage);
-        } catch (std::ios_base::failure const&) {
-            return report(services, ioMessage);
-        } catch (std::bad_alloc const&) {
-            throw;
-        } catch (std::runtime_error const& error) {
-            // A cancelled job is no failure. Of the MessagePack library's errors some are runtime errors too.
-            if (std::strcmp(error.what(), Nexil::Internal::kJobCancelledText) == 0)
-                return false;
-            return report(services, "Unknown msgpack error occurred");
-        } catch (...) {
-            // Also what a caller's own stream buffer or object class throws.
-            return report(services, "Unknown msgpack error occurred");
-        }
-    }
 
     bool writeReported(Objects const& objects, WriterContext const& context, Nexil::OutputStream& stream)
     {
@@ -117,7 +85,10 @@ namespace {
         }
         if (buffer->pubseekpos(std::streampos(position), std::ios_base::in) != std::streampos(position))
             throwTruncated();
-        return readObjects(*buffer, static_cast<std::uint64_t>(position), static_cast<std::uint64_t>(end), out);
+        bool const isRead =
+            readObjects(*buffer, static_cast<std::uint64_t>(position), static_cast<std::uint64_t>(end), out);
+        buffer->pubseekpos(std::streampos(end), std::ios_base::in);
+        return isRead;
     }
 
     bool readHeaderOnly(std::istream& stream, Object& header)
@@ -132,18 +103,6 @@ namespace {
         return true;
     }
 
-    /// Opens a file for reading and works on it.
-    template <class Work>
-    bool withInputFile(Nexil::String const& path, Nexil::RuntimeServices const* services, Work const& work)
-    {
-        return runReported(services, Nexil::String("Cannot read from file: ") + path, [&] {
-            std::ifstream file(path.c_str(), std::ios_base::in | std::ios_base::binary);
-            if (!file)
-                throw Nexil::String("Cannot open file for reading: ") + path;
-            return work(file);
-        });
-    }
-
 } // namespace
 
 bool serialize(Objects const& objects, Nexil::String const& path, SerializationOptions const& options,
@@ -155,9 +114,9 @@ bool serialize(Objects const& objects, Nexil::String const& path, SerializationO
         std::ofstream file;
         // Once a file is open the buffer can no longer be set.
         file.rdbuf()->pubsetbuf(memory.get(), kFileBufferBytes);
-        file.open(path.c_str(), std::ios_base::out | std::ios_base::binary | std::ios_base::trunc);
+        file.open(systemPath(path, kCannotOpenForWriting), std::ios_base::out | std::ios_base::binary | std::ios_base::trunc);
         if (!file)
-            throw Nexil::String("Cannot open file for writing: ") + path;
+            throw Nexil::String(kCannotOpenForWriting) + path;
         writeStream(objects, context, file);
         file.close();
         if (!file)

@@ -50,7 +50,8 @@ VELDRIN_API bool serialize(Nexil::Array<Nexil::Ptr<Object>*> const& handles, Nex
 
 /// Reads a stream of any version and appends its top-level objects to `out`, which is untouched on failure.
 ///
-/// The stream is read from where it stands, to its end. One that cannot seek is first read into memory.
+/// The stream is read from where it stands, to its end, where it is left; after a failure it stands anywhere. One that
+/// cannot seek is first read into memory.
 /// Memory: never more than 300 times the stream's bytes and 64 MiB, whatever the bytes are; for honest streams near the
 /// size of the result.
 /// Errors: docs/zon-format.md lists each message at its cause.

@@ -3,7 +3,7 @@
 #include <nexil/JobCancel.h>
 #include <nexil/String.h>
 #include <veldrin/io/StreamKeys.h>
-#include <veldrin/io/internal/FileEntry.h>
+#include <veldrin/io/internal/EntryTable.h>
 #include <veldrin/io/internal/StreamHeader.h>
 #include <veldrin/io/internal/UnpackVisitor.h>
 #include <veldrin/object/Properties.h>
@@ -22,51 +22,6 @@ namespace {
         throw Nexil::String("Corrupt handles");
     }
 
-    std::uint64_t readTableOffset(ByteSource& source)
-    {
-        std::uint64_t const position = source.position();
-        if (source.bytesLeft() < 9 || source.take() != 0xCF)
-            throw Nexil::String("Corrupt stream header");
-        std::uint64_t offset = 0;
-        for (int i = 0; i < 8; ++i)
-            offset = offset << 8 | source.take();
-        if (offset < position + 9 || offset > source.end())
-            throw Nexil::String("Corrupt stream header");
-        return offset;
-    }
-
-    EntryRole roleOf(V5::FileEntry const& entry)
-    {
-        return static_cast<EntryRole>(entry.mark & kRoleMask);
-    }
-
-    /// Reads a number of the table, in any of the forms of an unsigned integer.
-    std::uint64_t readTableNumber(ItemReader& reader, ByteSource& source)
-    {
-        try {
-            auto const& item = reader.next(source.end());
-            if (item.type == msgpack::type::POSITIVE_INTEGER)
-                return item.via.u64;
-        } catch (msgpack::type_error const&) {
-        } catch (msgpack::insufficient_bytes const&) {
-        }
-        throwCorruptHandles();
-    }
-
-    std::vector<V5::FileEntry> readTable(ByteSource& source, std::uint64_t offset)
-    {
-        std::vector<V5::FileEntry> entries;
-        source.seek(offset);
-        ItemReader reader(source);
-        while (source.position() < source.end()) {
-            V5::FileEntry entry{entries.size()};
-            entry.position = readTableNumber(reader, source);
-            entry.mark = readTableNumber(reader, source);
-            entries.push_back(entry);
-        }
-        return entries;
-    }
-
     /// One item of the stream: what its bytes are, and what was read from them.
     struct Item {
         std::uint64_t position;
@@ -81,9 +36,8 @@ namespace {
     public:
         EntryReader(ByteSource& source, Object const& header, bool hasHashes)
             : source_(source), hasHashes_(hasHashes), isCompressed_(headerSigned(header, sCompressionLevel) > 0),
-              hasHandles_(headerFlag(header, sStreamHandles)), itemsBegin_(source.position() + 9),
-              itemsEnd_(readTableOffset(source)), entries_(readTable(source, itemsEnd_)), reader_(source),
-              visitor_(reader_, isCompressed_, this)
+              hasHandles_(headerFlag(header, sStreamHandles)), table_(readEntryTable(source)),
+              entries_(table_.entries), reader_(source), visitor_(reader_, isCompressed_, this)
         {
             checkRoles();
             layOutItems();
@@ -145,8 +99,8 @@ namespace {
                     throwCorruptHandles();
                 itemOfEntry_[index] = items_.size() - 1;
             }
-            std::uint64_t const first = items_.empty() ? itemsEnd_ : items_.front().position;
-            if (first != itemsBegin_ || (!items_.empty() && items_.back().position >= itemsEnd_))
+            std::uint64_t const first = items_.empty() ? table_.itemsEnd : items_.front().position;
+            if (first != table_.itemsBegin || (!items_.empty() && items_.back().position >= table_.itemsEnd))
                 throwCorruptHandles();
         }
 
@@ -160,7 +114,7 @@ namespace {
         {
             Nexil::Internal::throwIfJobCancelled();
             Item& item = items_[number];
-            std::uint64_t const end = number + 1 < items_.size() ? items_[number + 1].position : itemsEnd_;
+            std::uint64_t const end = number + 1 < items_.size() ? items_[number + 1].position : table_.itemsEnd;
             if (!hasHashes_)
                 return readValue(item, end, 0);
             EntryRole const role = static_cast<EntryRole>(item.mark & kRoleMask);
@@ -234,9 +188,8 @@ namespace {
         bool hasHashes_;
         bool isCompressed_;
         bool hasHandles_;
-        std::uint64_t itemsBegin_;
-        std::uint64_t itemsEnd_;
-        std::vector<V5::FileEntry> entries_;
+        EntryTable table_;
+        std::vector<V5::FileEntry> const& entries_;
         ItemReader reader_;
         V3::UnpackVisitor visitor_;
         std::uint64_t slotCount_ = 0;

@@ -104,7 +104,11 @@ void PackVisitor::packPayload(Nexil::Any const& value, StreamType const& type)
     if (TypeCode::isMathValue(type.code))
         return writeChunks(packer_, sink_, type.valueBytes(value), 1, type.elementSize, compressionLevel_);
     if (type.code == TypeCode::kInterpolation) {
-        packer_.pack_unsigned_int(static_cast<unsigned int>(*value.get<DataInterpolationMode>()));
+        auto const mode = *value.get<DataInterpolationMode>();
+        // A file with any other number could not be read again.
+        if (mode > DataInterpolationMode::DefaultValue)
+            throw Nexil::String("Integral type overflow");
+        packer_.pack_unsigned_int(static_cast<unsigned int>(mode));
         return;
     }
     if (type.code == TypeCode::kCurve) {
