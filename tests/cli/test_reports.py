@@ -132,6 +132,8 @@ class Verify(tool.ToolTest):
 
     def test_old_versions_are_read_without_hashes(self):
         self.assertIn("version 3 has no hashes", self.zon("verify", VALID / "v3.zon").stdout)
+        report = self.json("verify", VALID / "v5.zon")
+        self.assertEqual((report["hashes_checked"], len(report["entries"]), report["objects"]), (False, 4, 3))
 
 
 class Diff(tool.ToolTest):

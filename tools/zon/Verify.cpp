@@ -1,7 +1,9 @@
 #include "Command.h"
 #include "Console.h"
-#include "EntryTable.h"
+#include "ValueRows.h"
 #include "ZonFile.h"
+
+#include <veldrin/io/StreamInspection.h>
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
@@ -9,7 +11,6 @@
 
 #include <algorithm>
 #include <memory>
-#include <optional>
 
 namespace Zon {
 
@@ -17,7 +18,8 @@ namespace {
 
     using Json = nlohmann::ordered_json;
 
-    constexpr unsigned int kFirstVersionWithHashes = 6;
+    using Veldrin::IO::StreamEntry;
+
     constexpr char const* kRoles[] = {"shared", "top", "handles", "unknown"};
 
     struct Options {
@@ -28,31 +30,26 @@ namespace {
     /// What was found out about the file.
     struct Report {
         ZonHeader header;
-        std::vector<EntryState> entries;
+        Veldrin::IO::StreamLayout layout;
         std::string tableFault; ///< "" when the table could be read, or there is none
         std::string readFault;  ///< the library's message; "" when everything could be read
         std::uint64_t objectCount = 0;
 
-        [[nodiscard]] bool hasHashes() const { return header.version >= kFirstVersionWithHashes; }
-        [[nodiscard]] std::uint64_t damagedCount() const
+        [[nodiscard]] bool areEntriesIntact() const
         {
-            return static_cast<std::uint64_t>(
-                std::count_if(entries.begin(), entries.end(), [](EntryState const& entry) { return !entry.isIntact; }));
+            return std::all_of(layout.entries.begin(), layout.entries.end(),
+                               [](StreamEntry const& entry) { return entry.isIntact; });
         }
-        [[nodiscard]] bool isIntact() const { return tableFault.empty() && readFault.empty() && damagedCount() == 0; }
+        [[nodiscard]] bool isIntact() const { return tableFault.empty() && readFault.empty() && areEntriesIntact(); }
     };
 
     Report verify(std::string const& path)
     {
         Report report;
         report.header = readZonHeader(path);
-        if (report.hasHashes()) {
-            try {
-                report.entries = checkEntries(path, report.header);
-            } catch (Failure const& failure) {
-                report.tableFault = failure.what();
-            }
-        }
+        Messages messages;
+        if (!Veldrin::IO::inspectStream(Nexil::String(std::string_view(path)), report.layout, &messages))
+            report.tableFault = messages.errorText();
         try {
             report.objectCount = readZon(path).size();
         } catch (Failure const& failure) {
@@ -69,30 +66,35 @@ namespace {
         auto const ok = colored(stdout, Color::Green, "ok");
         fmt::print("{}: zon version {}, level {}, {} bytes\n", options.input, report.header.version,
                    report.header.level, report.header.fileSize);
-        for (std::size_t i = 0; i < report.entries.size(); ++i) {
-            auto const& entry = report.entries[i];
+        for (std::size_t i = 0; i < report.layout.entries.size(); ++i) {
+            auto const& entry = report.layout.entries[i];
             fmt::print("  entry {:>4}  at {:>10}  {:>12} bytes  {:<7}  {}  {}\n", i, entry.position, entry.byteCount,
-                       kRoles[entry.role], entry.isIntact ? ok : damaged, entry.type);
+                       kRoles[static_cast<unsigned int>(entry.role)],
+                       !entry.isIntact           ? damaged
+                       : report.layout.hasHashes ? ok
+                                                 : "unhashed",
+                       typeNameOfCode(entry.typeCode));
         }
-        if (!report.hasHashes())
+        if (report.tableFault.empty() && !report.layout.hasHashes)
             fmt::print("  version {} has no hashes: values were read, not checked\n", report.header.version);
         if (!report.tableFault.empty())
             fmt::print("  {}: {}\n", damaged, report.tableFault);
-        if (!report.readFault.empty())
+        if (!report.readFault.empty() && report.readFault != report.tableFault)
             fmt::print("  {}: {}\n", damaged, report.readFault);
         if (report.isIntact())
             fmt::print("{}: {}, {}\n", ok, counted(report.objectCount, "object"),
-                       report.entries.size() == 1 ? "1 entry" : fmt::format("{} entries", report.entries.size()));
+                       report.layout.entries.size() == 1 ? "1 entry"
+                                                         : fmt::format("{} entries", report.layout.entries.size()));
     }
 
     void printJson(Options const& options, Report const& report)
     {
         Json entries = Json::array();
-        for (auto const& entry : report.entries)
+        for (auto const& entry : report.layout.entries)
             entries.push_back({{"position", entry.position},
                                {"bytes", entry.byteCount},
-                               {"role", kRoles[entry.role]},
-                               {"type", entry.type},
+                               {"role", kRoles[static_cast<unsigned int>(entry.role)]},
+                               {"type", typeNameOfCode(entry.typeCode)},
                                {"ok", entry.isIntact}});
         auto const textOrNull = [](std::string const& text) { return text.empty() ? Json() : Json(text); };
         Json const json{{"file", options.input},
@@ -100,7 +102,7 @@ namespace {
                         {"level", report.header.level},
                         {"bytes", report.header.fileSize},
                         {"ok", report.isIntact()},
-                        {"hashes_checked", report.hasHashes()},
+                        {"hashes_checked", report.layout.hasHashes},
                         {"objects", report.readFault.empty() ? Json(report.objectCount) : Json()},
                         {"entries", entries},
                         {"table_fault", textOrNull(report.tableFault)},

@@ -103,7 +103,6 @@ ZonHeader readZonHeader(std::string const& path)
     header.version = Veldrin::getPropertyAs<unsigned int>(*object, Veldrin::IO::sStreamVersion);
     header.level = Veldrin::getPropertyAs<int>(*object, Veldrin::IO::sCompressionLevel);
     header.hasHandles = Veldrin::getPropertyAs<bool>(*object, Veldrin::IO::sStreamHandles);
-    header.size = static_cast<std::uint64_t>(std::streamoff(file.tellg()));
     file.seekg(0, std::ios::end);
     header.fileSize = static_cast<std::uint64_t>(std::streamoff(file.tellg()));
     return header;

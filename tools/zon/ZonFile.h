@@ -28,8 +28,6 @@ struct ZonHeader {
     unsigned int version = 0;
     int level = 0;
     bool hasHandles = false;
-    /// Position of the first byte behind the header.
-    std::uint64_t size = 0;
     std::uint64_t fileSize = 0;
 };
 
