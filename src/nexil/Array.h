@@ -37,6 +37,8 @@ namespace Internal {
         /// Uninitialised storage for `count` elements, null for 0. Large blocks ask the system for huge pages.
         /// Errors: std::bad_alloc, also when the byte size does not fit 64 bits.
         [[nodiscard]] void* allocate(std::uint64_t count) const;
+        /// The same for a block that a doubling array will soon leave again: on ordinary pages.
+        [[nodiscard]] void* allocateWhileGrowing(std::uint64_t count) const;
         void deallocate(void* pointer, std::uint64_t count) const noexcept;
     };
 
@@ -152,8 +154,10 @@ private:
 
     /// Fresh storage that is given back unless it ends up in an array.
     struct Storage {
-        Storage(Internal::UntypedTypeRep const& elementType, std::uint64_t count)
-            : type(elementType), data(static_cast<T*>(elementType.allocate(count))), capacity(count)
+        Storage(Internal::UntypedTypeRep const& elementType, std::uint64_t count, bool isGrowing = false)
+            : type(elementType),
+              data(static_cast<T*>(isGrowing ? elementType.allocateWhileGrowing(count) : elementType.allocate(count))),
+              capacity(count)
         {
         }
         Storage(Storage const&) = delete;
@@ -176,7 +180,7 @@ private:
     void append(Source&& value)
     {
         if (size_ == capacity_) {
-            Storage fresh(type_, capacity_ + std::max<std::uint64_t>(capacity_, 1));
+            Storage fresh(type_, capacity_ + std::max<std::uint64_t>(capacity_, 1), true);
             // Before the others move, so that a failure changes nothing and `value` may be one of them.
             std::construct_at(fresh.data + size_, std::forward<Source>(value));
             moveInto(fresh);
