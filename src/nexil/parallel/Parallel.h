@@ -49,12 +49,12 @@ void forRange(std::size_t count, std::size_t grain, Body const& body)
 #endif
 }
 
-/// Runs both, one beside the other where a thread is free.
+/// Runs both, one beside the other where a thread is free; the second one on the calling thread.
 template <class First, class Second>
 void invoke(First const& first, Second const& second)
 {
 #if defined(NEXIL_PARALLEL_ON_PLAIN_THREADS)
-    PlainThreads::runBoth(first, second);
+    PlainThreads::runBoth(second, first);
 #else
     tbb::task_group_context context(tbb::task_group_context::isolated);
     tbb::parallel_invoke(first, second, context);

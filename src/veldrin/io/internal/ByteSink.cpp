@@ -44,7 +44,7 @@ void ByteSink::write(char const* bytes, std::size_t byteCount)
         }
     };
     if (byteCount >= kHashBesideFromBytes) {
-        Nexil::parallel::invoke(putRun, hashRun);
+        Nexil::parallel::invoke(hashRun, putRun);
     } else {
         hashRun();
         putRun();
