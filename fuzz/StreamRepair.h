@@ -58,7 +58,8 @@ inline void repairMarks(std::uint8_t* data, std::size_t size)
             continue;
         std::uint64_t const role = data[record.markAt + 7] & 3u;
         std::uint64_t const seed = records.size() * 8 + level + role;
-        std::uint64_t mark = (XXH3_64bits_withSeed(data + record.position, *end - record.position, seed) & ~3ull) | role;
+        std::uint64_t mark =
+            (XXH3_64bits_withSeed(data + record.position, *end - record.position, seed) & ~3ull) | role;
         for (std::size_t i = 8; i-- > 0; mark >>= 8)
             data[record.markAt + i] = static_cast<std::uint8_t>(mark & 0xFF);
     }

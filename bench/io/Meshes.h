@@ -52,8 +52,7 @@ inline FlatMesh permutedTorus(unsigned int side)
             auto at = [&](unsigned int a, unsigned int b) { return place[std::size_t(b % side) * side + a % side]; };
             mesh.positions[at(i, j)] = {(1 + radius * std::cos(v)) * std::cos(u), radius * std::sin(v),
                                         (1 + radius * std::cos(v)) * std::sin(u)};
-            mesh.faceVertex.insert(mesh.faceVertex.end(),
-                                   {at(i, j), at(i + 1, j), at(i + 1, j + 1), at(i, j + 1)});
+            mesh.faceVertex.insert(mesh.faceVertex.end(), {at(i, j), at(i + 1, j), at(i + 1, j + 1), at(i, j + 1)});
             mesh.faceOffset.push_back(static_cast<unsigned int>(mesh.faceVertex.size()));
         }
     return mesh;

@@ -76,7 +76,7 @@ std::vector<Part> parts()
 void finish(benchmark::State& state, std::string const& path)
 {
     state.SetBytesProcessed(static_cast<std::int64_t>(state.iterations() * mesh().byteSize()));
-    struct stat status{};
+    struct stat status {};
     if (stat(path.c_str(), &status) == 0)
         state.counters["file MB"] = static_cast<double>(status.st_size) / 1e6;
 }
@@ -276,8 +276,8 @@ void hdf5WriteFile(std::string const& path, unsigned int deflate)
             H5Pset_shuffle(settings);
             H5Pset_deflate(settings, deflate);
         }
-        hid_t const set = H5Dcreate2(file, std::to_string(number++).c_str(), type, space, H5P_DEFAULT, settings,
-                                     H5P_DEFAULT);
+        hid_t const set =
+            H5Dcreate2(file, std::to_string(number++).c_str(), type, space, H5P_DEFAULT, settings, H5P_DEFAULT);
         H5Dwrite(set, type, H5S_ALL, H5S_ALL, H5P_DEFAULT, part.bytes);
         H5Dclose(set);
         H5Pclose(settings);

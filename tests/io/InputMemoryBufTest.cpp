@@ -62,13 +62,22 @@ TEST(InputMemoryBuf, SeeksWithinTheBlockAlone)
     };
     constexpr auto kFar = std::numeric_limits<std::streamoff>::max();
     constexpr auto kNear = std::numeric_limits<std::streamoff>::min();
-    for (Case const& test :
-         {Case{0, std::ios_base::beg, 0}, {10, std::ios_base::beg, 10}, {11, std::ios_base::beg, -1},
-          {-1, std::ios_base::beg, -1}, {0, std::ios_base::cur, 4}, {6, std::ios_base::cur, 10},
-          {7, std::ios_base::cur, -1}, {-4, std::ios_base::cur, 0}, {-5, std::ios_base::cur, -1},
-          {0, std::ios_base::end, 10}, {1, std::ios_base::end, -1}, {-10, std::ios_base::end, 0},
-          {-11, std::ios_base::end, -1}, {kFar, std::ios_base::cur, -1}, {kNear, std::ios_base::end, -1},
-          {0, static_cast<std::ios_base::seekdir>(7), -1}}) {
+    for (Case const& test : {Case{0, std::ios_base::beg, 0},
+                             {10, std::ios_base::beg, 10},
+                             {11, std::ios_base::beg, -1},
+                             {-1, std::ios_base::beg, -1},
+                             {0, std::ios_base::cur, 4},
+                             {6, std::ios_base::cur, 10},
+                             {7, std::ios_base::cur, -1},
+                             {-4, std::ios_base::cur, 0},
+                             {-5, std::ios_base::cur, -1},
+                             {0, std::ios_base::end, 10},
+                             {1, std::ios_base::end, -1},
+                             {-10, std::ios_base::end, 0},
+                             {-11, std::ios_base::end, -1},
+                             {kFar, std::ios_base::cur, -1},
+                             {kNear, std::ios_base::end, -1},
+                             {0, static_cast<std::ios_base::seekdir>(7), -1}}) {
         Probe buffer(bytes, 10);
         buffer.seekpos(4, std::ios_base::in);
         auto const found = std::streamoff(buffer.seekoff(test.offset, test.direction, std::ios_base::out));

@@ -82,8 +82,14 @@ TEST(StreamRoundTrip, ChunksAreCutWhereTheVariableSays)
         char const* text;
         bool cutsBytes;
     };
-    for (Case const& test : {Case{"0", true}, {"-5", true}, {"many", true}, {"", true}, {" \t1x", true}, {"+1", true},
-                             {"4004", false}, {"99999999999999999999999", false}}) {
+    for (Case const& test : {Case{"0", true},
+                             {"-5", true},
+                             {"many", true},
+                             {"", true},
+                             {" \t1x", true},
+                             {"+1", true},
+                             {"4004", false},
+                             {"99999999999999999999999", false}}) {
         support::EnvironmentVariable const variable(kChunkLimit, test.text);
         std::string const bytes = support::written(objects, 0);
         EXPECT_EQ(bytes.find(whole) == std::string::npos, test.cutsBytes) << '"' << test.text << '"';
@@ -319,8 +325,8 @@ TEST(StreamHeader, IsReadAloneAndNothingBehindIt)
     Veldrin::Object header;
     ASSERT_TRUE(Veldrin::IO::deserializeHeader(input, header, nullptr));
     EXPECT_EQ(stream.tellg(), std::streampos(82));
-    EXPECT_EQ(header.keys(),
-              (Nexil::Array<Nexil::String>{"file_identifier", "file_version", "compression_level", "serialize_handles"}));
+    EXPECT_EQ(header.keys(), (Nexil::Array<Nexil::String>{"file_identifier", "file_version", "compression_level",
+                                                          "serialize_handles"}));
     EXPECT_EQ(getPropertyAs<unsigned int>(header, Veldrin::IO::sStreamIdentifier), 6611198u);
     EXPECT_EQ(getPropertyAs<unsigned int>(header, Veldrin::IO::sStreamVersion), 6u);
     EXPECT_EQ(getPropertyAs<int>(header, Veldrin::IO::sCompressionLevel), 3);
@@ -348,10 +354,9 @@ TEST(StreamFailure, NamesThePathAndLeavesTheOutputAlone)
     EXPECT_FALSE(Veldrin::IO::deserialize("/no/such/file", out, {}, &messages));
     EXPECT_FALSE(Veldrin::IO::deserializeHeader("/no/such/file", header, &messages));
     EXPECT_FALSE(Veldrin::IO::deserialize("/dev/null", out, {}, &messages));
-    EXPECT_THAT(messages.errors(), testing::ElementsAre("Cannot read from file: /dev",
-                                                        "Cannot open file for reading: /no/such/file",
-                                                        "Cannot open file for reading: /no/such/file",
-                                                        "Unknown msgpack error occurred"));
+    EXPECT_THAT(messages.errors(),
+                testing::ElementsAre("Cannot read from file: /dev", "Cannot open file for reading: /no/such/file",
+                                     "Cannot open file for reading: /no/such/file", "Unknown msgpack error occurred"));
     EXPECT_EQ(out.size(), 1u);
     EXPECT_TRUE(header.empty());
 }

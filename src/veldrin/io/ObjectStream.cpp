@@ -114,7 +114,8 @@ bool serialize(Objects const& objects, Nexil::String const& path, SerializationO
         std::ofstream file;
         // Once a file is open the buffer can no longer be set.
         file.rdbuf()->pubsetbuf(memory.get(), kFileBufferBytes);
-        file.open(systemPath(path, kCannotOpenForWriting), std::ios_base::out | std::ios_base::binary | std::ios_base::trunc);
+        file.open(systemPath(path, kCannotOpenForWriting),
+                  std::ios_base::out | std::ios_base::binary | std::ios_base::trunc);
         if (!file)
             throw Nexil::String(kCannotOpenForWriting) + path;
         writeStream(objects, context, file);

@@ -61,8 +61,7 @@ namespace {
             Nexil::Internal::throwIfJobCancelled();
             std::uint64_t const end = *std::upper_bound(borders.begin(), borders.end(), entry.position);
             auto const role = static_cast<StreamEntry::Role>(entry.mark & kRoleMask);
-            bool const isIntact =
-                !layout.hasHashes || makeMark(hashOf(entry, end), roleOf(entry)) == entry.mark;
+            bool const isIntact = !layout.hasHashes || makeMark(hashOf(entry, end), roleOf(entry)) == entry.mark;
             layout.entries.push_back({entry.position, end - entry.position, role, typeCodeOf(source, entry, end),
                                       isIntact && role != StreamEntry::Role::Unknown});
         }

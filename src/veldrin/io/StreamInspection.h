@@ -29,7 +29,7 @@ struct StreamLayout {
     int compressionLevel = 0;
     bool hasHandles = false;
     bool hasHashes = false;
-    std::uint64_t byteCount = 0; ///< of the whole file
+    std::uint64_t byteCount = 0;       ///< of the whole file
     Nexil::Array<StreamEntry> entries; ///< by number; empty before version 5, which has no table
 };
 

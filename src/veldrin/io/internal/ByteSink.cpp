@@ -20,9 +20,7 @@ namespace {
 
 } // namespace
 
-ByteSink::ByteSink(std::streambuf& stream, std::uint64_t position) : stream_(stream), streamPosition_(position)
-{
-}
+ByteSink::ByteSink(std::streambuf& stream, std::uint64_t position) : stream_(stream), streamPosition_(position) {}
 
 void ByteSink::write(char const* bytes, std::size_t byteCount)
 {

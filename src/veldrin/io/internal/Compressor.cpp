@@ -72,10 +72,9 @@ CompressedHeader readCompressedHeader(std::byte const* header, std::uint64_t chu
     std::uint64_t const decodedSize = littleEndian32(header + 4);
     std::uint64_t const blockSize = littleEndian32(header + 8);
     bool const isSound = version == kFormatVersion && header[3] != std::byte(0) &&
-                         littleEndian32(header + 12) == chunkSize &&
-                         (isStored || flags >> kCodecShift == kCodecLz4) && decodedSize >= 1 &&
-                         decodedSize <= kMaxRatio * chunkSize && blockSize >= 1 && blockSize <= decodedSize &&
-                         blockSize <= kMaxBlockSize &&
+                         littleEndian32(header + 12) == chunkSize && (isStored || flags >> kCodecShift == kCodecLz4) &&
+                         decodedSize >= 1 && decodedSize <= kMaxRatio * chunkSize && blockSize >= 1 &&
+                         blockSize <= decodedSize && blockSize <= kMaxBlockSize &&
                          (!isStored || decodedSize + kCompressedHeaderSize == chunkSize);
     return {isSound, decodedSize, blockSize};
 }
@@ -89,8 +88,8 @@ void decompressChunk(std::byte const* chunk, std::size_t chunkSize, std::byte* t
                          blosc_cbuffer_validate(chunk, chunkSize, &validatedSize) == 0 && validatedSize == decodedSize;
     if (!isSound)
         throw Nexil::String("Decompression error");
-    int const result = blosc_decompress_ctx(chunk, target, decodedSize,
-                                            decompressionThreads(decodedSize, header.blockSize));
+    int const result =
+        blosc_decompress_ctx(chunk, target, decodedSize, decompressionThreads(decodedSize, header.blockSize));
     if (result < 0 || static_cast<std::size_t>(result) != decodedSize)
         throw Nexil::String("Decompression error");
 }

@@ -36,8 +36,8 @@ namespace {
     public:
         EntryReader(ByteSource& source, Object const& header, bool hasHashes)
             : source_(source), hasHashes_(hasHashes), isCompressed_(headerSigned(header, sCompressionLevel) > 0),
-              hasHandles_(headerFlag(header, sStreamHandles)), table_(readEntryTable(source)),
-              entries_(table_.entries), reader_(source), visitor_(reader_, isCompressed_, this)
+              hasHandles_(headerFlag(header, sStreamHandles)), table_(readEntryTable(source)), entries_(table_.entries),
+              reader_(source), visitor_(reader_, isCompressed_, this)
         {
             checkRoles();
             layOutItems();
@@ -167,8 +167,8 @@ namespace {
             if (number >= entries_.size())
                 throw Nexil::String("object index out of range");
             Item& item = items_[itemOfEntry_[number]];
-            bool const isNullSlot = item.code == TypeCode::kObject && item.isRead &&
-                                    !*item.value.get<Nexil::Ptr<Object>>();
+            bool const isNullSlot =
+                item.code == TypeCode::kObject && item.isRead && !*item.value.get<Nexil::Ptr<Object>>();
             if (!item.isRead || isNullSlot)
                 throw Nexil::String("ptr not found in map");
             if (item.code != code)
@@ -193,7 +193,7 @@ namespace {
         ItemReader reader_;
         V3::UnpackVisitor visitor_;
         std::uint64_t slotCount_ = 0;
-        std::vector<Item> items_;               // by position
+        std::vector<Item> items_;              // by position
         std::vector<std::size_t> itemOfEntry_; // by number of the entry
         std::uint64_t hash_ = 0;
     };

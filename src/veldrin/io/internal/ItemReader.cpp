@@ -235,8 +235,12 @@ void ItemReader::walk(std::uint64_t end)
             copyBytes(first & 0x1Fu, end);
         } else {
             switch (first) {
-            case 0xC0: case 0xC2: case 0xC3: break;            // nil, false, true
-            case 0xC4: case 0xC5: case 0xC6: {                 // binary
+            case 0xC0:
+            case 0xC2:
+            case 0xC3: break; // nil, false, true
+            case 0xC4:
+            case 0xC5:
+            case 0xC6: { // binary
                 std::uint64_t const size = copyBigEndian(1u << (first - 0xC4), end);
                 if (size > end - source_.position())
                     throwTruncated();
@@ -246,17 +250,25 @@ void ItemReader::walk(std::uint64_t end)
                     copyBytes(size, end);
                 break;
             }
-            case 0xCA: copyBytes(4, end); break;               // float 32
-            case 0xCB: copyBytes(8, end); break;               // float 64
-            case 0xCC: case 0xD0: copyBytes(1, end); break;    // 8-bit integers
-            case 0xCD: case 0xD1: copyBytes(2, end); break;    // 16-bit integers
-            case 0xCE: case 0xD2: copyBytes(4, end); break;    // 32-bit integers
-            case 0xCF: case 0xD3: copyBytes(8, end); break;    // 64-bit integers
-            case 0xD9: case 0xDA: case 0xDB:                   // string
+            case 0xCA: copyBytes(4, end); break; // float 32
+            case 0xCB: copyBytes(8, end); break; // float 64
+            case 0xCC:
+            case 0xD0: copyBytes(1, end); break; // 8-bit integers
+            case 0xCD:
+            case 0xD1: copyBytes(2, end); break; // 16-bit integers
+            case 0xCE:
+            case 0xD2: copyBytes(4, end); break; // 32-bit integers
+            case 0xCF:
+            case 0xD3: copyBytes(8, end); break; // 64-bit integers
+            case 0xD9:
+            case 0xDA:
+            case 0xDB: // string
                 copyBytes(copyBigEndian(1u << (first - 0xD9), end), end);
                 break;
-            case 0xDC: case 0xDD: open(copyBigEndian(2u << (first - 0xDC), end)); break;     // array
-            case 0xDE: case 0xDF: open(copyBigEndian(2u << (first - 0xDE), end) * 2); break; // map
+            case 0xDC:
+            case 0xDD: open(copyBigEndian(2u << (first - 0xDC), end)); break; // array
+            case 0xDE:
+            case 0xDF: open(copyBigEndian(2u << (first - 0xDE), end) * 2); break; // map
             default: throwMalformed(); // never used, or an extension, which no stream holds
             }
         }

@@ -24,7 +24,7 @@ public:
     static constexpr unsigned int kMaxInlineLevels = 32;
 
     struct Entry {
-        Nexil::Any pointer; // empty for a slot that repeats an earlier one
+        Nexil::Any pointer;       // empty for a slot that repeats an earlier one
         std::uint64_t sameAs = 0; // the entry itself, or the slot that it repeats
     };
 

@@ -32,8 +32,7 @@ namespace {
         Nexil::Array<Nexil::Ptr<Object>> const& objects_;
     };
 
-    std::unique_ptr<V1::UnpackVisitor> makeVisitor(unsigned int version, ItemReader& reader,
-                                                   V3::References* references)
+    std::unique_ptr<V1::UnpackVisitor> makeVisitor(unsigned int version, ItemReader& reader, V3::References* references)
     {
         if (version == 1)
             return std::make_unique<V1::UnpackVisitor>(reader);

@@ -34,8 +34,14 @@ namespace TypeCode {
     inline constexpr unsigned int kFloatArray = kArray + 8;
     inline constexpr unsigned int kUnsignedLongArray = kArray + 3;
 
-    [[nodiscard]] constexpr bool isScalar(unsigned int code) noexcept { return code < kString; }
-    [[nodiscard]] constexpr bool isMathValue(unsigned int code) noexcept { return code > kString && code < kArray; }
+    [[nodiscard]] constexpr bool isScalar(unsigned int code) noexcept
+    {
+        return code < kString;
+    }
+    [[nodiscard]] constexpr bool isMathValue(unsigned int code) noexcept
+    {
+        return code > kString && code < kArray;
+    }
     [[nodiscard]] constexpr bool isValueArray(unsigned int code) noexcept
     {
         return code >= kArray && code < kNestedArray;
