@@ -304,15 +304,16 @@ void hdf5Read(benchmark::State& state)
     auto const all = parts();
     for (auto _ : state) {
         hid_t const file = H5Fopen(path.c_str(), H5F_ACC_RDONLY, H5P_DEFAULT);
+        std::vector<std::unique_ptr<char[]>> targets;
         for (std::size_t i = 0; i < all.size(); ++i) {
             hid_t const set = H5Dopen2(file, std::to_string(i).c_str(), H5P_DEFAULT);
             hid_t const type = all[i].elementSize == 12 ? H5T_NATIVE_FLOAT : H5T_NATIVE_UINT;
-            std::unique_ptr<char[]> target(new char[all[i].size]);
-            H5Dread(set, type, H5S_ALL, H5S_ALL, H5P_DEFAULT, target.get());
-            benchmark::DoNotOptimize(target.get());
+            targets.emplace_back(new char[all[i].size]);
+            H5Dread(set, type, H5S_ALL, H5S_ALL, H5P_DEFAULT, targets.back().get());
             H5Dclose(set);
         }
         H5Fclose(file);
+        benchmark::DoNotOptimize(targets.data());
     }
     finish(state, path);
 }
