@@ -48,9 +48,9 @@ namespace {
 
         ItemReader reader(source);
         // Any number of records may name one item; its bytes are hashed once for each role that they give it.
-        std::map<std::pair<std::uint64_t, EntryRole>, std::uint64_t> hashes;
+        std::map<std::pair<std::uint64_t, std::uint64_t>, std::uint64_t> hashes;
         auto hashOf = [&](V5::FileEntry const& entry, std::uint64_t end) {
-            auto const [place, isNew] = hashes.try_emplace({entry.position, roleOf(entry)});
+            auto const [place, isNew] = hashes.try_emplace({entry.position, entry.mark & kRoleMask});
             if (isNew)
                 place->second = reader.hashOf(
                     entry.position, end, hashSeed(table.entries.size(), layout.compressionLevel >= 1, roleOf(entry)));
