@@ -99,7 +99,7 @@ def main():
                 failures.append(f"{path.name}: {failure}")
     print(f"{taken} of {len(files)} meshes: {taken - len(refused) - len(failures)} went round, {len(refused)} refused")
     print("\n".join(refused + failures))
-    return 1 if failures or taken == len(refused) else 0
+    return 1 if failures or refused or not taken else 0
 
 
 if __name__ == "__main__":

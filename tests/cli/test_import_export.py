@@ -236,6 +236,22 @@ class Export(tool.ToolTest):
         self.assertIn("no mesh", self.zon("export", corpus, "out.obj", code=2).stderr)
         self.assertEqual(self.names(), [])
 
+    def test_the_file_that_is_read_is_never_written_over(self):
+        self.write("quad.obj", QUAD_AND_TRIANGLE)
+        self.zon("import", "quad.obj", "quad.zon")
+        for command, name in (("import", "quad.obj"), ("export", "quad.zon")):
+            before = (self.folder / name).read_bytes()
+            self.assertIn("is the file that is read", self.zon(command, name, "./" + name, code=2).stderr)
+            self.assertEqual((self.folder / name).read_bytes(), before)
+
+    def test_names_from_a_file_send_nothing_to_the_terminal(self):
+        self.write("named.obj", "\ufeffo \x1b[2Jred\nv 0 0 0\nv 1 0 0\nvn 0 0 1\n")
+        self.assertIn("normals that no face uses", self.zon("import", "named.obj", "named.zon").stderr)
+        for command in ("info", "dump"):
+            text = self.zon(command, "named.zon").stdout
+            self.assertIn("?[2Jred", text)
+            self.assertNotIn("\x1b", text)
+
 
 if __name__ == "__main__":
     tool.main()

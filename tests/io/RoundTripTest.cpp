@@ -250,14 +250,21 @@ TEST(StreamRoundTrip, WhatCouldNotBeReadAgainIsNotWritten)
     support::Messages messages;
     auto const mode = static_cast<Veldrin::Geometry::Common::DataInterpolationMode>(7);
     EXPECT_EQ(support::written({objectWith("mode", mode)}, 9, &messages), "");
+    std::string const path = testing::TempDir() + "veldrin_kept.zon";
+    std::ofstream(path) << "kept";
+    Veldrin::IO::SerializationOptions options;
+    options.compressionLevel = 10;
+    EXPECT_FALSE(Veldrin::IO::serialize({objectWith("n", 1)}, path.c_str(), options, &messages));
+    EXPECT_EQ(support::fileBytes(path), "kept");
+    std::remove(path.c_str());
     Nexil::String const cutPath("/dev/null\0more", 14);
     support::Objects out;
     EXPECT_FALSE(Veldrin::IO::serialize({objectWith("n", 1)}, cutPath, {}, &messages));
     EXPECT_FALSE(Veldrin::IO::deserialize(cutPath, out, {}, &messages));
     std::string const whole(cutPath.view());
-    EXPECT_THAT(messages.errors(),
-                testing::ElementsAre("Integral type overflow", "Cannot open file for writing: " + whole,
-                                     "Cannot open file for reading: " + whole));
+    EXPECT_THAT(messages.errors(), testing::ElementsAre("Integral type overflow", "compression error",
+                                                        "Cannot open file for writing: " + whole,
+                                                        "Cannot open file for reading: " + whole));
 }
 
 TEST(StreamRoundTrip, HandlesStoreTheirAddressesAndComeBackAsObjects)

@@ -46,6 +46,15 @@ std::string errorText(int errorNumber)
     return std::generic_category().message(errorNumber);
 }
 
+std::string printable(std::string_view text, bool keepsLineEnds)
+{
+    std::string result(text);
+    for (char& c : result)
+        if ((c >= 0 && c < 32 && !(keepsLineEnds && c == '\n')) || c == 127)
+            c = '?';
+    return result;
+}
+
 std::string counted(std::uint64_t count, std::string_view noun)
 {
     return fmt::format("{} {}{}", count, noun, count == 1 ? "" : "s");

@@ -20,6 +20,9 @@ void warn(std::string_view text);
 /// The system's text for an error number.
 [[nodiscard]] std::string errorText(int errorNumber);
 
+/// Text from a file as a terminal may have it: '?' for each control byte, line ends among them unless they are kept.
+[[nodiscard]] std::string printable(std::string_view text, bool keepsLineEnds = false);
+
 /// "1 face", "2 faces".
 [[nodiscard]] std::string counted(std::uint64_t count, std::string_view noun);
 

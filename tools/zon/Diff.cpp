@@ -6,6 +6,7 @@
 #include <fmt/format.h>
 #include <nlohmann/json.hpp>
 
+#include <cmath>
 #include <memory>
 
 namespace Zon {
@@ -25,6 +26,8 @@ namespace {
     ExitCode runDiff(Options const& options)
     {
         CompareOptions compareOptions;
+        if (!std::isfinite(options.tolerance))
+            throw Failure("--tolerance: is no finite number");
         if (options.tolerance >= 0)
             compareOptions.tolerance = options.tolerance;
         compareOptions.maxDifferences = options.maxDifferences;
@@ -48,9 +51,9 @@ namespace {
             fmt::print("{}\n", colored(stdout, Color::Green, "equal"));
         } else {
             for (auto const& difference : differences)
-                fmt::print("{}: {}: {} | {}\n", colored(stdout, Color::Bold, pathText(difference)), difference.what,
-                           colored(stdout, Color::Red, difference.first),
-                           colored(stdout, Color::Green, difference.second));
+                fmt::print("{}: {}: {} | {}\n", colored(stdout, Color::Bold, printable(pathText(difference))),
+                           printable(difference.what), colored(stdout, Color::Red, printable(difference.first)),
+                           colored(stdout, Color::Green, printable(difference.second)));
             fmt::print("{}{}\n", counted(differences.size(), "difference"),
                        isComplete ? "" : ", and not compared any further");
         }

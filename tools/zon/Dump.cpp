@@ -1,4 +1,5 @@
 #include "Command.h"
+#include "Console.h"
 #include "ZonFile.h"
 
 #include <veldrin/geometry/DebugDump.h>
@@ -20,7 +21,11 @@ namespace {
 
     class StandardOutput : public Veldrin::Geometry::Internal::DebugDumpInterface {
     public:
-        void write(char const* text, std::uint64_t length) override { std::fwrite(text, 1, length, stdout); }
+        void write(char const* text, std::uint64_t length) override
+        {
+            auto const safe = printable({text, static_cast<std::size_t>(length)}, true);
+            std::fwrite(safe.data(), 1, safe.size(), stdout);
+        }
     };
 
     ExitCode runDump(Options const& options)

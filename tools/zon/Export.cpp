@@ -168,6 +168,7 @@ namespace {
 
     ExitCode runExport(Options const& options)
     {
+        checkIsOtherFile(options.input, options.output);
         auto const objects = readZon(options.input);
         std::vector<MeshArrays> parts;
         std::vector<std::string> losses;

@@ -1,6 +1,7 @@
 #include "Command.h"
 #include "Console.h"
 #include "MeshArrays.h"
+#include "OutputFile.h"
 #include "TextInput.h"
 #include "ZonFile.h"
 
@@ -47,6 +48,7 @@ namespace {
 
     ExitCode runImport(Options const& options)
     {
+        checkIsOtherFile(options.input, options.output);
         auto file = readMeshFile(options.input);
         for (auto const& text : file.leftOut)
             warn(fmt::format("{}: not kept: {}", options.input, text));

@@ -130,9 +130,9 @@ namespace {
                         typeWidth, "elements", "stored (alone)", "decoded bytes", "target");
         fmt::print("{}\n", colored(stdout, Color::Bold, head));
         for (auto const& line : lines) {
-            auto const text =
-                fmt::format("    {:<{}}  {:<5}  {:<{}}  {:>12}  {:>14}  {:>14}  {}", line.name, nameWidth, line.role,
-                            line.type, typeWidth, line.elements, line.storedBytes, line.decodedBytes, line.target);
+            auto const text = fmt::format("    {:<{}}  {:<5}  {:<{}}  {:>12}  {:>14}  {:>14}  {}", printable(line.name),
+                                          nameWidth, line.role, line.type, typeWidth, line.elements, line.storedBytes,
+                                          line.decodedBytes, printable(line.target));
             fmt::print("{}\n", std::string_view(text).substr(0, text.find_last_not_of(' ') + 1));
         }
     }
@@ -144,9 +144,10 @@ namespace {
                    byteText(header.fileSize));
         for (std::size_t i = 0; i < reports.size(); ++i) {
             auto const& report = reports[i];
-            fmt::print("\nobject {}: {}{}\n", i, report.kind, report.name.empty() ? "" : " \"" + report.name + "\"");
+            fmt::print("\nobject {}: {}{}\n", i, report.kind,
+                       report.name.empty() ? "" : " \"" + printable(report.name) + "\"");
             for (auto const& [name, count] : report.components)
-                fmt::print("    {}: {}\n", name, count);
+                fmt::print("    {}: {}\n", printable(name), count);
             if (!report.properties.empty())
                 printTable(report.properties);
         }

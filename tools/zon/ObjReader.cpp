@@ -414,6 +414,10 @@ namespace {
                 takeCornerValues(normals_, corners, normalOf, lastNormalPart, part, unnamedNormals[part], normalTarget,
                                  mesh.cornerNormals);
                 takeCornerValues(uvs_, corners, uvOf, lastUVPart, part, unnamedUVs[part], uvTarget, mesh.cornerUVs);
+                if (corners.empty() && !unnamedNormals[part].empty())
+                    leftOut_.emplace("normals that no face uses");
+                if (corners.empty() && !unnamedUVs[part].empty())
+                    leftOut_.emplace("texture coordinates that no face uses");
                 if (!mesh.positions.empty())
                     file.parts.push_back(std::move(mesh));
             }
@@ -460,6 +464,9 @@ namespace {
 
 MeshFile readObj(std::string const& path, std::string_view bytes)
 {
+    // Some programs write a byte-order mark first.
+    if (bytes.starts_with("\xEF\xBB\xBF"))
+        bytes.remove_prefix(3);
     return Reader(path, bytes).read();
 }
 

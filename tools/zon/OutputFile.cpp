@@ -163,4 +163,11 @@ void OutputFile::commit()
     }
 }
 
+void checkIsOtherFile(std::string const& input, std::string const& output)
+{
+    std::error_code isNoFile;
+    if (fs::equivalent(input, output, isNoFile))
+        throw Failure(fmt::format("{}: is the file that is read", output));
+}
+
 } // namespace Zon

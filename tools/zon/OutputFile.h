@@ -43,4 +43,7 @@ private:
     int descriptor_ = -1;
 };
 
+/// Throws Failure when both names lead to one file, which writing would take away before anybody has compared.
+void checkIsOtherFile(std::string const& input, std::string const& output);
+
 } // namespace Zon

@@ -16,6 +16,7 @@
 #include <cerrno>
 #include <fstream>
 #include <streambuf>
+#include <utility>
 
 namespace Zon {
 
@@ -27,10 +28,34 @@ namespace {
         struct stat status {};
         if (stat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode))
             throw Failure(fmt::format("{}: cannot be read: {}", path, errorText(EISDIR)));
+        if (S_ISFIFO(status.st_mode) || S_ISSOCK(status.st_mode))
+            throw Failure(
+                fmt::format("{}: cannot be read: a pipe gives its bytes only once; put them into a file", path));
         errno = 0;
         file.open(path, std::ios::binary);
         if (!file)
             throw Failure(fmt::format("{}: cannot be read: {}", path, errorText(errno ? errno : EIO)));
+    }
+
+    /// A number of the header, of whatever integer type; 0 when it is missing or does not fit.
+    template <class Target>
+    Target integerUnder(Veldrin::Object const& header, char const* key)
+    {
+        auto const value = header.getProperty(key);
+        Target result = 0;
+        auto const take = [&](auto const* number) {
+            if (number && std::in_range<Target>(*number))
+                result = static_cast<Target>(*number);
+        };
+        take(value.get<unsigned char>());
+        take(value.get<unsigned short>());
+        take(value.get<unsigned int>());
+        take(value.get<unsigned long long>());
+        take(value.get<signed char>());
+        take(value.get<short>());
+        take(value.get<int>());
+        take(value.get<long long>());
+        return result;
     }
 
     /// Takes bytes and keeps only how many there were.
@@ -100,8 +125,8 @@ ZonHeader readZonHeader(std::string const& path)
     if (!Veldrin::IO::deserializeHeader(stream, *object, &messages))
         throw Failure(fmt::format("{}: no zon file: {}", path, messages.errorText()));
     ZonHeader header;
-    header.version = Veldrin::getPropertyAs<unsigned int>(*object, Veldrin::IO::sStreamVersion);
-    header.level = Veldrin::getPropertyAs<int>(*object, Veldrin::IO::sCompressionLevel);
+    header.version = integerUnder<unsigned int>(*object, Veldrin::IO::sStreamVersion);
+    header.level = integerUnder<int>(*object, Veldrin::IO::sCompressionLevel);
     header.hasHandles = Veldrin::getPropertyAs<bool>(*object, Veldrin::IO::sStreamHandles);
     file.seekg(0, std::ios::end);
     header.fileSize = static_cast<std::uint64_t>(std::streamoff(file.tellg()));

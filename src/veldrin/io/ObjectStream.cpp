@@ -5,6 +5,7 @@
 #include <veldrin/io/StreamKeys.h>
 #include <veldrin/io/internal/ByteSink.h>
 #include <veldrin/io/internal/ByteSource.h>
+#include <veldrin/io/internal/Compressor.h>
 #include <veldrin/io/internal/EntryPoint.h>
 #include <veldrin/io/internal/Msgpack.h>
 #include <veldrin/io/internal/StreamHeader.h>
@@ -110,6 +111,8 @@ bool serialize(Objects const& objects, Nexil::String const& path, SerializationO
 {
     WriterContext const context{options, false, {}, services};
     return runReported(services, Nexil::String("Cannot write to file: ") + path, [&] {
+        // Before the file is opened, which empties it.
+        checkLevel(options.compressionLevel);
         auto const memory = std::make_unique_for_overwrite<char[]>(kFileBufferBytes);
         std::ofstream file;
         // Once a file is open the buffer can no longer be set.

@@ -47,7 +47,10 @@ namespace {
         // A key's own value comes back exactly, next to an infinite one too.
         if (time == from.time)
             return from.value;
-        double const fraction = (time - from.time) / (to.time - from.time);
+        double const span = to.time - from.time;
+        // Halves keep keys at both ends of the range of numbers apart.
+        double const fraction = std::isfinite(span) ? (time - from.time) / span
+                                                    : (time / 2 - from.time / 2) / (to.time / 2 - from.time / 2);
         switch (from.interpolation) {
         case FCurve::Interpolation::Constant: return from.value;
         case FCurve::Interpolation::Linear: return from.value + (to.value - from.value) * fraction;

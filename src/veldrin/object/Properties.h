@@ -3,6 +3,8 @@
 #include <veldrin/object/Object.h>
 
 #include <cstddef>
+#include <string>
+#include <string_view>
 #include <type_traits>
 #include <utility>
 
@@ -32,7 +34,8 @@ template <class T>
 /// Stores `value` under `key`; false, and nothing stored, under an empty key.
 ///
 /// What the object model knows only by its base is stored as that: a writable pointer becomes a shared one, a pointer to
-/// a class derived from Object a `Ptr<Object>`, a text constant a `String`.
+/// a class derived from Object a `Ptr<Object>`, a text constant or
+/// standard string a `String`.
 template <class T>
 bool setProperty(Object& object, Nexil::String const& key, T&& value)
 {
@@ -42,6 +45,8 @@ bool setProperty(Object& object, Nexil::String const& key, T&& value)
         return object.setPropertyAny(key, Nexil::Ptr<Object>(std::forward<T>(value)));
     else if constexpr (Internal::WritablePointer<Value>::value)
         return object.setPropertyAny(key, typename Internal::WritablePointer<Value>::Shared(std::forward<T>(value)));
+    else if constexpr (std::is_same_v<Value, std::string> || std::is_same_v<Value, std::string_view>)
+        return object.setPropertyAny(key, Nexil::String(std::string_view(value)));
     else if constexpr (std::is_convertible_v<Value, char const*>)
         return object.setPropertyAny(key, Nexil::String(value));
     else

@@ -49,11 +49,16 @@ namespace {
 
 } // namespace
 
-std::size_t compressChunk(int level, std::size_t elementSize, void const* bytes, std::size_t byteCount, void* target)
+void checkLevel(int level)
 {
     // The compressor refuses other levels too, but complains on the standard error stream.
     if (level > kMaxLevel)
         throw Nexil::String("compression error");
+}
+
+std::size_t compressChunk(int level, std::size_t elementSize, void const* bytes, std::size_t byteCount, void* target)
+{
+    checkLevel(level);
     int const result = blosc_compress_ctx(level, BLOSC_SHUFFLE, elementSize, byteCount, bytes, target,
                                           byteCount + kMaxCompressionOverhead, BLOSC_LZ4_COMPNAME, 0, threadCount());
     // Beyond its own limit on the size the compressor answers 0.

@@ -16,6 +16,9 @@ inline constexpr std::size_t kCompressedHeaderSize = 16;
 [[nodiscard]] std::size_t compressChunk(int level, std::size_t elementSize, void const* bytes, std::size_t byteCount,
                                         void* target);
 
+/// Throws "compression error" for a level that the compressor does not know, so that nothing is begun with it.
+void checkLevel(int level);
+
 /// What a chunk claims to hold.
 struct CompressedHeader {
     /// False when no honest writer made this header, so that the decompressor must not see the chunk.
