@@ -15,6 +15,8 @@
 #include <nexil/Stream.h>
 #include <nexil/String.h>
 #include <nexil/TypeId.h>
+#include <veldrin/algorithms/ComponentConversion.h>
+#include <veldrin/algorithms/StrandMeasures.h>
 #include <veldrin/geometry/DataInterpolationMode.h>
 #include <veldrin/geometry/DebugDump.h>
 #include <veldrin/geometry/Export.h>

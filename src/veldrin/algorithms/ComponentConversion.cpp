@@ -1,0 +1,212 @@
+#include <veldrin/algorithms/ComponentConversion.h>
+
+#include <nexil/parallel/Parallel.h>
+#include <veldrin/algorithms/internal/TopologyArrays.h>
+
+#include <atomic>
+
+namespace Veldrin::Geometry {
+
+namespace {
+
+    using Mask = Nexil::Array<bool>;
+    using MaskPtr = Nexil::Ptr<Mask>;
+
+    namespace grain {
+        constexpr std::size_t kElements = 1024;
+    } // namespace grain
+
+    /// The mask of a destination component, all false, until it is handed out.
+    class Destination {
+    public:
+        Destination(Object const& geometry, char const* component, bool* success)
+            : mask_(Nexil::makeMutable<Mask>()), success_(success)
+        {
+            mask_->resize(getElementCount(geometry, component));
+        }
+
+        [[nodiscard]] std::uint64_t size() const noexcept { return mask_->size(); }
+        [[nodiscard]] bool* flags() noexcept { return mask_->data(); }
+
+        /// Several threads may set one flag at once.
+        void set(std::uint64_t index) noexcept
+        {
+            if (index < mask_->size())
+                std::atomic_ref<bool>(mask_->data()[index]).store(true, std::memory_order_relaxed);
+        }
+
+        MaskPtr finish(bool isConverted)
+        {
+            if (success_)
+                *success_ = isConverted;
+            return std::move(mask_);
+        }
+
+    private:
+        Nexil::MutablePtr<Mask> mask_;
+        bool* success_;
+    };
+
+    /// Calls body(i) for every i below `count`.
+    template <class Body>
+    void forEach(std::uint64_t count, Body const& body)
+    {
+        Nexil::parallel::forRange(count, grain::kElements, [&](std::size_t begin, std::size_t end) {
+            for (std::size_t i = begin; i < end; ++i)
+                body(i);
+        });
+    }
+
+    /// Whether a range is selected: any or all of isSelected(i) over it, and never for an empty one.
+    template <class IsSelected>
+    bool isRangeSelected(IndexRange range, TagConversionStyle style, IsSelected const& isSelected)
+    {
+        // What decides before the end: a selected element for "any", an unselected one for "all".
+        bool const decisive = style != TagConversionStyle::AllElements;
+        for (std::uint64_t i = range.begin; i < range.end; ++i)
+            if (isSelected(i) == decisive)
+                return decisive;
+        return !decisive && range.begin < range.end;
+    }
+
+    /// A mask as its source component has it: what is missing or surplus reads as unselected.
+    class Source {
+    public:
+        Source(Object const& geometry, char const* component, Mask const& mask)
+            : flags_(mask.data()), size_(std::min<std::uint64_t>(mask.size(), getElementCount(geometry, component)))
+        {
+        }
+
+        [[nodiscard]] std::uint64_t size() const noexcept { return size_; }
+        [[nodiscard]] bool operator[](std::uint64_t index) const noexcept { return index < size_ && flags_[index]; }
+
+    private:
+        bool const* flags_;
+        std::uint64_t size_;
+    };
+
+    /// Gathers over ranges: destination i from isSelected over its own range.
+    template <class IsSelected>
+    void gather(Destination& destination, OffsetRanges const& ranges, TagConversionStyle style,
+                IsSelected const& isSelected)
+    {
+        bool* const flags = destination.flags();
+        forEach(std::min(ranges.count(), destination.size()),
+                [&](std::uint64_t i) { flags[i] = isRangeSelected(ranges[i], style, isSelected); });
+    }
+
+    /// Scatters from ranges: every element of a selected range reaches visit(element).
+    template <class Visit>
+    void scatter(OffsetRanges const& ranges, Source const& source, Visit const& visit)
+    {
+        forEach(std::min(ranges.count(), source.size()), [&](std::uint64_t i) {
+            if (!source[i])
+                return;
+            IndexRange const range = ranges[i];
+            for (std::uint64_t k = range.begin; k < range.end; ++k)
+                visit(k);
+        });
+    }
+
+    /// From elements of `sourceName` to the elements that own ranges of them.
+    MaskPtr gatherOverOffsets(Object const& geometry, char const* destinationName, char const* offsetName,
+                              char const* sourceName, Mask const& mask, TagConversionStyle style, bool* success)
+    {
+        Destination destination(geometry, destinationName, success);
+        auto const offsets = dataOf<unsigned int>(geometry, offsetName);
+        if (!offsets)
+            return destination.finish(false);
+        Source const source(geometry, sourceName, mask);
+        // All beyond the source is unselected: looking at one of them decides as well as looking at each.
+        gather(destination, OffsetRanges(*offsets, source.size() + 1), style,
+               [&](std::uint64_t i) { return source[i]; });
+        return destination.finish(true);
+    }
+
+    /// From elements that own ranges of `destinationName` to those.
+    MaskPtr scatterOverOffsets(Object const& geometry, char const* destinationName, char const* offsetName,
+                               char const* sourceName, Mask const& mask, bool* success)
+    {
+        Destination destination(geometry, destinationName, success);
+        auto const offsets = dataOf<unsigned int>(geometry, offsetName);
+        if (!offsets)
+            return destination.finish(false);
+        scatter(OffsetRanges(*offsets, destination.size()), Source(geometry, sourceName, mask),
+                [&](std::uint64_t i) { destination.set(i); });
+        return destination.finish(true);
+    }
+
+} // namespace
+
+MaskPtr faceVerticesToFaces(Object const& geometry, Mask const& mask, TagConversionStyle style, bool* success)
+{
+    return gatherOverOffsets(geometry, sFaceComp, sFaceOffset, sFaceVertexComp, mask, style, success);
+}
+
+MaskPtr pointsToStrands(Object const& geometry, Mask const& mask, TagConversionStyle style, bool* success)
+{
+    return gatherOverOffsets(geometry, sStrandComp, sStrandOffset, sPointComp, mask, style, success);
+}
+
+MaskPtr pointsToFaces(Object const& geometry, Mask const& mask, TagConversionStyle style, bool* success)
+{
+    Destination destination(geometry, sFaceComp, success);
+    auto const offsets = dataOf<unsigned int>(geometry, sFaceOffset);
+    auto const corners = dataOf<unsigned int>(geometry, sFaceVertex);
+    if (!offsets || !corners)
+        return destination.finish(false);
+    Source const source(geometry, sPointComp, mask);
+    gather(destination, OffsetRanges(*offsets, corners->size()), style,
+           [&, points = corners->data()](std::uint64_t i) { return source[points[i]]; });
+    return destination.finish(true);
+}
+
+MaskPtr pointsToFaceVertices(Object const& geometry, Mask const& mask, bool* success)
+{
+    Destination destination(geometry, sFaceVertexComp, success);
+    auto const corners = dataOf<unsigned int>(geometry, sFaceVertex);
+    if (!corners)
+        return destination.finish(false);
+    Source const source(geometry, sPointComp, mask);
+    forEach(std::min(corners->size(), destination.size()), [&, flags = destination.flags(), points = corners->data()](
+                                                               std::uint64_t i) { flags[i] = source[points[i]]; });
+    return destination.finish(true);
+}
+
+MaskPtr faceVerticesToPoints(Object const& geometry, Mask const& mask, bool* success)
+{
+    Destination destination(geometry, sPointComp, success);
+    auto const corners = dataOf<unsigned int>(geometry, sFaceVertex);
+    if (!corners)
+        return destination.finish(false);
+    Source const source(geometry, sFaceVertexComp, mask);
+    forEach(std::min(corners->size(), source.size()), [&, points = corners->data()](std::uint64_t i) {
+        if (source[i])
+            destination.set(points[i]);
+    });
+    return destination.finish(true);
+}
+
+MaskPtr facesToFaceVertices(Object const& geometry, Mask const& mask, bool* success)
+{
+    return scatterOverOffsets(geometry, sFaceVertexComp, sFaceOffset, sFaceComp, mask, success);
+}
+
+MaskPtr strandsToPoints(Object const& geometry, Mask const& mask, bool* success)
+{
+    return scatterOverOffsets(geometry, sPointComp, sStrandOffset, sStrandComp, mask, success);
+}
+
+MaskPtr facesToPoints(Object const& geometry, Mask const& mask, bool* success)
+{
+    Destination destination(geometry, sPointComp, success);
+    auto const offsets = dataOf<unsigned int>(geometry, sFaceOffset);
+    auto const corners = dataOf<unsigned int>(geometry, sFaceVertex);
+    if (!offsets || !corners)
+        return destination.finish(false);
+    scatter(OffsetRanges(*offsets, corners->size()), Source(geometry, sFaceComp, mask),
+            [&, points = corners->data()](std::uint64_t i) { destination.set(points[i]); });
+    return destination.finish(true);
+}
+
+} // namespace Veldrin::Geometry

@@ -1,0 +1,54 @@
+#pragma once
+
+#include <nexil/Array.h>
+#include <nexil/Ptr.h>
+#include <veldrin/geometry/GeoProperties.h>
+#include <veldrin/geometry/Names.h>
+#include <veldrin/object/Properties.h>
+
+#include <algorithm>
+#include <cstdint>
+
+/// The arrays of a geometry as algorithms read them: shared, not copied, and never read beyond their ends.
+namespace Veldrin::Geometry {
+
+using IndexArray = Nexil::Ptr<Nexil::Array<unsigned int>>;
+
+/// The "data" of the geo property `name` when it holds elements of T; null otherwise.
+template <class T>
+[[nodiscard]] Nexil::Ptr<Nexil::Array<T>> dataOf(Object const& geometry, char const* name)
+{
+    auto const property = getPropertyAs<Nexil::Ptr<Object>>(geometry, name);
+    return property ? getPropertyAs<Nexil::Ptr<Nexil::Array<T>>>(*property, sData) : nullptr;
+}
+
+/// Half-open range of indices.
+struct IndexRange {
+    std::uint64_t begin;
+    std::uint64_t end;
+};
+
+/// Offsets of consecutive ranges: element i owns [offsets[i], offsets[i + 1]), cut off at `limit`, the size of the array
+/// that the range runs over. One compare keeps what a hostile file says within bounds.
+class OffsetRanges {
+public:
+    OffsetRanges(Nexil::Array<unsigned int> const& offsets, std::uint64_t limit)
+        : offsets_(offsets.data()), count_(offsets.empty() ? 0 : offsets.size() - 1), limit_(limit)
+    {
+    }
+
+    /// Number of ranges that the offsets describe.
+    [[nodiscard]] std::uint64_t count() const noexcept { return count_; }
+
+    [[nodiscard]] IndexRange operator[](std::uint64_t i) const noexcept
+    {
+        return {offsets_[i], std::min<std::uint64_t>(offsets_[i + 1], limit_)};
+    }
+
+private:
+    unsigned int const* offsets_;
+    std::uint64_t count_;
+    std::uint64_t limit_;
+};
+
+} // namespace Veldrin::Geometry
