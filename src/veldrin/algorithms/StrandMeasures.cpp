@@ -1,7 +1,7 @@
 #include <veldrin/algorithms/StrandMeasures.h>
 
 #include <nexil/parallel/Parallel.h>
-#include <veldrin/algorithms/internal/TopologyArrays.h>
+#include <veldrin/algorithms/internal/RisingOffsets.h>
 #include <veldrin/geometry/Prototypes.h>
 
 namespace Veldrin::GeometryAlgorithms {
@@ -12,11 +12,11 @@ namespace {
     using Geometry::IndexArray;
     using Geometry::IndexRange;
     using Geometry::OffsetRanges;
+    using Geometry::RisingOffsets;
 
     namespace grain {
         constexpr std::size_t kTangentStrands = 1024;
         constexpr std::size_t kMeasureStrands = 1000;
-        constexpr std::size_t kOffsets = 65536;
     } // namespace grain
 
     /// A strand geometry whose arrays are as large as its counts ask for.
@@ -36,43 +36,19 @@ namespace {
         }
     };
 
-    bool isRising(Nexil::Array<unsigned int> const& offsets)
-    {
-        return Nexil::parallel::reduceInOrder(
-            offsets.size() - 1, grain::kOffsets, true,
-            [&](std::size_t begin, std::size_t end, bool isRisingSoFar) {
-                bool falls = !isRisingSoFar;
-                for (std::size_t i = begin; i < end; ++i)
-                    falls |= offsets[i + 1] < offsets[i];
-                return !falls;
-            },
-            [](bool left, bool right) { return left && right; });
-    }
-
-    /// The offsets, each at least as large as those before it: strands never overlap, whatever a file says.
-    Nexil::Array<unsigned int> raised(Nexil::Array<unsigned int> const& offsets)
-    {
-        Nexil::Array<unsigned int> result = offsets;
-        for (std::uint64_t i = 1; i < result.size(); ++i)
-            result[i] = std::max(result[i], result[i - 1]);
-        return result;
-    }
-
     /// Calls body(strand, range) for every strand; ranges end at the last point and do not overlap.
     template <class Body>
-    void forEachStrand(Nexil::Array<unsigned int> const& offsets, std::uint64_t strandCount, std::uint64_t pointCount,
-                       std::size_t grain, Body const& body)
+    void forEachStrand(IndexArray const& offsets, std::uint64_t strandCount, std::uint64_t pointCount, std::size_t grain,
+                       Body const& body)
     {
-        if (offsets.empty())
+        if (offsets->empty())
             return;
-        Nexil::Array<unsigned int> const raisedOffsets =
-            isRising(offsets) ? Nexil::Array<unsigned int>() : raised(offsets);
-        OffsetRanges const ranges(raisedOffsets.empty() ? offsets : raisedOffsets, pointCount);
-        Nexil::parallel::forRange(std::min(strandCount, ranges.count()), grain,
-                                  [&](std::size_t begin, std::size_t end) {
-                                      for (std::size_t s = begin; s < end; ++s)
-                                          body(s, ranges[s]);
-                                  });
+        RisingOffsets const rising(offsets, std::min<std::uint64_t>(strandCount, offsets->size() - 1));
+        OffsetRanges const ranges(rising.data(), rising.count(), pointCount);
+        Nexil::parallel::forRange(ranges.count(), grain, [&](std::size_t begin, std::size_t end) {
+            for (std::size_t s = begin; s < end; ++s)
+                body(s, ranges[s]);
+        });
     }
 
     template <class T>
@@ -92,7 +68,7 @@ bool computeStrandTangents(Object const& strands, Nexil::Array<Math::float3>& ta
         return false;
     auto result = zeros<Math::float3>(input.pointCount);
     Math::float3 const* const positions = input.positions->data();
-    forEachStrand(*input.offsets, input.strandCount, input.pointCount, grain::kTangentStrands,
+    forEachStrand(input.offsets, input.strandCount, input.pointCount, grain::kTangentStrands,
                   [&](std::size_t, IndexRange range) {
                       if (range.begin < range.end)
                           computeStrandTangent(positions + range.begin, positions + range.end,
@@ -111,7 +87,7 @@ bool computeStrandLength(Object const& strands, Nexil::Array<float>& strandLengt
     auto lengths = zeros<float>(input.strandCount);
     auto segments = zeros<float>(input.pointCount);
     Math::float3 const* const positions = input.positions->data();
-    forEachStrand(*input.offsets, input.strandCount, input.pointCount, grain::kMeasureStrands,
+    forEachStrand(input.offsets, input.strandCount, input.pointCount, grain::kMeasureStrands,
                   [&](std::size_t s, IndexRange range) {
                       float total = 0;
                       for (std::uint64_t i = range.begin; i + 1 < range.end; ++i) {
@@ -135,7 +111,7 @@ bool computeStrandRatio(Object const& strands, Nexil::Array<float>& ratios, Nexi
     std::uint64_t const strandCount = Geometry::getElementCount(strands, Geometry::sStrandComp);
     auto result = zeros<float>(pointCount);
     if (auto const offsets = dataOf<unsigned int>(strands, Geometry::sStrandOffset))
-        forEachStrand(*offsets, strandCount, pointCount, grain::kMeasureStrands, [&](std::size_t, IndexRange range) {
+        forEachStrand(offsets, strandCount, pointCount, grain::kMeasureStrands, [&](std::size_t, IndexRange range) {
             if (range.begin + 1 >= range.end)
                 return;
             float const last = static_cast<float>(range.end - range.begin - 1);

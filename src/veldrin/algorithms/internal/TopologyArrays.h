@@ -33,7 +33,13 @@ struct IndexRange {
 class OffsetRanges {
 public:
     OffsetRanges(Nexil::Array<unsigned int> const& offsets, std::uint64_t limit)
-        : offsets_(offsets.data()), count_(offsets.empty() ? 0 : offsets.size() - 1), limit_(limit)
+        : OffsetRanges(offsets.data(), offsets.empty() ? 0 : offsets.size() - 1, limit)
+    {
+    }
+
+    /// `count` ranges by `count` + 1 offsets.
+    OffsetRanges(unsigned int const* offsets, std::uint64_t count, std::uint64_t limit)
+        : offsets_(offsets), count_(count), limit_(limit)
     {
     }
 
@@ -42,7 +48,7 @@ public:
 
     [[nodiscard]] IndexRange operator[](std::uint64_t i) const noexcept
     {
-        return {offsets_[i], std::min<std::uint64_t>(offsets_[i + 1], limit_)};
+        return {std::min<std::uint64_t>(offsets_[i], limit_), std::min<std::uint64_t>(offsets_[i + 1], limit_)};
     }
 
 private:
