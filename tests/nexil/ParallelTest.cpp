@@ -109,6 +109,7 @@ TEST(Parallel, ExceptionsAndCancellationLeaveTheCall)
                 CancelAfter const cancel(questionCount);
                 EXPECT_THAT([&] { loop(count); }, isCancellation);
                 EXPECT_THAT([&] { reduce(count); }, isCancellation);
+                EXPECT_NO_THROW(parallel::forRangeToTheEnd(count, 10, [](std::size_t, std::size_t) {}));
             }
             EXPECT_NO_THROW(loop(count));
             auto const fail = [&](std::size_t begin, std::size_t end) {

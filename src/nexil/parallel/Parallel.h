@@ -8,6 +8,7 @@
 #include <tbb/parallel_invoke.h>
 #include <tbb/parallel_reduce.h>
 #include <tbb/parallel_sort.h>
+#include <tbb/task_arena.h>
 #include <tbb/task_group.h>
 
 #include <algorithm>
@@ -19,19 +20,19 @@
 ///     parallel::forRange(faceCount, grain::kFaces, [&](std::size_t begin, std::size_t end) { ... });
 ///
 /// Every call runs in a task context of its own, so that neither side's cancellation cuts the other short, and passes on
-/// the first exception of a body. Loops and reductions ask for cancellation once per chunk. Ranges of one grain or less
-/// stay on the calling thread. A grain is at least 1.
+/// the first exception of a body. Loops and reductions ask for cancellation once per chunk unless they say otherwise.
+/// Ranges of one grain or less stay on the calling thread. A grain is at least 1.
 namespace Nexil::parallel {
 
-/// Calls body(begin, end) over disjoint chunks that cover [0, count). Where the cuts lie depends on the schedule, so
-/// the body's results must not depend on them.
+/// Calls body(begin, end) over disjoint chunks that cover [0, count), and does not ask for cancellation: for loops that
+/// leave their target half changed when they are cut short, and are done in a blink. Where the cuts lie depends on the
+/// schedule, so the body's results must not depend on them.
 template <class Body>
-void forRange(std::size_t count, std::size_t grain, Body const& body)
+void forRangeToTheEnd(std::size_t count, std::size_t grain, Body const& body)
 {
     if (count == 0)
         return;
     if (count <= grain) {
-        Nexil::Internal::throwIfJobCancelled();
         body(std::size_t(0), count);
         return;
     }
@@ -41,15 +42,24 @@ void forRange(std::size_t count, std::size_t grain, Body const& body)
     tbb::task_group_context context(tbb::task_group_context::isolated);
     tbb::parallel_for(
         tbb::blocked_range<std::size_t>(0, count, grain),
-        [&body](tbb::blocked_range<std::size_t> const& range) {
-            Nexil::Internal::throwIfJobCancelled();
-            body(range.begin(), range.end());
-        },
+        [&body](tbb::blocked_range<std::size_t> const& range) { body(range.begin(), range.end()); },
         tbb::auto_partitioner(), context);
 #endif
 }
 
-/// Runs both, one beside the other where a thread is free; the second one on the calling thread.
+/// The same, asking for cancellation once per chunk.
+template <class Body>
+void forRange(std::size_t count, std::size_t grain, Body const& body)
+{
+    forRangeToTheEnd(count, grain, [&body](std::size_t begin, std::size_t end) {
+        Nexil::Internal::throwIfJobCancelled();
+        body(begin, end);
+    });
+}
+
+/// Runs both, one beside the other where a thread is free; the second one on the calling thread. While a thread waits for
+/// the other side it takes work of these two sides only, so that calls nested in each other need no more stack than their
+/// nesting.
 template <class First, class Second>
 void invoke(First const& first, Second const& second)
 {
@@ -57,7 +67,7 @@ void invoke(First const& first, Second const& second)
     PlainThreads::runBoth(second, first);
 #else
     tbb::task_group_context context(tbb::task_group_context::isolated);
-    tbb::parallel_invoke(first, second, context);
+    tbb::this_task_arena::isolate([&] { tbb::parallel_invoke(first, second, context); });
 #endif
 }
 

@@ -59,7 +59,6 @@ template <class Body>
 void forRange(std::size_t begin, std::size_t end, std::size_t grain, std::size_t threads, Body const& body)
 {
     if (end - begin <= grain) {
-        Nexil::Internal::throwIfJobCancelled();
         body(begin, end);
         return;
     }
