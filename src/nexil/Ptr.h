@@ -267,6 +267,18 @@ namespace Internal {
             pointer.block_ = block;
             return pointer;
         }
+
+        template <class Derived, class Base>
+        static Ptr<Derived> dynamicCast(Ptr<Base>&& pointer) noexcept
+        {
+            Ptr<Derived> cast;
+            if (auto const* const derived = dynamic_cast<Derived const*>(pointer.object_)) {
+                cast.object_ = derived;
+                cast.block_ = std::exchange(pointer.block_, nullptr);
+                pointer.object_ = nullptr;
+            }
+            return cast;
+        }
     };
 
 } // namespace Internal
@@ -284,6 +296,13 @@ template <class T, class... Arguments>
 [[nodiscard]] Ptr<T> makePtr(Arguments&&... arguments)
 {
     return Ptr<T>(makeMutable<T>(std::forward<Arguments>(arguments)...));
+}
+
+/// The same value as a `Derived`, which may also be a base or a sibling of `Base`; null when it is none.
+template <class Derived, class Base>
+[[nodiscard]] Ptr<Derived> dynamicPtrCast(Ptr<Base> pointer) noexcept
+{
+    return Internal::PtrAccess::dynamicCast<Derived>(std::move(pointer));
 }
 
 } // namespace Nexil

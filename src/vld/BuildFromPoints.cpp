@@ -1,0 +1,260 @@
+#include <vld/BuildFromPoints.h>
+
+#include <nexil/parallel/Parallel.h>
+#include <vld/BuildLevelSet.h>
+#include <vld/internal/TopologyAssembly.h>
+#include <vld/internal/VoxelOfPoint.h>
+
+#include <algorithm>
+#include <cmath>
+#include <limits>
+#include <numbers>
+
+namespace VLD::TileTree3D {
+
+namespace {
+
+    using Veldrin::Math::double3;
+    using Veldrin::Math::float3;
+
+    namespace grain {
+        constexpr std::size_t kPoints = 128;
+        constexpr std::size_t kTiles = 64;
+    } // namespace grain
+
+    struct Sphere {
+        double3 centre;
+        double radius = 0;
+
+        /// Distance of a position from the surface, negative inside.
+        [[nodiscard]] double distance(double3 const& position) const { return length(position - centre) - radius; }
+    };
+
+    /// Which distances matter: from -inner to outer.
+    struct Range {
+        double inner;
+        double outer;
+    };
+
+    struct TouchedLeaf {
+        Coordinate leaf;
+        unsigned int point;
+    };
+
+    /// What spheres do to tiles.
+    struct Touched {
+        Nexil::Array<TouchedLeaf> leaves;
+        /// Cells of the size of a leaf tile, and inner tiles, that lie deeper in one sphere than distances go.
+        Nexil::Array<Coordinate> insideCells;
+        Nexil::Array<Coordinate> insideTiles;
+        bool isWithinLimits = true;
+    };
+
+    class Spheres {
+    public:
+        Spheres(Nexil::Array<float3> const& positions, Nexil::Array<float> const& radii)
+            : positions_(positions), radii_(radii)
+        {
+        }
+
+        [[nodiscard]] std::uint64_t count() const { return positions_.size(); }
+        [[nodiscard]] Sphere operator[](std::uint64_t point) const
+        {
+            float3 const& p = positions_[point];
+            return {{p.x, p.y, p.z}, radii_[radii_.size() == 1 ? 0 : point]};
+        }
+
+    private:
+        Nexil::Array<float3> const& positions_;
+        Nexil::Array<float> const& radii_;
+    };
+
+    enum class Place { Outside, Inside, Near };
+
+    Place placeOf(Sphere const& sphere, Range const& range, Coordinate const& origin, int width, double voxelSize)
+    {
+        double const distance = sphere.distance(Internal::centreOf(origin, width, voxelSize));
+        // To the centres of the voxels in the corners, and a little for rounding.
+        double const reach = (width - 1) * 0.5 * std::numbers::sqrt3 * voxelSize;
+        double const slack = (reach + sphere.radius) * 1e-9;
+        if (distance - reach >= range.outer + slack)
+            return Place::Outside;
+        return distance + reach <= -range.inner - slack ? Place::Inside : Place::Near;
+    }
+
+    template <int Width, class Visit>
+    void forEachTile(Coordinate const& low, Coordinate const& high, Visit const& visit)
+    {
+        // Within the limits, the step behind the last tile still fits an integer.
+        for (int x = tileStart<Width>(low.x); x <= high.x; x += Width)
+            for (int y = tileStart<Width>(low.y); y <= high.y; y += Width)
+                for (int z = tileStart<Width>(low.z); z <= high.z; z += Width)
+                    visit(Coordinate{x, y, z});
+    }
+
+    template <class Traits>
+    void touch(Sphere const& sphere, unsigned int point, Range const& range, float voxelSize, Touched& touched)
+    {
+        auto isFinite = [](double3 const& v) { return std::isfinite(v.x) && std::isfinite(v.y) && std::isfinite(v.z); };
+        if (!isFinite(sphere.centre) || !std::isfinite(sphere.radius) || !(sphere.radius > 0))
+            return;
+        double const reach = sphere.radius + range.outer;
+        double3 const extent{reach, reach, reach};
+        Coordinate low;
+        Coordinate high;
+        if (!Internal::voxelOfPoint(sphere.centre - extent, voxelSize, low) ||
+            !Internal::voxelOfPoint(sphere.centre + extent, voxelSize, high)) {
+            touched.isWithinLimits = false;
+            return;
+        }
+        forEachTile<Traits::kInnerWidth>(low, high, [&](Coordinate const& inner) {
+            Place const place = placeOf(sphere, range, inner, Traits::kInnerWidth, voxelSize);
+            if (place == Place::Inside)
+                touched.insideTiles.push_back(inner);
+            if (place != Place::Near)
+                return;
+            for (unsigned int cell = 0; cell < Traits::kInnerCells; ++cell) {
+                Coordinate const leaf = inner + cellAtPlace<Traits::kTileWidth>(cell) * int(Traits::kDataWidth);
+                Place const leafPlace = placeOf(sphere, range, leaf, Traits::kDataWidth, voxelSize);
+                if (leafPlace == Place::Near)
+                    touched.leaves.push_back({leaf, point});
+                else if (leafPlace == Place::Inside)
+                    touched.insideCells.push_back(leaf);
+            }
+        });
+    }
+
+    template <class T>
+    void append(Nexil::Array<T>& all, Nexil::Array<T> const& part)
+    {
+        for (T const& element : part)
+            all.push_back(element);
+    }
+
+    template <class Traits>
+    Touched touchAll(Spheres const& spheres, Range const& range, float voxelSize)
+    {
+        std::uint64_t const chunkCount = (spheres.count() + grain::kPoints - 1) / grain::kPoints;
+        Nexil::Array<Touched> chunks;
+        chunks.resize(chunkCount);
+        Nexil::parallel::forRange(chunkCount, 1, [&](std::size_t first, std::size_t last) {
+            for (std::size_t point = first * grain::kPoints;
+                 point < std::min<std::uint64_t>(last * grain::kPoints, spheres.count()); ++point)
+                touch<Traits>(spheres[point], static_cast<unsigned int>(point), range, voxelSize,
+                              chunks[point / grain::kPoints]);
+        });
+        Touched all;
+        for (Touched const& chunk : chunks) {
+            append(all.leaves, chunk.leaves);
+            append(all.insideCells, chunk.insideCells);
+            append(all.insideTiles, chunk.insideTiles);
+            all.isWithinLimits = all.isWithinLimits && chunk.isWithinLimits;
+        }
+        Nexil::parallel::sort(all.leaves.begin(), all.leaves.end(), [](TouchedLeaf const& a, TouchedLeaf const& b) {
+            return a.leaf == b.leaf ? a.point < b.point : isBefore(a.leaf, b.leaf);
+        });
+        Internal::sortUnique(all.insideCells);
+        Internal::sortUnique(all.insideTiles);
+        return all;
+    }
+
+    /// value(distance) turns a distance within the range into what a voxel holds.
+    template <class Traits, class Value>
+    Grid<Traits> build(GridDescription const& description, Spheres const& spheres, Range const& range, float background,
+                       Value const& value)
+    {
+        Touched touched = touchAll<Traits>(spheres, range, description.voxelSize);
+        if (!touched.isWithinLimits)
+            return {};
+
+        // What lies deep in one sphere has its value, whichever others reach there.
+        TileHash const insideCells(touched.insideCells);
+        TileHash const insideTiles(touched.insideTiles);
+        auto isInside = [&](Coordinate const& cell) {
+            return insideCells.find(cell) != kNoTile ||
+                   insideTiles.find(tileOrigin<Traits::kInnerWidth>(cell)) != kNoTile;
+        };
+        Nexil::Array<Coordinate> leaves;
+        Nexil::Array<std::uint64_t> starts;
+        for (std::uint64_t i = 0; i < touched.leaves.size(); ++i) {
+            Coordinate const& leaf = touched.leaves[i].leaf;
+            if ((i == 0 || touched.leaves[i - 1].leaf != leaf) && !isInside(leaf)) {
+                leaves.push_back(leaf);
+                starts.push_back(i);
+            }
+        }
+        Nexil::Array<Coordinate> furtherTiles = touched.insideTiles;
+        for (Coordinate const& cell : touched.insideCells)
+            furtherTiles.push_back(tileOrigin<Traits::kInnerWidth>(cell));
+        auto topology =
+            Internal::assembleTopology<Traits>(description.topologyName, std::move(leaves), std::move(furtherTiles));
+        if (!topology)
+            return {};
+
+        double const voxelSize = description.voxelSize;
+        Nexil::Array<float> values;
+        Nexil::Internal::resizeUninitialized(values, topology->elementCount());
+        Nexil::parallel::forRange(topology->leafCount(), grain::kTiles, [&](std::size_t begin, std::size_t end) {
+            for (std::size_t leaf = begin; leaf < end; ++leaf) {
+                Coordinate const& origin = topology->levels().leafOrigins[leaf];
+                double distances[Traits::kLeafVoxels];
+                std::fill(std::begin(distances), std::end(distances), range.outer);
+                for (std::uint64_t i = starts[leaf]; i < touched.leaves.size() && touched.leaves[i].leaf == origin;
+                     ++i) {
+                    Sphere const sphere = spheres[touched.leaves[i].point];
+                    for (unsigned int place = 0; place < Traits::kLeafVoxels; ++place) {
+                        Coordinate const voxel = origin + cellAtPlace<Traits::kDataWidth>(place);
+                        double const distance = sphere.distance(Internal::centreOf(voxel, 1, voxelSize));
+                        distances[place] = std::min(distances[place], distance);
+                    }
+                }
+                for (unsigned int place = 0; place < Traits::kLeafVoxels; ++place)
+                    values[leaf * Traits::kLeafVoxels + place] = value(std::max(distances[place], -range.inner));
+            }
+        });
+        float const deepest = value(-range.inner);
+        for (std::uint64_t i = topology->voxelCount(); i < topology->elementCount(); ++i)
+            values[i] = isInside(topology->elementCube(static_cast<unsigned int>(i)).origin) ? deepest : background;
+        return Internal::gridOf(description, std::move(topology), std::move(values), background);
+    }
+
+    bool isUsable(GridDescription const& description, Nexil::Array<float3> const& positions,
+                  Nexil::Array<float> const& radii, float width)
+    {
+        return Internal::isUsable(description) && std::isfinite(width) && width > 0 && positions.size() < kNoElement &&
+               (radii.size() == 1 || radii.size() == positions.size());
+    }
+
+} // namespace
+
+template <class Traits>
+Grid<Traits> buildLevelSetFromPoints(GridDescription const& description, Nexil::Array<float3> const& positions,
+                                     Nexil::Array<float> const& radii, float band)
+{
+    if (!isUsable(description, positions, radii, band))
+        return {};
+    return build<Traits>(description, Spheres(positions, radii), {band, band}, band,
+                         [](double distance) { return static_cast<float>(distance); });
+}
+
+template <class Traits>
+Grid<Traits> buildFogFromPoints(GridDescription const& description, Nexil::Array<float3> const& positions,
+                                Nexil::Array<float> const& radii, float falloff)
+{
+    if (!isUsable(description, positions, radii, falloff))
+        return {};
+    return build<Traits>(description, Spheres(positions, radii), {falloff, 0}, 0, [falloff](double distance) {
+        return static_cast<float>(std::max(-distance, 0.0) / double(falloff));
+    });
+}
+
+template VELDRIN_PLATFORM_API Grid<SmallTiles>
+buildLevelSetFromPoints(GridDescription const&, Nexil::Array<float3> const&, Nexil::Array<float> const&, float);
+template VELDRIN_PLATFORM_API Grid<WideTiles>
+buildLevelSetFromPoints(GridDescription const&, Nexil::Array<float3> const&, Nexil::Array<float> const&, float);
+template VELDRIN_PLATFORM_API Grid<SmallTiles> buildFogFromPoints(GridDescription const&, Nexil::Array<float3> const&,
+                                                                  Nexil::Array<float> const&, float);
+template VELDRIN_PLATFORM_API Grid<WideTiles> buildFogFromPoints(GridDescription const&, Nexil::Array<float3> const&,
+                                                                 Nexil::Array<float> const&, float);
+
+} // namespace VLD::TileTree3D

@@ -1,0 +1,8 @@
+#include <vld/Component.h>
+
+namespace VLD {
+
+Base::~Base() = default;
+Component::~Component() = default;
+
+} // namespace VLD

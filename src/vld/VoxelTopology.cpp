@@ -1,0 +1,147 @@
+#include <vld/VoxelTopology.h>
+
+#include <nexil/parallel/Parallel.h>
+
+#include <algorithm>
+#include <iostream>
+#include <limits>
+
+namespace VLD::TileTree3D {
+
+namespace {
+
+    namespace grain {
+        constexpr std::size_t kTiles = 4096;
+    } // namespace grain
+
+    constexpr std::uint64_t kNone = std::numeric_limits<std::uint64_t>::max();
+
+    /// The lowest index in [0, count) for which `isWrong` holds, or kNone.
+    template <class IsWrong>
+    std::uint64_t firstWrong(std::uint64_t count, IsWrong const& isWrong)
+    {
+        return Nexil::parallel::reduceInOrder(
+            count, grain::kTiles, kNone,
+            [&](std::size_t begin, std::size_t end, std::uint64_t found) {
+                for (std::size_t i = begin; i < end && found == kNone; ++i)
+                    found = isWrong(i) ? i : kNone;
+                return found;
+            },
+            [](std::uint64_t left, std::uint64_t right) { return std::min(left, right); });
+    }
+
+    template <int Width>
+    std::uint64_t firstWrongOrigin(Nexil::Array<Coordinate> const& origins)
+    {
+        return firstWrong(origins.size(), [&](std::uint64_t i) {
+            return !isWithinLimits(origins[i]) || tileOrigin<Width>(origins[i]) != origins[i] ||
+                   (i > 0 && !isBefore(origins[i - 1], origins[i]));
+        });
+    }
+
+    /// True where there is nothing to complain about; otherwise prints it when asked to.
+    class Findings {
+    public:
+        Findings(Nexil::String const& name, bool report) : name_(name), report_(report) {}
+
+        bool accept(bool isRight, char const* complaint) const
+        {
+            if (!isRight && report_)
+                std::cout << "topology " << name_.view() << ": " << complaint << "\n";
+            return isRight;
+        }
+        bool acceptAll(std::uint64_t firstWrong, char const* complaint) const
+        {
+            if (firstWrong != kNone && report_)
+                std::cout << "topology " << name_.view() << ": " << complaint << " " << firstWrong << "\n";
+            return firstWrong == kNone;
+        }
+
+    private:
+        Nexil::String const& name_;
+        bool report_;
+    };
+
+    /// The place among its inner tile's cells of the leaf tile at `leaf`.
+    template <class Traits>
+    unsigned int cellOfLeaf(Coordinate const& leaf)
+    {
+        Coordinate const offset = leaf - tileOrigin<Traits::kInnerWidth>(leaf);
+        return placeInTile<Traits::kTileWidth>(offset.x / Traits::kDataWidth, offset.y / Traits::kDataWidth,
+                                               offset.z / Traits::kDataWidth);
+    }
+
+    template <class Traits>
+    bool areConsistent(TileLevels const& levels, Findings const& findings)
+    {
+        std::uint64_t const leafCount = levels.leafOrigins.size();
+        std::uint64_t const innerCount = levels.innerOrigins.size();
+        if (!findings.accept(levels.leafParents.size() == leafCount, "parents are not one per leaf tile") ||
+            !findings.accept(levels.innerChildren.size() == innerCount * Traits::kInnerCells,
+                             "children are not one per cell") ||
+            !findings.accept(leafCount * Traits::kLeafVoxels + innerCount * Traits::kInnerCells < kNoElement,
+                             "more elements than 32 bits count") ||
+            !findings.acceptAll(firstWrongOrigin<Traits::kDataWidth>(levels.leafOrigins),
+                                "wrong origin of leaf tile") ||
+            !findings.acceptAll(firstWrongOrigin<Traits::kInnerWidth>(levels.innerOrigins),
+                                "wrong origin of inner tile"))
+            return false;
+
+        auto const wrongParent = firstWrong(leafCount, [&](std::uint64_t leaf) {
+            Coordinate const& origin = levels.leafOrigins[leaf];
+            std::uint64_t const parent = levels.leafParents[leaf];
+            return parent >= innerCount || levels.innerOrigins[parent] != tileOrigin<Traits::kInnerWidth>(origin) ||
+                   levels.innerChildren[parent * Traits::kInnerCells + cellOfLeaf<Traits>(origin)] != leaf;
+        });
+        if (!findings.acceptAll(wrongParent, "no cell of its parent points at leaf tile"))
+            return false;
+
+        // Together with the check above: each cell in use belongs to a leaf tile that knows it.
+        auto const wrongChild = firstWrong(levels.innerChildren.size(), [&](std::uint64_t cell) {
+            unsigned int const leaf = levels.innerChildren[cell];
+            return leaf != kNoTile && (leaf >= leafCount || levels.leafParents[leaf] != cell / Traits::kInnerCells ||
+                                       cellOfLeaf<Traits>(levels.leafOrigins[leaf]) != cell % Traits::kInnerCells);
+        });
+        return findings.acceptAll(wrongChild, "wrong child in cell");
+    }
+
+} // namespace
+
+template <class Traits>
+VoxelTopology<Traits>::VoxelTopology(Nexil::String name, TileLevels levels)
+    : Component(std::move(name)), levels_(std::move(levels)), hash_(levels_.innerOrigins)
+{
+}
+
+template <class Traits>
+VoxelTopology<Traits>::~VoxelTopology() = default;
+
+template <class Traits>
+VoxelTopology<Traits>::VoxelTopology(VoxelTopology const&) = default;
+
+template <class Traits>
+Nexil::Ptr<VoxelTopology<Traits>> VoxelTopology<Traits>::create(Nexil::String name, TileLevels levels)
+{
+    if (name.empty() || !areConsistent<Traits>(levels, Findings(name, false)))
+        return nullptr;
+    return Nexil::makePtr<VoxelTopology>(std::move(name), std::move(levels));
+}
+
+template <class Traits>
+bool VoxelTopology<Traits>::isConsistent(bool report) const
+{
+    return areConsistent<Traits>(levels_, Findings(name(), report));
+}
+
+template <class Traits>
+std::uint64_t VoxelTopology<Traits>::byteSize() const noexcept
+{
+    return sizeof(*this) + hash_.byteSize() +
+           (levels_.leafOrigins.size() + levels_.innerOrigins.size()) * sizeof(Coordinate) +
+           (levels_.leafParents.size() + levels_.innerChildren.size()) * sizeof(unsigned int);
+}
+
+template class VoxelTopology<SmallTiles>;
+template class VoxelTopology<WideTiles>;
+
+} // namespace VLD::TileTree3D

@@ -1,0 +1,55 @@
+#pragma once
+
+#include <nexil/Array.h>
+#include <vld/Coordinates.h>
+#include <vld/Traits.h>
+#include <vld/VoxelTopology.h>
+
+#include <gtest/gtest.h>
+
+#include <tbb/global_control.h>
+
+#include <cstring>
+
+/// Builders and readers of volumes for tests.
+namespace support {
+
+using VLD::TileTree3D::Coordinate;
+
+/// Typed tests over both configurations.
+using BothConfigurations = ::testing::Types<VLD::TileTree3D::SmallTiles, VLD::TileTree3D::WideTiles>;
+
+/// Calls visit(coordinate) for every voxel of a box.
+template <class Visit>
+void forEachVoxel(Coordinate const& origin, Coordinate const& size, Visit const& visit)
+{
+    for (int x = 0; x < size.x; ++x)
+        for (int y = 0; y < size.y; ++y)
+            for (int z = 0; z < size.z; ++z)
+                visit(origin + Coordinate{x, y, z});
+}
+
+/// Calls body() on 1, 2, 3 and all threads.
+template <class Body>
+void onSomeThreads(Body const& body)
+{
+    body();
+    for (std::size_t const threads : {1u, 2u, 3u}) {
+        tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, threads);
+        body();
+    }
+}
+
+template <class T>
+bool sameBytes(Nexil::Array<T> const& a, Nexil::Array<T> const& b)
+{
+    return a.size() == b.size() && (a.empty() || std::memcmp(a.data(), b.data(), a.size() * sizeof(T)) == 0);
+}
+
+inline bool sameTiles(VLD::TileTree3D::TileLevels const& a, VLD::TileTree3D::TileLevels const& b)
+{
+    return sameBytes(a.leafOrigins, b.leafOrigins) && sameBytes(a.leafParents, b.leafParents) &&
+           sameBytes(a.innerOrigins, b.innerOrigins) && sameBytes(a.innerChildren, b.innerChildren);
+}
+
+} // namespace support

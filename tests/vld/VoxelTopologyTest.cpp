@@ -1,0 +1,175 @@
+#include <support/Volumes.h>
+
+#include <vld/BuildFromValues.h>
+#include <vld/Container.h>
+#include <vld/PointTopology.h>
+
+#include <functional>
+#include <random>
+
+namespace {
+
+using namespace VLD::TileTree3D;
+
+template <class Traits>
+class Topology : public ::testing::Test {
+public:
+    /// Tiles in several inner tiles, some of them with several leaf tiles.
+    static TileLevels sound()
+    {
+        Nexil::Array<Coordinate> voxels;
+        for (int i = -4; i < 5; ++i)
+            voxels.push_back({i * Traits::kDataWidth, i % 3 * Traits::kInnerWidth, 1});
+        Nexil::Array<bool> values;
+        values.resize(voxels.size());
+        return buildFromVoxels<Traits>({.channelName = "c"}, voxels, values, false).topology->levels();
+    }
+};
+TYPED_TEST_SUITE(Topology, support::BothConfigurations);
+
+TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
+{
+    using Traits = TypeParam;
+    constexpr int kWidth = Traits::kDataWidth;
+    struct Damage {
+        char const* name;
+        std::function<void(TileLevels&)> apply;
+    };
+    auto swap = [](auto& array, std::uint64_t a, std::uint64_t b) { std::swap(array[a], array[b]); };
+    auto firstFree = [](TileLevels& levels) -> unsigned int& {
+        return *std::find(levels.innerChildren.begin(), levels.innerChildren.end(), kNoTile);
+    };
+    auto firstUsed = [](TileLevels& levels) -> unsigned int& {
+        return *std::find_if(levels.innerChildren.begin(), levels.innerChildren.end(),
+                             [](unsigned int child) { return child != kNoTile; });
+    };
+    std::vector<Damage> const damages{
+        {"leaf origins not increasing", [&](TileLevels& l) { swap(l.leafOrigins, 0, 1); }},
+        {"a leaf origin twice", [&](TileLevels& l) { l.leafOrigins[1] = l.leafOrigins[0]; }},
+        {"a leaf origin not aligned", [&](TileLevels& l) { l.leafOrigins[0].z += 1; }},
+        {"a leaf origin elsewhere", [&](TileLevels& l) { l.leafOrigins[0].x -= 100 * kWidth; }},
+        {"a leaf origin beyond the limits", [&](TileLevels& l) { l.leafOrigins[0].x = -2147483647 - 1; }},
+        {"inner origins not increasing", [&](TileLevels& l) { swap(l.innerOrigins, 0, 1); }},
+        {"an inner origin not aligned", [&](TileLevels& l) { l.innerOrigins[0].x -= kWidth; }},
+        {"an inner origin beyond the limits", [&](TileLevels& l) { l.innerOrigins[0].x = -2147483647 - 1; }},
+        {"a parent missing", [&](TileLevels& l) { l.leafParents.resize(l.leafParents.size() - 1); }},
+        {"a parent out of range", [&](TileLevels& l) { l.leafParents[2] = l.leafParents[2] + 1000; }},
+        {"no parent", [&](TileLevels& l) { l.leafParents[2] = kNoTile; }},
+        {"another parent", [&](TileLevels& l) { l.leafParents[0] = l.leafParents[8]; }},
+        {"children missing", [&](TileLevels& l) { l.innerChildren.resize(l.innerChildren.size() - 1); }},
+        {"a child out of range", [&](TileLevels& l) { firstFree(l) = 1000; }},
+        {"a child in a second cell", [&](TileLevels& l) { firstFree(l) = 0; }},
+        {"a child lost", [&](TileLevels& l) { firstUsed(l) = kNoTile; }},
+        {"leaf tiles without inner ones",
+         [&](TileLevels& l) {
+             l.innerOrigins.clear();
+             l.innerChildren.clear();
+         }},
+    };
+    EXPECT_TRUE(VoxelTopology<Traits>::create("t", this->sound()));
+    EXPECT_TRUE(VoxelTopology<Traits>::create("t", {}));
+    EXPECT_FALSE(VoxelTopology<Traits>::create("", this->sound()));
+    for (Damage const& damage : damages) {
+        SCOPED_TRACE(damage.name);
+        TileLevels levels = this->sound();
+        damage.apply(levels);
+        EXPECT_FALSE(VoxelTopology<Traits>::create("t", levels));
+        auto const topology = Nexil::makePtr<VoxelTopology<Traits>>("t", levels);
+        Container<Traits> const container("c", topology, 1);
+        EXPECT_FALSE(container.checkConsistency(false));
+        ::testing::internal::CaptureStdout();
+        EXPECT_FALSE(container.checkConsistency(true));
+        EXPECT_EQ(::testing::internal::GetCapturedStdout().rfind("topology t: ", 0), 0u);
+    }
+    auto const good = Nexil::makePtr<VoxelTopology<Traits>>("t", this->sound());
+    EXPECT_TRUE(Container<Traits>("c", good, 0.5f).checkConsistency(true));
+    EXPECT_FALSE(Container<Traits>("c", nullptr, 0.5f).checkConsistency(false));
+    for (float const size : {0.0f, -1.0f, std::numeric_limits<float>::infinity(), std::nanf("")})
+        EXPECT_FALSE(Container<Traits>("c", good, size).checkConsistency(false));
+}
+
+/// Writes down which tiles it saw, in the order in which parts were joined.
+template <class Traits>
+class Recorder final : public Visitor<Traits> {
+public:
+    std::unique_ptr<Visitor<Traits>> fork() const override { return std::make_unique<Recorder>(); }
+    void visitLeaves(VoxelTopology<Traits> const&, unsigned int begin, unsigned int end) override
+    {
+        for (unsigned int tile = begin; tile < end; ++tile)
+            seen.push_back(tile);
+    }
+    void visitInner(VoxelTopology<Traits> const& topology, unsigned int begin, unsigned int end) override
+    {
+        for (unsigned int tile = begin; tile < end; ++tile)
+            seen.push_back(topology.leafCount() + tile);
+    }
+    void join(Visitor<Traits>& right) override
+    {
+        auto const& other = static_cast<Recorder&>(right).seen;
+        seen.insert(seen.end(), other.begin(), other.end());
+    }
+    std::vector<unsigned int> seen;
+};
+
+TYPED_TEST(Topology, AReductionJoinsAllTilesInTheirOrderOnAnyNumberOfThreads)
+{
+    std::mt19937 random(1);
+    Nexil::Array<Coordinate> voxels;
+    for (int i = 0; i < 3000; ++i)
+        voxels.push_back({static_cast<int>(random() % 400), static_cast<int>(random() % 400), 0});
+    Nexil::Array<bool> values;
+    values.resize(voxels.size());
+    auto const grid = buildFromVoxels<TypeParam>({.channelName = "c"}, voxels, values, false);
+    ASSERT_GT(grid.topology->leafCount(), 1000u);
+    std::vector<unsigned int> expected(grid.topology->leafCount() + grid.topology->innerCount());
+    std::iota(expected.begin(), expected.end(), 0u);
+    support::onSomeThreads([&] {
+        Recorder<TypeParam> recorder;
+        grid.container->reduceInternalNonInlined(recorder);
+        EXPECT_EQ(recorder.seen, expected);
+    });
+    Recorder<TypeParam> nothing;
+    Container<TypeParam>("c", nullptr, 1).reduceInternalNonInlined(nothing);
+    EXPECT_TRUE(nothing.seen.empty());
+}
+
+TYPED_TEST(Topology, PointsAreSortedIntoTheirTilesAndKeepTheirOrderThere)
+{
+    std::mt19937 random(5);
+    std::uniform_real_distribution<float> place(-30, 30);
+    Nexil::Array<Veldrin::Math::float3> positions;
+    for (int i = 0; i < 20000; ++i)
+        positions.push_back({place(random), place(random), place(random)});
+    auto tileOf = [&](std::uint64_t i) {
+        auto voxel = [](float v) { return static_cast<int>(std::floor(double(v) / 0.5)); };
+        return tileOrigin<TypeParam::kDataWidth>({voxel(positions[i].x), voxel(positions[i].y), voxel(positions[i].z)});
+    };
+    support::onSomeThreads([&] {
+        Nexil::Array<unsigned int> order;
+        auto const topology = PointTopology<TypeParam>::build("p", positions, 0.5f, order);
+        ASSERT_TRUE(topology);
+        EXPECT_TRUE(topology->isConsistent());
+        ASSERT_EQ(topology->elementCount(), positions.size());
+        std::vector<bool> isSeen(positions.size());
+        for (std::uint64_t tile = 0; tile < topology->leafOrigins().size(); ++tile)
+            for (std::uint64_t i = topology->offsets()[tile]; i < topology->offsets()[tile + 1]; ++i) {
+                EXPECT_EQ(tileOf(order[i]), topology->leafOrigins()[tile]);
+                EXPECT_TRUE(i == topology->offsets()[tile] || order[i - 1] < order[i]);
+                EXPECT_FALSE(isSeen[order[i]]);
+                isSeen[order[i]] = true;
+            }
+    });
+    Nexil::Array<unsigned int> order{7};
+    EXPECT_FALSE(PointTopology<TypeParam>::build("p", {{0, 0, 0}, {0, 0, 1e10f}}, 0.5f, order));
+    EXPECT_FALSE(PointTopology<TypeParam>::build("p", positions, 0, order));
+    EXPECT_EQ(order.size(), 1u);
+    int const w = TypeParam::kDataWidth;
+    EXPECT_TRUE(PointTopology<TypeParam>::create("p", {{0, 0, 0}, {0, w, 0}}, {0, 0, 3}));
+    EXPECT_FALSE(PointTopology<TypeParam>::create("p", {{0, w, 0}, {0, 0, 0}}, {0, 0, 3}));
+    EXPECT_FALSE(PointTopology<TypeParam>::create("p", {{0, 0, 0}, {0, w + 1, 0}}, {0, 0, 3}));
+    EXPECT_FALSE(PointTopology<TypeParam>::create("p", {{0, 0, 0}, {0, w, 0}}, {0, 4, 3}));
+    EXPECT_FALSE(PointTopology<TypeParam>::create("p", {{0, 0, 0}, {0, w, 0}}, {0, 3}));
+    EXPECT_FALSE(PointTopology<TypeParam>::create("p", {{0, 0, 0}, {0, w, 0}}, {1, 2, 3}));
+}
+
+} // namespace
