@@ -41,6 +41,12 @@
 #include <veldrin/object/Object.h>
 #include <veldrin/object/Properties.h>
 #include <veldrin/object/PropertyTable.h>
+#include <veldrin/tags/TagData.h>
+#include <veldrin/tags/TagExpression.h>
+#include <veldrin/tags/TagParser.h>
+#include <veldrin/tags/TagResolver.h>
+#include <veldrin/tags/TagSetOperations.h>
+#include <veldrin/tags/TagToken.h>
 #include <vld/Accessor.h>
 #include <vld/BuildFromPoints.h>
 #include <vld/BuildFromValues.h>

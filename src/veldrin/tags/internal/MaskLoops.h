@@ -1,0 +1,84 @@
+#pragma once
+
+#include <nexil/Array.h>
+#include <nexil/parallel/Parallel.h>
+
+#include <algorithm>
+#include <cstdint>
+
+/// Loops over masks, byte by byte. A flag is a byte of 0 or 1, and rules on bytes compile to vector instructions where
+/// the same rules on bool do not.
+namespace Veldrin::Geometry::MaskLoops {
+
+using Byte = unsigned char;
+using Mask = Nexil::Array<bool>;
+
+// Long enough that a task costs little beside it, short enough that a mask of a million flags feeds many cores.
+constexpr std::size_t kFlagsPerTask = 65536;
+
+constexpr auto kUnion = [](Byte left, Byte right) { return static_cast<Byte>(left | right); };
+constexpr auto kIntersection = [](Byte left, Byte right) { return static_cast<Byte>(left & right); };
+constexpr auto kDifference = [](Byte left, Byte right) { return static_cast<Byte>(left & (right ^ 1)); };
+constexpr auto kComplement = [](Byte flag) { return static_cast<Byte>(flag ^ 1); };
+
+inline Byte const* bytes(Mask const& mask) noexcept
+{
+    return reinterpret_cast<Byte const*>(mask.data());
+}
+inline Byte* bytes(Mask& mask) noexcept
+{
+    return reinterpret_cast<Byte*>(mask.data());
+}
+
+/// target[i] = rule(target[i]).
+template <class Rule>
+void changeEach(Mask& target, Rule const& rule)
+{
+    Nexil::parallel::forRangeToTheEnd(target.size(), kFlagsPerTask,
+                                      [rule, out = bytes(target)](std::size_t begin, std::size_t end) {
+                                          for (std::size_t i = begin; i < end; ++i)
+                                              out[i] = rule(out[i]);
+                                      });
+}
+
+/// target[i] = rule(target[i], other[i]) over the shorter of both.
+template <class Rule>
+void changeBy(Mask& target, Mask const& other, Rule const& rule)
+{
+    Nexil::parallel::forRangeToTheEnd(
+        std::min(target.size(), other.size()), kFlagsPerTask,
+        [rule, out = bytes(target), in = bytes(other)](std::size_t begin, std::size_t end) {
+            for (std::size_t i = begin; i < end; ++i)
+                out[i] = rule(out[i], in[i]);
+        });
+}
+
+/// target[i] = rule(source[i]) for a target that is as large as the source and no part of it.
+template <class Rule>
+void fill(Mask& target, Mask const& source, Rule const& rule)
+{
+    Nexil::parallel::forRangeToTheEnd(
+        target.size(), kFlagsPerTask,
+        [rule, out = bytes(target), in = bytes(source)](std::size_t begin, std::size_t end) {
+            for (std::size_t i = begin; i < end; ++i)
+                out[i] = rule(in[i]);
+        });
+}
+
+/// target[i] = rule(left[i], right[i]) over the shorter of both, right[i] beyond it, for a target that is as large as
+/// `right` and no part of either.
+template <class Rule>
+void fill(Mask& target, Mask const& left, Mask const& right, Rule const& rule)
+{
+    std::size_t const shared = std::min(left.size(), right.size());
+    Nexil::parallel::forRangeToTheEnd(
+        target.size(), kFlagsPerTask,
+        [rule, shared, out = bytes(target), a = bytes(left), b = bytes(right)](std::size_t begin, std::size_t end) {
+            std::size_t const split = std::clamp(shared, begin, end);
+            for (std::size_t i = begin; i < split; ++i)
+                out[i] = rule(a[i], b[i]);
+            std::copy(b + split, b + end, out + split);
+        });
+}
+
+} // namespace Veldrin::Geometry::MaskLoops

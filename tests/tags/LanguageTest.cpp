@@ -1,0 +1,194 @@
+#include "Tables.h"
+
+#include <veldrin/tags/TagParser.h>
+#include <veldrin/tags/TagResolver.h>
+
+#include <gtest/gtest.h>
+
+#include <pthread.h>
+
+#include <memory>
+#include <sstream>
+
+namespace {
+
+using namespace VLD::Utils::Internal;
+
+/// The tree as the tables write it.
+class Writer : public ExpressionVisitor {
+public:
+    using ExpressionVisitor::visit;
+    void visit(Literal& literal) override
+    {
+        text += literal.kind() == TokenKind::Pattern ? "/" + literal.id() + "/" : literal.id();
+    }
+    void visit(NegateExpression& complement) override { write("(! ", complement.expr()); }
+    void visit(FuncOp& function) override { write("(" + function.id() + ": ", function.expr()); }
+    void visit(BinaryOp& operation) override
+    {
+        text += std::string("(") + "+-^"[static_cast<int>(operation.op())] + " ";
+        visitExpression(operation.left());
+        text += " ";
+        visitExpression(operation.right());
+        text += ")";
+    }
+
+    std::string text;
+
+private:
+    void write(std::string const& head, Expression& operand)
+    {
+        text += head;
+        visitExpression(operand);
+        text += ")";
+    }
+};
+
+std::string treeOf(Expression& expression)
+{
+    Writer writer;
+    writer.visitExpression(expression);
+    return writer.text;
+}
+
+std::string dumpOf(Expression const& expression)
+{
+    std::ostringstream stream;
+    expression.dump(stream);
+    return stream.str();
+}
+
+std::string repeated(std::string const& text, int count)
+{
+    std::string result;
+    for (int i = 0; i < count; ++i)
+        result += text;
+    return result;
+}
+
+TEST(TagLanguage, TextsGiveTheirTreesAndTheDumpGivesThemAgain)
+{
+    auto const lines = tables::lines("trees.txt");
+    for (std::size_t i = 0; i + 1 < lines.size(); i += 2) {
+        auto const tree = parseTagExpression(tables::unescaped(lines[i]));
+        EXPECT_EQ("    " + treeOf(*tree), lines[i + 1]) << lines[i];
+        EXPECT_EQ(treeOf(*parseTagExpression(dumpOf(*tree))), treeOf(*tree)) << lines[i];
+    }
+    EXPECT_EQ(dumpOf(*parseTagExpression(" ( a+b)-v((c ))^!(-d* - (e -f))")), "a + b - v(c) ^ !(!d* - (e - f))");
+}
+
+TEST(TagLanguage, WrongTextsFailWithTheirMessageAtTheirByte)
+{
+    std::string message;
+    int count = 0;
+    for (auto const& line : tables::lines("errors.txt")) {
+        if (line.starts_with("message: ")) {
+            message = line.substr(9);
+            continue;
+        }
+        auto const bar = line.find('|');
+        auto const text = tables::unescaped(line.substr(bar + 1, line.rfind('|') - bar - 1));
+        Veldrin::Geometry::TagResolver resolver;
+        auto const status = resolver.parses(Nexil::String(std::string_view(text)));
+        EXPECT_FALSE(status) << line;
+        EXPECT_EQ(status.message.view(), message) << line;
+        EXPECT_EQ(status.byteOffset, std::stoul(line)) << line;
+        ++count;
+    }
+    EXPECT_GE(count, 60);
+}
+
+TEST(TagLanguage, TokensHaveTheirKindsAndTexts)
+{
+    std::istringstream stream(std::string(" a1:.\n*b(!)^-+\0$\x80 _", 19));
+    std::vector<std::pair<int, std::string>> tokens;
+    for (int i = 0; i < 13; ++i) {
+        auto const token = nextToken(stream);
+        tokens.emplace_back(static_cast<int>(token.kind), token.text);
+    }
+    using namespace std::string_literals;
+    EXPECT_EQ(tokens, (std::vector<std::pair<int, std::string>>{{1, "a1:."},
+                                                                {2, "*b"},
+                                                                {7, ""},
+                                                                {6, ""},
+                                                                {8, ""},
+                                                                {5, ""},
+                                                                {4, ""},
+                                                                {3, ""},
+                                                                {0, ""},
+                                                                {0, "Invalid Character: $"},
+                                                                {0, "Invalid Character: \x80"},
+                                                                {1, "_"},
+                                                                {10, ""}}));
+}
+
+TEST(TagLanguage, NestingIsLimitedToAThousand)
+{
+    struct Shape {
+        char const* opening;
+        char const* closing;
+    };
+    for (auto const& [opening, closing] : {Shape{"!", ""}, Shape{"-", ""}, Shape{"(", ")"}, Shape{"v(", ")"},
+                                           Shape{"a+(", ")"}, Shape{"a+(b-", ")^c"}}) {
+        auto const nested = [&](int depth) { return repeated(opening, depth) + "a" + repeated(closing, depth); };
+        auto const tree = parseTagExpression(nested(1000));
+        EXPECT_EQ(treeOf(*parseTagExpression(dumpOf(*tree))), treeOf(*tree));
+        try {
+            (void)parseTagExpression(nested(1001));
+            ADD_FAILURE() << opening;
+        } catch (ParseError const& error) {
+            EXPECT_STREQ(error.what(), "Expression Invalid");
+            EXPECT_EQ(error.byteOffset(), nested(1001).find(repeated(opening, 1001)) +
+                                              std::string(opening).size() * 1000 +
+                                              std::string(opening).find_first_of("!-("));
+        }
+    }
+    // The depth counts, not the number.
+    EXPECT_TRUE(parseTagExpression("a" + repeated(" + (!b - v(c))", 2000)));
+}
+
+TEST(TagLanguage, ChainsOfAnyLengthNeedNoStack)
+{
+    auto const useChain = [](void*) -> void* {
+        std::string const text = "a0" + repeated(" + a1 - !b ^ (c - d)", 33'334);
+        auto const tree = parseTagExpression(text);
+        EXPECT_EQ(dumpOf(*tree), text);
+        EXPECT_EQ(leftChain(dynamic_cast<BinaryOp&>(*tree)).size(), 100'002u);
+        Veldrin::Geometry::TagResolver resolver;
+        EXPECT_TRUE(resolver.parses(Nexil::String(text.c_str())));
+        Nexil::String component = "unset";
+        EXPECT_TRUE(resolver.resolve(*Veldrin::createObject(), component)->empty());
+        EXPECT_EQ(component, "");
+        return nullptr;
+    };
+    pthread_attr_t attributes;
+    pthread_attr_init(&attributes);
+    pthread_attr_setstacksize(&attributes, std::size_t(1) << 20);
+    pthread_t thread;
+    ASSERT_EQ(pthread_create(&thread, &attributes, useChain, nullptr), 0);
+    pthread_join(thread, nullptr);
+    pthread_attr_destroy(&attributes);
+}
+
+TEST(TagLanguage, AResolverKeepsTheLastExpressionThatParsed)
+{
+    using Veldrin::Geometry::TagResolver;
+    auto const geometry = Veldrin::createObject();
+    TagResolver resolver;
+    Nexil::String component = "unset";
+    EXPECT_EQ(resolver.resolve(*geometry, component), nullptr);
+    EXPECT_EQ(component, "unset");
+    EXPECT_FALSE(resolver.parses("a +"));
+    EXPECT_EQ(resolver.resolve(*geometry, component), nullptr);
+    auto const status = resolver.parses("*");
+    EXPECT_TRUE(status && status.message.empty() && TagResolver::Status());
+    EXPECT_FALSE(resolver.parses("a b"));
+    EXPECT_NE(resolver.resolve(*geometry, component), nullptr);
+    EXPECT_EQ(component, "point_component");
+    EXPECT_TRUE(resolver.parses("a"));
+    TagResolver const moved = std::move(resolver);
+    EXPECT_TRUE(moved.resolve(*geometry, component)->empty());
+    EXPECT_EQ(component, "");
+}
+
+} // namespace
