@@ -32,7 +32,8 @@ def terminal_output(command, folder, **environment):
 
 class Usage(tool.ToolTest):
     def test_help_is_no_failure_and_wrong_usage_is(self):
-        for command in ([], ["import"], ["export"], ["make"], ["make", "cube"], ["info"], ["dump"], ["verify"], ["diff"]):
+        for command in ([], ["import"], ["export"], ["make"], ["make", "cube"], ["info"], ["dump"], ["verify"], ["diff"],
+                        ["tags"], ["tag"]):
             self.assertIn("--help", self.zon(*command, "--help").stdout)
         for command in ([], ["nonsense"], ["make"], ["make", "torus", "x.zon"], ["info"], ["diff", "only-one.zon"],
                         ["make", "cube", "x.zon", "--level", "10"], ["make", "cube", "x.zon", "--size", "nan"],

@@ -13,7 +13,7 @@ namespace Zon {
 /// Exit codes of the program; scripts rely on them.
 enum ExitCode : int {
     kDone = 0,
-    kFindings = 1, ///< differences, or a damaged file
+    kFindings = 1, ///< differences, a damaged file, or names that resolve to nothing
     kFailure = 2,  ///< wrong usage, or a file that cannot be read or written
 };
 
@@ -34,5 +34,7 @@ void addInfo(CLI::App& app, Run& run);
 void addDump(CLI::App& app, Run& run);
 void addVerify(CLI::App& app, Run& run);
 void addDiff(CLI::App& app, Run& run);
+void addTags(CLI::App& app, Run& run);
+void addTag(CLI::App& app, Run& run);
 
 } // namespace Zon

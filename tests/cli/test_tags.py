@@ -1,0 +1,113 @@
+"""zon tags and zon tag: what they select, store, refuse and warn about."""
+import tool
+
+# Four quads of a 2 x 2 square in the plane y = 0, and points by row.
+PLANE = ["make", "plane", "plane.zon", "--size", "2", "--subdivisions", "2"]
+
+
+class Tags(tool.ToolTest):
+    def setUp(self):
+        super().setUp()
+        self.zon(*PLANE)
+
+    def ask(self, *arguments, code=0):
+        """(component, ranges, stored name) of the one object of the file."""
+        one, = self.json("tag", "plane.zon", "--indices", *arguments, code=code)["objects"]
+        return one["component"], one["ranges"], one["stored"]
+
+    def positions(self):
+        text = self.dumped("plane.zon", "point_position", "data")
+        return [[float(number.rstrip("f")) for number in point.strip("{} ").split(",")] for point in text.split("},")]
+
+    def selected_points(self, rule):
+        ranges = self.ask("--where", rule)[1]
+        return [i for first, last in ranges for i in range(first, last + 1)]
+
+    def test_rules_over_positions(self):
+        points = self.positions()
+        self.assertEqual(len(points), 9)
+        for rule, holds in (("x > 0", lambda x, y, z: x > 0), ("x>=0", lambda x, y, z: x >= 0),
+                            (" z<0\t", lambda x, y, z: z < 0), ("z <= -1", lambda x, y, z: z <= -1),
+                            ("x == 1e0", lambda x, y, z: x == 1), ("x != 0 & z != 0.0", lambda x, y, z: x != 0 and z != 0),
+                            ("x<1&z>-1&y==0", lambda x, y, z: x < 1 and z > -1), ("y > 0", lambda x, y, z: False)):
+            self.assertEqual(self.selected_points(rule), [i for i, p in enumerate(points) if holds(*p)], rule)
+        # A number means the nearest float, which the file holds too.
+        self.write("tenth.off", "OFF 2 0 0\n0.1 0 0\n0.2 0 0\n")
+        self.zon("import", "tenth.off", "plane.zon")
+        self.assertEqual(self.selected_points("x == 0.1"), [0])
+        self.assertEqual(self.selected_points("x > 0.1"), [1])
+
+    def test_wrong_rules_and_expressions_show_where(self):
+        for arguments, column, message in (
+                (["--where", "w > 0"], 0, "expecting x, y or z"), (["--where", "x > 0 & "], 8, "expecting x, y or z"),
+                (["--where", "x = 0"], 2, "expecting <, <=, >, >=, == or !="), (["--where", "x > a"], 4, "expecting a number"),
+                (["--where", "x > 1e99"], 4, "within the range"), (["--where", "x > inf"], 4, "expecting a number"),
+                (["--where", "x > 0 | y > 0"], 6, "expecting '&'"), (["--where", "x > 0.5.5"], 7, "expecting '&'"),
+                (["(a"], 2, "Expecting a ')'"), (["a b"], 2, "Expression Invalid"), (["a + é"], 4, "Expecting:  ("),
+                (["(é"], 1, "Expecting:  ("), (["a é é"], 2, "Expression Invalid"), (["a\n+"], 3, "Expecting:  (")):
+            lines = self.zon("tag", "plane.zon", *arguments, code=2).stderr.splitlines()
+            self.assertIn(message, lines[0])
+            self.assertEqual(lines[1:], ["    " + arguments[-1].replace("\n", "?"), "    " + " " * column + "^"])
+        self.assertEqual(self.names(), ["plane.zon"])
+
+    def test_a_stored_selection_is_a_tag(self):
+        self.assertEqual(self.ask("--where", "x > 0", "--store", "right"), ("point_component", [[2, 2], [5, 5], [8, 8]],
+                                                                           "point_right_tag"))
+        self.ask("--where", "z < 0", "--store", "back")
+        before = (self.folder / "plane.zon").read_bytes()
+        self.assertEqual(self.ask("f(! point_right_tag - point_back_tag)", "--store", "face_far", "-o", "far.zon")[2],
+                         "face_far_tag")
+        self.assertEqual((self.folder / "plane.zon").read_bytes(), before)
+        tags, = self.json("tags", "far.zon")["objects"]
+        self.assertEqual([(t["name"], t["component"], t["selected"], t["elements"]) for t in tags["tags"]],
+                         [("point_right_tag", "point_component", 3, 9), ("point_back_tag", "point_component", 3, 9),
+                          ("face_far_tag", "face_component", 1, 4)])
+        self.assertIn("33.3 %", self.zon("tags", "far.zon").stdout)
+        # Stored again under the same name, it is replaced.
+        self.assertEqual(self.ask("*", "--store", "right")[1], [[0, 8]])
+        self.assertEqual(len(self.json("tags", "plane.zon")["objects"][0]["tags"]), 2)
+        # The level of the file stays, and so does everything else in it.
+        self.zon("make", "cube", "stored.zon", "--level", "0")
+        self.zon("tag", "stored.zon", "*", "--store", "all")
+        report = self.json("info", "stored.zon")
+        self.assertEqual((report["level"], len(report["objects"][0]["properties"])), (0, 6))
+
+    def test_names_that_resolve_to_nothing_are_warned_about(self):
+        self.ask("--where", "x > 0", "--store", "right")
+        self.ask("--where", "z < 0", "--store", "back")
+        for expression, warning in (("rigth", "'rigth' is no tag; nearest: point_right_tag, point_back_tag"),
+                                    ("point_bakc_tag", "'point_bakc_tag' is no tag; nearest: point_back_tag, "),
+                                    ("right*", "no tag matches 'right*'; nearest: point_right_tag"),
+                                    ("* ^ g(point_right_tag)", "'g' is no function and changes nothing")):
+            self.assertIn("object 0: " + warning, self.zon("tag", "plane.zon", expression).stderr)
+            self.zon("tag", "plane.zon", expression, "--strict", code=1)
+        self.assertEqual(self.zon("tag", "plane.zon", "v(point_right_tag) ^ point_*_tag", "--strict").stderr, "")
+        self.assertIn("nothing resolved", self.zon("tag", "plane.zon", "a - b").stdout)
+        self.zon("make", "cube", "bare.zon")
+        self.assertIn("there are no tags", self.zon("tag", "bare.zon", "a").stderr)
+
+    def test_what_cannot_be_stored_is_not(self):
+        before = (self.folder / "plane.zon").read_bytes()
+        self.assertEqual(self.ask("missing", "--store", "a", code=1), (None, [], None))
+        self.assertEqual(self.ask("* + missing", "--store", "a", "--strict", code=1)[2], None)
+        self.assertEqual(self.ask("s(*)", "--store", "a", code=1)[2], None)
+        for arguments, words in ((["*", "--store", "a b"], "a tag's name holds"), (["*", "--store", "a*"], "a tag's name holds"),
+                                 (["*", "-o", "x.zon"], "--store"), (["*", "--where", "x > 0"], "--where"),
+                                 ([], "one of the two"), ([""], "one of the two")):
+            self.assertIn(words, self.zon("tag", "plane.zon", *arguments, code=2).stderr)
+        self.assertEqual((self.folder / "plane.zon").read_bytes(), before)
+        self.assertEqual(self.names(), ["plane.zon"])
+
+    def test_each_object_answers_for_itself(self):
+        self.write("two.obj", "v 0 0 0\nv 1 0 0\nv 1 1 0\nv 0 1 0\no a\nf 1 2 3\no b\nf 1 2 3 4\n")
+        self.zon("import", "two.obj", "two.zon")
+        self.zon("tag", "two.zon", "--where", "x == 0 & y == 1", "--store", "corner")
+        counts = [[t["selected"] for t in each["tags"]] for each in self.json("tags", "two.zon")["objects"]]
+        self.assertEqual(counts, [[0], [1]])
+        self.assertEqual(self.zon("tag", "two.zon", "point_corner_tag", "--indices").stdout,
+                         "object 0: point_component: 0 of 3 selected, 0.0 %\n    none\n"
+                         "object 1: point_component: 1 of 4 selected, 25.0 %\n    3\n")
+
+
+if __name__ == "__main__":
+    tool.main()

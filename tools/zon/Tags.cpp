@@ -1,0 +1,85 @@
+#include "Command.h"
+#include "Console.h"
+#include "TagTable.h"
+#include "ZonFile.h"
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+#include <memory>
+
+namespace Zon {
+
+namespace {
+
+    using Json = nlohmann::ordered_json;
+
+    struct Options {
+        std::string input;
+        bool wantsJson = false;
+    };
+
+    void printTable(std::size_t number, std::vector<TagLine> const& tags)
+    {
+        fmt::print("object {}: {}\n", number, counted(tags.size(), "tag"));
+        if (tags.empty())
+            return;
+        std::size_t nameWidth = 3;
+        std::size_t componentWidth = 9;
+        for (auto const& tag : tags) {
+            nameWidth = std::max(nameWidth, tag.name.size());
+            componentWidth = std::max(componentWidth, tag.component.size());
+        }
+        auto const line = [&](auto const& name, auto const& component, auto const& selected, auto const& elements,
+                              auto const& share) {
+            return fmt::format("    {:<{}}  {:<{}}  {:>10}  {:>10}  {:>7}", name, nameWidth, component, componentWidth,
+                               selected, elements, share);
+        };
+        fmt::print("{}\n", colored(stdout, Color::Bold, line("tag", "component", "selected", "of", "share")));
+        for (auto const& tag : tags)
+            fmt::print("{}\n", line(printable(tag.name), printable(tag.component), tag.selected, tag.elements,
+                                    shareText(tag.selected, tag.elements)));
+    }
+
+    Json toJson(std::vector<TagLine> const& tags)
+    {
+        Json list = Json::array();
+        for (auto const& tag : tags)
+            list.push_back({{"name", tag.name},
+                            {"component", tag.component},
+                            {"selected", tag.selected},
+                            {"elements", tag.elements}});
+        return {{"tags", list}};
+    }
+
+    ExitCode runTags(Options const& options)
+    {
+        auto const objects = readZon(options.input);
+        Json list = Json::array();
+        for (std::size_t i = 0; i < objects.size(); ++i) {
+            auto const tags = objects[i] ? tagsOf(*objects[i]) : std::vector<TagLine>();
+            if (options.wantsJson)
+                list.push_back(toJson(tags));
+            else
+                printTable(i, tags);
+        }
+        if (options.wantsJson)
+            fmt::print("{}\n", Json{{"file", options.input}, {"objects", list}}.dump(2, ' ', false,
+                                                                                     Json::error_handler_t::replace));
+        return kDone;
+    }
+
+} // namespace
+
+void addTags(CLI::App& app, Run& run)
+{
+    auto const options = std::make_shared<Options>();
+    auto* const command = app.add_subcommand("tags", "Lists the tags of a zon file: named selections of elements");
+    command->add_option("file", options->input, "zon file")->required();
+    command->add_flag("--json", options->wantsJson, "Report as JSON on stdout");
+    command->callback([options, &run] { run = [options] { return runTags(*options); }; });
+}
+
+} // namespace Zon
