@@ -47,6 +47,16 @@
 #include <veldrin/tags/TagResolver.h>
 #include <veldrin/tags/TagSetOperations.h>
 #include <veldrin/tags/TagToken.h>
+#include <veldrin/volume/ValidUpdatedVolume.h>
+#include <veldrin/volume/VldProxyAccess.h>
+#include <veldrin/volume/VldProxyComponentChannel.h>
+#include <veldrin/volume/VldProxyComponentContainer.h>
+#include <veldrin/volume/VldProxyComponentTopology.h>
+#include <veldrin/volume/VldProxyFactory.h>
+#include <veldrin/volume/VolumeBounds.h>
+#include <veldrin/volume/VolumeConversion.h>
+#include <veldrin/volume/VolumeInterpolation.h>
+#include <veldrin/volume/VolumeNames.h>
 #include <vld/Accessor.h>
 #include <vld/BuildFromPoints.h>
 #include <vld/BuildFromValues.h>

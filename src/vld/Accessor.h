@@ -21,7 +21,7 @@ public:
     {
         auto values = channel.values<E>();
         auto const* const defaultValue = channel.defaultValue().get<E>();
-        if (!values || !defaultValue || channel.tileParameters() != Traits::kParameters ||
+        if (!values || !defaultValue || channel.tileParameters() != Traits::parameters() ||
             values->size() != topology.elementCount())
             return;
         values_ = std::move(values);

@@ -12,9 +12,14 @@ ChannelBase::ChannelBase(Nexil::String name, Nexil::String containerName, TilePa
 ChannelBase::ChannelBase(ChannelBase const&) = default;
 ChannelBase::~ChannelBase() = default;
 
+bool ChannelBase::acceptsData(Nexil::Any const& data) const noexcept
+{
+    return data.type() == data_.type() && Nexil::AnyArray::get_any_array_size(data) == elementCount();
+}
+
 bool ChannelBase::setData(Nexil::Any data)
 {
-    if (data.type() != data_.type() || Nexil::AnyArray::get_any_array_size(data) != elementCount())
+    if (!acceptsData(data))
         return false;
     // A null pointer has size 0, as an empty array has. Where there is nothing, nothing needs to be replaced.
     if (elementCount() != 0)
@@ -24,7 +29,7 @@ bool ChannelBase::setData(Nexil::Any data)
 
 bool ChannelBase::setDefaultValue(Nexil::Any value)
 {
-    if (value.type() != defaultValue_.type())
+    if (!acceptsDefaultValue(value))
         return false;
     defaultValue_ = std::move(value);
     return true;

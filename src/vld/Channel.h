@@ -67,8 +67,13 @@ public:
     /// Replaces the values: a `Ptr<Array<E>>` of the same element type and size as now. False, and nothing changed, for
     /// anything else, null included.
     bool setData(Nexil::Any data);
+    [[nodiscard]] bool acceptsData(Nexil::Any const& data) const noexcept;
     /// Replaces the default; false, and nothing changed, for a value of another type.
     bool setDefaultValue(Nexil::Any value);
+    [[nodiscard]] bool acceptsDefaultValue(Nexil::Any const& value) const noexcept
+    {
+        return value.type() == elementType();
+    }
     void setInitializer(DataElementInitializerType initializer) noexcept { initializer_ = initializer; }
 
 protected:
@@ -94,7 +99,7 @@ public:
     Channel(Nexil::String name, Nexil::String containerName, Nexil::Ptr<Nexil::Array<E>> data,
             std::type_identity_t<E> const& defaultValue,
             DataElementInitializerType initializer = DataElementInitializerType::Linear)
-        : ChannelBase(std::move(name), std::move(containerName), Traits::kParameters,
+        : ChannelBase(std::move(name), std::move(containerName), Traits::parameters(),
                       data ? std::move(data) : Nexil::makePtr<Nexil::Array<E>>(), defaultValue, initializer)
     {
     }

@@ -35,7 +35,10 @@ struct VELDRIN_PLATFORM_API Traits {
     static constexpr int kInnerWidth = kTileWidth * kDataWidth;
     static constexpr unsigned int kLeafVoxels = DataWidth * DataWidth * DataWidth;
     static constexpr unsigned int kInnerCells = TileWidth * TileWidth * TileWidth;
-    static constexpr TileParameters kParameters{TileWidth, DataWidth, OffsetType, InnerLevels};
+    [[nodiscard]] static constexpr TileParameters parameters() noexcept
+    {
+        return {TileWidth, DataWidth, OffsetType, InnerLevels};
+    }
 };
 
 /// The two configurations that exist. Small tiles hold a thin shell with less air around it, wide ones need fewer tiles.

@@ -12,6 +12,7 @@ namespace {
 
     namespace grain {
         constexpr std::size_t kTiles = 4096;
+        constexpr std::size_t kIndices = 65536;
     } // namespace grain
 
     constexpr std::uint64_t kNone = std::numeric_limits<std::uint64_t>::max();
@@ -131,6 +132,29 @@ template <class Traits>
 bool VoxelTopology<Traits>::isConsistent(bool report) const
 {
     return areConsistent<Traits>(levels_, Findings(name(), report));
+}
+
+template <class Traits>
+Nexil::Ptr<Nexil::Array<unsigned int>> VoxelTopology<Traits>::elementIndices() const
+{
+    {
+        std::lock_guard const lock(indexCache_.mutex);
+        if (indexCache_.indices)
+            return indexCache_.indices;
+    }
+    // Made without the lock, as parallel work must not be waited for under one; of several made at once the first stays.
+    Nexil::Array<unsigned int> indices;
+    if (elementCount() < kNoElement)
+        Nexil::Internal::resizeUninitialized(indices, elementCount());
+    Nexil::parallel::forRange(indices.size(), grain::kIndices, [&](std::size_t begin, std::size_t end) {
+        for (std::size_t i = begin; i < end; ++i)
+            indices[i] = static_cast<unsigned int>(i);
+    });
+    auto made = Nexil::makePtr<Nexil::Array<unsigned int>>(std::move(indices));
+    std::lock_guard const lock(indexCache_.mutex);
+    if (!indexCache_.indices)
+        indexCache_.indices = std::move(made);
+    return indexCache_.indices;
 }
 
 template <class Traits>

@@ -10,6 +10,7 @@
 #include <vld/Traits.h>
 
 #include <cstdint>
+#include <mutex>
 
 /// Which tiles a volume has: the part that all its channels share.
 ///
@@ -122,7 +123,11 @@ public:
     /// report: prints what is wrong to standard output. Cost: linear in the tiles, parallel.
     [[nodiscard]] bool isConsistent(bool report) const;
 
-    /// Bytes held, the object itself included.
+    /// 0, 1, ... up to `elementCount()` - 1. Made at the first call and shared from then on; never for more elements than
+    /// 32 bits count: the array is empty then.
+    [[nodiscard]] Nexil::Ptr<Nexil::Array<unsigned int>> elementIndices() const;
+
+    /// Bytes held, the object itself included and the array of indices left out.
     [[nodiscard]] std::uint64_t byteSize() const noexcept;
 
 private:
@@ -138,8 +143,18 @@ private:
                                                cell(voxel.z, innerOrigin.z));
     }
 
+    /// The array of indices once somebody asked for it. A copy of the topology makes its own.
+    struct IndexCache {
+        IndexCache() = default;
+        IndexCache(IndexCache const&) noexcept {}
+
+        std::mutex mutex;
+        Nexil::Ptr<Nexil::Array<unsigned int>> indices;
+    };
+
     TileLevels levels_;
     TileHash hash_;
+    mutable IndexCache indexCache_;
 };
 
 extern template class VoxelTopology<SmallTiles>;

@@ -1,12 +1,12 @@
 #pragma once
 
+#include <support/Threads.h>
+
 #include <nexil/Array.h>
 #include <veldrin/geometry/DebugDump.h>
 #include <veldrin/geometry/GeoProperties.h>
 #include <veldrin/geometry/Population.h>
 #include <veldrin/object/Properties.h>
-
-#include <tbb/global_control.h>
 
 #include <cstdint>
 #include <initializer_list>
@@ -101,17 +101,6 @@ inline std::string dump(Veldrin::Object const& object, unsigned long long maxEle
     } sink;
     Veldrin::Geometry::Internal::debugDumpToStream(sink, object, maxElements);
     return sink.text;
-}
-
-/// Calls check() with the parallel loops on at most 1, 2, 3 and all threads in turn.
-template <class Check>
-void onThreadCounts(Check const& check)
-{
-    for (std::size_t const threads : {1u, 2u, 3u}) {
-        tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, threads);
-        check();
-    }
-    check();
 }
 
 } // namespace support

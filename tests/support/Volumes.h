@@ -1,13 +1,13 @@
 #pragma once
 
+#include <support/Threads.h>
+
 #include <nexil/Array.h>
 #include <vld/Coordinates.h>
 #include <vld/Traits.h>
 #include <vld/VoxelTopology.h>
 
 #include <gtest/gtest.h>
-
-#include <tbb/global_control.h>
 
 #include <cstring>
 
@@ -27,17 +27,6 @@ void forEachVoxel(Coordinate const& origin, Coordinate const& size, Visit const&
         for (int y = 0; y < size.y; ++y)
             for (int z = 0; z < size.z; ++z)
                 visit(origin + Coordinate{x, y, z});
-}
-
-/// Calls body() on 1, 2, 3 and all threads.
-template <class Body>
-void onSomeThreads(Body const& body)
-{
-    body();
-    for (std::size_t const threads : {1u, 2u, 3u}) {
-        tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, threads);
-        body();
-    }
 }
 
 template <class T>

@@ -102,7 +102,7 @@ TYPED_TEST(BuildFromValues, OneResultForEveryNumberOfThreads)
 {
     VoxelList const list = listOf({"", {{0, 0, 0}, {500, -80, 1 << 30}}, 40}, 100000);
     Grid<TypeParam> first;
-    support::onSomeThreads([&] {
+    support::onThreadCounts([&] {
         auto grid = buildFromVoxels<TypeParam>({.channelName = "c"}, list.voxels, list.values, 0.0f);
         if (!first)
             first = grid;

@@ -165,7 +165,7 @@ TYPED_TEST(BuildLevelSet, OneResultForEveryNumberOfThreads)
     Points const points = randomPoints(500, {0, 0, 0}, 3);
     auto const distance = [](double3 const& p) { return length(p) - 30; };
     Grid<TypeParam> sphere, cloud;
-    support::onSomeThreads([&] {
+    support::onThreadCounts([&] {
         GridDescription const description{.channelName = "d", .voxelSize = 0.5f};
         auto const newSphere = buildLevelSet<TypeParam>(description, {{-70, -70, -70}, {140, 140, 140}}, 1, distance);
         auto const newCloud = buildFogFromPoints<TypeParam>(description, points.positions, points.radii, 1);

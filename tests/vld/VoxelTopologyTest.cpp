@@ -123,7 +123,7 @@ TYPED_TEST(Topology, AReductionJoinsAllTilesInTheirOrderOnAnyNumberOfThreads)
     ASSERT_GT(grid.topology->leafCount(), 1000u);
     std::vector<unsigned int> expected(grid.topology->leafCount() + grid.topology->innerCount());
     std::iota(expected.begin(), expected.end(), 0u);
-    support::onSomeThreads([&] {
+    support::onThreadCounts([&] {
         Recorder<TypeParam> recorder;
         grid.container->reduceInternalNonInlined(recorder);
         EXPECT_EQ(recorder.seen, expected);
@@ -144,7 +144,7 @@ TYPED_TEST(Topology, PointsAreSortedIntoTheirTilesAndKeepTheirOrderThere)
         auto voxel = [](float v) { return static_cast<int>(std::floor(double(v) / 0.5)); };
         return tileOrigin<TypeParam::kDataWidth>({voxel(positions[i].x), voxel(positions[i].y), voxel(positions[i].z)});
     };
-    support::onSomeThreads([&] {
+    support::onThreadCounts([&] {
         Nexil::Array<unsigned int> order;
         auto const topology = PointTopology<TypeParam>::build("p", positions, 0.5f, order);
         ASSERT_TRUE(topology);

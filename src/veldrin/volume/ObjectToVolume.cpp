@@ -1,0 +1,162 @@
+#include <veldrin/volume/VolumeConversion.h>
+
+#include <nexil/JobCancel.h>
+#include <veldrin/geometry/GeoProperties.h>
+#include <veldrin/geometry/Prototypes.h>
+#include <veldrin/object/Properties.h>
+#include <veldrin/volume/VldProxyComponentChannel.h>
+#include <veldrin/volume/VldProxyComponentContainer.h>
+#include <veldrin/volume/VldProxyComponentTopology.h>
+#include <veldrin/volume/internal/Configurations.h>
+#include <vld/Container.h>
+#include <vld/PointTopology.h>
+
+namespace Veldrin::Geometry {
+
+namespace {
+
+    using ObjectPtr = Nexil::Ptr<Object>;
+    using VLD::TileTree3D::Channel;
+    using VLD::TileTree3D::Container;
+    using VLD::TileTree3D::PointTopology;
+    using VLD::TileTree3D::VoxelTopology;
+
+    /// The proxies of one kind that an object holds, with the names they stand under and what they target.
+    template <class Proxy>
+    struct Held {
+        Nexil::String name;
+        Nexil::String target;
+        Nexil::Ptr<Proxy> proxy;
+    };
+
+    struct Proxies {
+        Nexil::Array<Held<VldProxyComponentTopology>> topologies;
+        Nexil::Array<Held<VldProxyComponentContainer>> containers;
+        Nexil::Array<Held<VldProxyComponentChannel>> channels;
+
+        explicit Proxies(Object const& object)
+        {
+            for (Nexil::String const& name : object.keys()) {
+                // Nothing else is read: behind another type may stand data that reading would have to build.
+                if (object.propertyInfo(name).type != Nexil::TypeId::of<ObjectPtr>())
+                    continue;
+                auto const part = getPropertyAs<ObjectPtr>(object, name);
+                if (!keep(name, part, topologies) && !keep(name, part, containers))
+                    keep(name, part, channels);
+            }
+        }
+
+        [[nodiscard]] bool empty() const { return topologies.empty() && containers.empty() && channels.empty(); }
+        [[nodiscard]] std::uint64_t count() const { return topologies.size() + containers.size() + channels.size(); }
+
+    private:
+        template <class Proxy>
+        static bool keep(Nexil::String const& name, ObjectPtr const& part, Nexil::Array<Held<Proxy>>& kept)
+        {
+            auto proxy = Nexil::dynamicPtrCast<Proxy>(part);
+            if (!proxy)
+                return false;
+            Nexil::String const target = getGeoPropTargetName(*proxy);
+            kept.push_back({name, target, std::move(proxy)});
+            return true;
+        }
+    };
+
+    /// Collects what belongs together, one configuration after the other.
+    class Collector {
+    public:
+        Collector(Proxies const& proxies, VLD::Object& volume) : proxies_(proxies), volume_(volume) {}
+
+        /// False when a proxy is left over, or a component does not fit where its proxy stands.
+        bool run()
+        {
+            for (auto const& held : proxies_.topologies) {
+                auto const component = held.proxy->getVldComponent();
+                Internal::forEachConfiguration([&]<class Traits>() {
+                    if (Nexil::dynamicPtrCast<VoxelTopology<Traits>>(component)) {
+                        add(component);
+                        addContainers<Traits>(held.name);
+                    } else if (Nexil::dynamicPtrCast<PointTopology<Traits>>(component)) {
+                        add(component);
+                        addChannels<Traits>(held.name);
+                    }
+                });
+            }
+            return isSound_ && volume_.componentCount() == proxies_.count();
+        }
+
+    private:
+        template <class Traits>
+        void addContainers(Nexil::String const& topologyName)
+        {
+            for (auto const& held : proxies_.containers)
+                if (held.target == topologyName) {
+                    add(Nexil::dynamicPtrCast<Container<Traits>>(held.proxy->getVldComponent()));
+                    addChannels<Traits>(held.name);
+                }
+        }
+
+        template <class Traits>
+        void addChannels(Nexil::String const& targetName)
+        {
+            for (auto const& held : proxies_.channels)
+                if (held.target == targetName)
+                    add(Nexil::dynamicPtrCast<Channel<Traits>>(held.proxy->getVldComponent()));
+        }
+
+        void add(Nexil::Ptr<VLD::Component> component)
+        {
+            isSound_ = volume_.addComponent(std::move(component)) && isSound_;
+        }
+
+        Proxies const& proxies_;
+        VLD::Object& volume_;
+        bool isSound_ = true;
+    };
+
+    /// True for a volume that was populated and nothing more: it has no other component, and no values.
+    bool isFreshlyPopulated(Object const& object)
+    {
+        if (!Object::isA(object, *getVolumePrototype()) || getElementCount(object, sVoxelComp) != 0)
+            return false;
+        for (auto const& name : getGeoPropNamesByPrototype(object, *getComponentGeoPropPrototype()))
+            if (name != sVoxelComp)
+                return false;
+        for (Nexil::String const& name : object.keys())
+            if (auto const part = getPropertyAs<ObjectPtr>(object, name))
+                if (part->propertyInfo(sData).arraySize != 0 || part->propertyInfo(sIndices).arraySize != 0)
+                    return false;
+        return true;
+    }
+
+    Nexil::MutablePtr<VLD::Object> convert(Object const& object)
+    {
+        Nexil::Internal::throwIfJobCancelled();
+        auto volume = VLD::createObject();
+        Proxies const proxies(object);
+        bool const isConverted =
+            proxies.empty() ? object.empty() || isFreshlyPopulated(object) : Collector(proxies, *volume).run();
+        return isConverted ? std::move(volume) : nullptr;
+    }
+
+} // namespace
+
+Nexil::MutablePtr<VLD::Object> move_object_to_vld_volume(Object& object)
+{
+    auto volume = convert(object);
+    if (volume)
+        object.eraseAllProperties();
+    return volume;
+}
+
+Nexil::Ptr<VLD::Object> move_object_to_vld_volume_const(Object& object)
+{
+    return move_object_to_vld_volume(object);
+}
+
+Nexil::Ptr<VLD::Object> shallow_copy_object_to_vld_volume(Object const& object)
+{
+    return convert(object);
+}
+
+} // namespace Veldrin::Geometry
