@@ -3,6 +3,7 @@
 /// Every installed header of both libraries, for programs that want all of it. Headers of the libraries themselves name
 /// what they use.
 
+#include <lattix/DisjointSet.h>
 #include <nexil/Any.h>
 #include <nexil/Array.h>
 #include <nexil/DefaultClass.h>

@@ -1,0 +1,120 @@
+#include <lattix/DisjointSet.h>
+
+#include <gtest/gtest.h>
+
+#include <numeric>
+#include <random>
+#include <thread>
+#include <vector>
+
+namespace {
+
+using Sets = Lattix::DisjointSet<unsigned int>;
+using Pairs = std::vector<std::pair<unsigned int, unsigned int>>;
+
+/// The least element of each element's set: labels are lowered along the pairs until nothing changes.
+std::vector<unsigned int> leastLabels(unsigned int count, Pairs const& pairs)
+{
+    std::vector<unsigned int> labels(count);
+    std::iota(labels.begin(), labels.end(), 0u);
+    for (bool isChanged = true; isChanged;) {
+        isChanged = false;
+        for (auto const& [a, b] : pairs)
+            if (labels[a] != labels[b]) {
+                labels[a] = labels[b] = std::min(labels[a], labels[b]);
+                isChanged = true;
+            }
+    }
+    return labels;
+}
+
+void expectSets(Sets& sets, std::vector<unsigned int> const& labels)
+{
+    std::vector<unsigned int> expectedRoots;
+    for (unsigned int i = 0; i < labels.size(); ++i) {
+        ASSERT_EQ(sets.find(i), labels[i]) << i;
+        if (labels[i] == i)
+            expectedRoots.push_back(i);
+    }
+    auto const roots = sets.TBBGetRoots();
+    EXPECT_EQ(std::vector<unsigned int>(roots.begin(), roots.end()), expectedRoots);
+    EXPECT_EQ(sets.rootCount(), expectedRoots.size());
+}
+
+Pairs randomPairs(unsigned int count, std::size_t pairCount, unsigned int seed)
+{
+    std::mt19937 random(seed);
+    Pairs pairs(pairCount);
+    for (auto& [a, b] : pairs) {
+        a = static_cast<unsigned int>(random() % count);
+        b = static_cast<unsigned int>(random() % count);
+    }
+    return pairs;
+}
+
+TEST(DisjointSet, SetsAreThoseOfTheLowestLabelsWhateverTheThreads)
+{
+    // Few sets, about half as many as elements, and one long chain from the top down.
+    Pairs chain;
+    for (unsigned int i = 30000; --i > 0;)
+        chain.emplace_back(i, i - 1);
+    for (auto const& pairs : {randomPairs(30000, 60000, 1), randomPairs(30000, 12000, 2), chain}) {
+        auto const labels = leastLabels(30000, pairs);
+        for (std::size_t const threadCount : {1u, 2u, 4u}) {
+            Sets sets(30000);
+            std::vector<std::thread> threads;
+            for (std::size_t t = 0; t < threadCount; ++t)
+                threads.emplace_back([&, t] {
+                    for (std::size_t i = t; i < pairs.size(); i += threadCount)
+                        sets.unite(pairs[i].first, pairs[i].second);
+                });
+            for (auto& thread : threads)
+                thread.join();
+            expectSets(sets, labels);
+        }
+    }
+}
+
+TEST(DisjointSet, LooseUnionsAreTheSameOnOneThreadAndTellOnSeveralWhetherOneWasLost)
+{
+    auto const pairs = randomPairs(2000, 4000, 3);
+    auto const labels = leastLabels(2000, pairs);
+    {
+        Sets sets(2000);
+        std::uint64_t linkCount = 0;
+        for (auto const& [a, b] : pairs) {
+            unsigned int const near = sets.uniteLoosely(a, b, linkCount);
+            EXPECT_EQ(sets.find(near), sets.find(a));
+            EXPECT_EQ(sets.find(near), sets.find(b));
+        }
+        EXPECT_EQ(linkCount, sets.size() - sets.rootCount());
+        expectSets(sets, labels);
+    }
+    // Sets that say that nothing was lost must be right as they are, others once all pairs are united again.
+    for (int round = 0; round < 200; ++round) {
+        Sets sets(2000);
+        std::uint64_t linkCounts[2] = {0, 0};
+        auto const half = [&](std::size_t part) {
+            std::uint64_t linkCount = 0;
+            for (std::size_t i = part; i < pairs.size(); i += 2)
+                sets.uniteLoosely(pairs[i].first, pairs[i].second, linkCount);
+            linkCounts[part] = linkCount;
+        };
+        std::thread other(half, 1);
+        half(0);
+        other.join();
+        if (linkCounts[0] + linkCounts[1] != sets.size() - sets.rootCount())
+            for (auto const& [a, b] : pairs)
+                sets.unite(a, b);
+        expectSets(sets, labels);
+    }
+}
+
+TEST(DisjointSet, NoElementsAreNoSets)
+{
+    Sets sets(0);
+    EXPECT_EQ(sets.TBBGetRoots().size(), 0u);
+    EXPECT_EQ(sets.rootCount(), 0u);
+}
+
+} // namespace
