@@ -30,39 +30,71 @@ inline Byte* bytes(Mask& mask) noexcept
     return reinterpret_cast<Byte*>(mask.data());
 }
 
+/// Calls run(begin, count) over disjoint chunks of [0, count).
+template <class Run>
+void forChunks(std::size_t count, Run const& run)
+{
+    Nexil::parallel::forRangeToTheEnd(count, kFlagsPerTask,
+                                      [&run](std::size_t begin, std::size_t end) { run(begin, end - begin); });
+}
+
+// The loops themselves take plain values: a byte that is written may be part of anything that is read through a
+// reference, which would then be read again for every byte.
+
+template <class Rule>
+void changeBytes(Byte* out, std::size_t count, Rule rule)
+{
+    for (std::size_t i = 0; i < count; ++i)
+        out[i] = rule(out[i]);
+}
+
+template <class Rule>
+void changeBytesBy(Byte* out, Byte const* in, std::size_t count, Rule rule)
+{
+    for (std::size_t i = 0; i < count; ++i)
+        out[i] = rule(out[i], in[i]);
+}
+
+template <class Rule>
+void fillBytes(Byte* out, Byte const* in, std::size_t count, Rule rule)
+{
+    for (std::size_t i = 0; i < count; ++i)
+        out[i] = rule(in[i]);
+}
+
+template <class Rule>
+void fillBytes(Byte* out, Byte const* a, Byte const* b, std::size_t count, Rule rule)
+{
+    for (std::size_t i = 0; i < count; ++i)
+        out[i] = rule(a[i], b[i]);
+}
+
 /// target[i] = rule(target[i]).
 template <class Rule>
 void changeEach(Mask& target, Rule const& rule)
 {
-    Nexil::parallel::forRangeToTheEnd(target.size(), kFlagsPerTask,
-                                      [rule, out = bytes(target)](std::size_t begin, std::size_t end) {
-                                          for (std::size_t i = begin; i < end; ++i)
-                                              out[i] = rule(out[i]);
-                                      });
+    forChunks(target.size(), [&, out = bytes(target)](std::size_t begin, std::size_t count) {
+        changeBytes(out + begin, count, rule);
+    });
 }
 
 /// target[i] = rule(target[i], other[i]) over the shorter of both.
 template <class Rule>
 void changeBy(Mask& target, Mask const& other, Rule const& rule)
 {
-    Nexil::parallel::forRangeToTheEnd(
-        std::min(target.size(), other.size()), kFlagsPerTask,
-        [rule, out = bytes(target), in = bytes(other)](std::size_t begin, std::size_t end) {
-            for (std::size_t i = begin; i < end; ++i)
-                out[i] = rule(out[i], in[i]);
-        });
+    forChunks(std::min(target.size(), other.size()),
+              [&, out = bytes(target), in = bytes(other)](std::size_t begin, std::size_t count) {
+                  changeBytesBy(out + begin, in + begin, count, rule);
+              });
 }
 
 /// target[i] = rule(source[i]) for a target that is as large as the source and no part of it.
 template <class Rule>
 void fill(Mask& target, Mask const& source, Rule const& rule)
 {
-    Nexil::parallel::forRangeToTheEnd(
-        target.size(), kFlagsPerTask,
-        [rule, out = bytes(target), in = bytes(source)](std::size_t begin, std::size_t end) {
-            for (std::size_t i = begin; i < end; ++i)
-                out[i] = rule(in[i]);
-        });
+    forChunks(target.size(), [&, out = bytes(target), in = bytes(source)](std::size_t begin, std::size_t count) {
+        fillBytes(out + begin, in + begin, count, rule);
+    });
 }
 
 /// target[i] = rule(left[i], right[i]) over the shorter of both, right[i] beyond it, for a target that is as large as
@@ -71,14 +103,11 @@ template <class Rule>
 void fill(Mask& target, Mask const& left, Mask const& right, Rule const& rule)
 {
     std::size_t const shared = std::min(left.size(), right.size());
-    Nexil::parallel::forRangeToTheEnd(
-        target.size(), kFlagsPerTask,
-        [rule, shared, out = bytes(target), a = bytes(left), b = bytes(right)](std::size_t begin, std::size_t end) {
-            std::size_t const split = std::clamp(shared, begin, end);
-            for (std::size_t i = begin; i < split; ++i)
-                out[i] = rule(a[i], b[i]);
-            std::copy(b + split, b + end, out + split);
-        });
+    forChunks(shared,
+              [&, out = bytes(target), a = bytes(left), b = bytes(right)](std::size_t begin, std::size_t count) {
+                  fillBytes(out + begin, a + begin, b + begin, count, rule);
+              });
+    std::copy(right.begin() + shared, right.end(), target.begin() + shared);
 }
 
 } // namespace Veldrin::Geometry::MaskLoops
