@@ -22,6 +22,11 @@ bool isJobCancelled() noexcept
     return hook && hook();
 }
 
+bool Internal::hasJobCancelHook() noexcept
+{
+    return cancelHook.load(std::memory_order_acquire) != nullptr;
+}
+
 void Internal::throwIfJobCancelled()
 {
     if (isJobCancelled())

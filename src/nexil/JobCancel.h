@@ -18,6 +18,9 @@ namespace Internal {
     /// The text of every cancellation.
     inline constexpr char kJobCancelledText[] = "Job cancelled";
 
+    /// Whether a host has installed an answer: without one nothing can interrupt a computation.
+    [[nodiscard]] VELDRIN_PLATFORM_API bool hasJobCancelHook() noexcept;
+
     /// Throws std::runtime_error(kJobCancelledText) when the job is cancelled.
     VELDRIN_PLATFORM_API void throwIfJobCancelled();
 

@@ -17,8 +17,12 @@
 #include <nexil/String.h>
 #include <nexil/TypeId.h>
 #include <veldrin/algorithms/ComponentConversion.h>
+#include <veldrin/algorithms/FaceVertexAdjacency.h>
 #include <veldrin/algorithms/HalfEdgeDataStructure.h>
+#include <veldrin/algorithms/MeshDiagnostic.h>
 #include <veldrin/algorithms/MeshInvariants.h>
+#include <veldrin/algorithms/MeshNormals.h>
+#include <veldrin/algorithms/NormalsTopology.h>
 #include <veldrin/algorithms/StrandMeasures.h>
 #include <veldrin/geometry/DataInterpolationMode.h>
 #include <veldrin/geometry/DebugDump.h>

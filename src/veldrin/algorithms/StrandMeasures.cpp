@@ -38,8 +38,8 @@ namespace {
 
     /// Calls body(strand, range) for every strand; ranges end at the last point and do not overlap.
     template <class Body>
-    void forEachStrand(IndexArray const& offsets, std::uint64_t strandCount, std::uint64_t pointCount, std::size_t grain,
-                       Body const& body)
+    void forEachStrand(IndexArray const& offsets, std::uint64_t strandCount, std::uint64_t pointCount,
+                       std::size_t grain, Body const& body)
     {
         if (offsets->empty())
             return;
@@ -68,12 +68,11 @@ bool computeStrandTangents(Object const& strands, Nexil::Array<Math::float3>& ta
         return false;
     auto result = zeros<Math::float3>(input.pointCount);
     Math::float3 const* const positions = input.positions->data();
-    forEachStrand(input.offsets, input.strandCount, input.pointCount, grain::kTangentStrands,
-                  [&](std::size_t, IndexRange range) {
-                      if (range.begin < range.end)
-                          computeStrandTangent(positions + range.begin, positions + range.end,
-                                               result.data() + range.begin);
-                  });
+    forEachStrand(
+        input.offsets, input.strandCount, input.pointCount, grain::kTangentStrands, [&](std::size_t, IndexRange range) {
+            if (range.begin < range.end)
+                computeStrandTangent(positions + range.begin, positions + range.end, result.data() + range.begin);
+        });
     tangents = std::move(result);
     return true;
 }

@@ -32,6 +32,17 @@ public:
     /// Whether the ranges are those of the mesh's own offsets, beginning at 0: each corner belongs to one face.
     [[nodiscard]] bool isPartition() const noexcept { return offsets_.isUnchanged() && offsets_.first() == 0; }
 
+    /// The corners of the faces [begin, end).
+    [[nodiscard]] IndexRange corners(std::uint64_t begin, std::uint64_t end) const noexcept
+    {
+        unsigned int const* const offsets = offsets_.data();
+        return {std::min<std::uint64_t>(offsets[begin], cornerCount_),
+                std::min<std::uint64_t>(offsets[end], cornerCount_)};
+    }
+
+    /// The first face that begins at or behind a corner, to cut the faces into parts of like work.
+    [[nodiscard]] std::uint64_t firstFaceFrom(std::uint64_t corner) const noexcept;
+
     /// Calls visit(ranges), whose operator[] gives the corners of a face; the compiler knows how many in a mesh of
     /// triangles or of quads only.
     template <class Visit>

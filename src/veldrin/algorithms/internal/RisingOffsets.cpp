@@ -7,7 +7,7 @@ namespace Veldrin::Geometry {
 namespace {
 
     namespace grain {
-        constexpr std::size_t kOffsets = 65536;
+        constexpr std::size_t kOffsets = 16384;
     } // namespace grain
 
     struct Shape {
@@ -15,22 +15,37 @@ namespace {
         bool isUniform = true;
     };
 
-    /// One pass over the offsets, which a compiler turns into vector code: no early exit.
+    // Both loops run to their end and join by bits, so that they become vector code.
+
+    bool haveSize(unsigned int const* offsets, std::size_t begin, std::size_t end, unsigned int size) noexcept
+    {
+        unsigned int difference = 0;
+        for (std::size_t i = begin; i < end; ++i)
+            difference |= (offsets[i + 1] - offsets[i]) ^ size;
+        return difference == 0;
+    }
+
+    bool rise(unsigned int const* offsets, std::size_t begin, std::size_t end) noexcept
+    {
+        unsigned int falls = 0;
+        for (std::size_t i = begin; i < end; ++i)
+            falls |= offsets[i + 1] < offsets[i] ? 1u : 0u;
+        return falls == 0;
+    }
+
     Shape shapeOf(unsigned int const* offsets, std::uint64_t rangeCount)
     {
         if (rangeCount == 0)
             return {};
-        unsigned int const size = offsets[1] - offsets[0];
+        // Ranges of one size that begin at 0 rise unless they run over what 32 bits count.
+        unsigned int const size = offsets[1];
+        bool const mayBeUniform = offsets[0] == 0 && size * rangeCount == offsets[rangeCount];
         return Nexil::parallel::reduceInOrder(
-            rangeCount, grain::kOffsets, Shape{},
+            rangeCount, grain::kOffsets, Shape{true, mayBeUniform},
             [&](std::size_t begin, std::size_t end, Shape shape) {
-                bool falls = false;
-                bool differs = false;
-                for (std::size_t i = begin; i < end; ++i) {
-                    falls |= offsets[i + 1] < offsets[i];
-                    differs |= offsets[i + 1] - offsets[i] != size;
-                }
-                return Shape{shape.isRising && !falls, shape.isUniform && !differs};
+                shape.isUniform = shape.isUniform && haveSize(offsets, begin, end, size);
+                shape.isRising = shape.isRising && (shape.isUniform || rise(offsets, begin, end));
+                return shape;
             },
             [](Shape left, Shape right) {
                 return Shape{left.isRising && right.isRising, left.isUniform && right.isUniform};
@@ -56,7 +71,7 @@ RisingOffsets::RisingOffsets(IndexArray offsets, std::uint64_t rangeCount)
     isUnchanged_ = shape.isRising;
     if (!shape.isRising)
         offsets_ = raised(*offsets_, count_);
-    else if (shape.isUniform && count_ > 0 && first() == 0)
+    else if (shape.isUniform && count_ > 0)
         uniformSize_ = data()[1];
 }
 

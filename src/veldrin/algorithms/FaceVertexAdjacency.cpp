@@ -1,0 +1,257 @@
+#include <veldrin/algorithms/FaceVertexAdjacency.h>
+
+#include <nexil/parallel/Parallel.h>
+#include <veldrin/algorithms/internal/FaceBlocks.h>
+#include <veldrin/algorithms/internal/PendingOutput.h>
+
+#include <algorithm>
+#include <array>
+#include <atomic>
+#include <vector>
+
+// A counting sort puts the face-vertices of each point together. Then every point looks, among the edges that begin or end
+// at it, for those that it owns as the lower of their two points: the two sides of an edge stand in the group of its owner,
+// and so every side is found once, by one thread.
+namespace Veldrin::GeometryAlgorithms {
+
+namespace {
+
+    using Geometry::FaceBlocks;
+    using Geometry::kInvalidIndex;
+    using Geometry::MeshFaces;
+    using Geometry::Mesh::FaceEdge;
+
+    namespace grain {
+        constexpr std::size_t kPoints = 1024;
+    } // namespace grain
+
+    /// Groups up to this size are searched from end to end; larger ones are sorted.
+    constexpr std::uint64_t kSmallGroup = 16;
+    /// Groups from this size on are sorted by all threads.
+    constexpr std::uint64_t kHugeGroup = 65536;
+
+    constexpr std::uint64_t kPrefetchDistance = 32;
+
+    /// One run of a face along an edge between the point whose group it is in and another.
+    struct Run {
+        unsigned int other;
+        unsigned int index; ///< of the face-vertex that it starts from
+        FaceEdge edge;
+    };
+
+    /// The first two runs in face order that belong to different faces: whatever a face is looking for across the edge is
+    /// one of them.
+    class Candidates {
+    public:
+        void add(Run const& run) noexcept
+        {
+            if (count_ == 0 || (count_ == 1 && run.edge.face != first_.face))
+                (count_++ == 0 ? first_ : second_) = run.edge;
+        }
+
+        [[nodiscard]] FaceEdge across(FaceEdge const& edge) const noexcept
+        {
+            return edge.face != first_.face ? first_ : second_;
+        }
+
+    private:
+        FaceEdge first_;
+        FaceEdge second_;
+        int count_ = 0;
+    };
+
+    template <class Ranges>
+    class Opposites {
+    public:
+        Opposites(MeshFaces const& faces, Ranges const& ranges, FaceEdge const* pointFaces, FaceEdge* adjacentEdges)
+            : points_(faces.points()), faceVertexCount_(faces.cornerCount()), ranges_(ranges), pointFaces_(pointFaces),
+              adjacentEdges_(adjacentEdges)
+        {
+        }
+
+        /// Writes both sides of all edges that a point owns; its face-vertices are pointFaces[begin, end).
+        void find(unsigned int point, std::uint64_t begin, std::uint64_t end)
+        {
+            if (end - begin <= kSmallGroup)
+                findInSmallGroup(point, begin, end);
+            else
+                findInLargeGroup(point, begin, end);
+        }
+
+    private:
+        /// Calls leaving(run) and arriving(run) for the runs that begin and end at the point and are its own.
+        template <class Leaving, class Arriving>
+        [[gnu::always_inline]] void forEachRun(unsigned int point, std::uint64_t begin, std::uint64_t end,
+                                               Leaving const& leaving, Arriving const& arriving)
+        {
+            for (std::uint64_t i = begin; i < end; ++i) {
+                prefetch(i + kPrefetchDistance);
+                FaceEdge const at = pointFaces_[i];
+                Geometry::IndexRange const range = ranges_[at.face];
+                auto const first = static_cast<unsigned int>(range.begin);
+                auto const last = static_cast<unsigned int>(range.end - range.begin) - 1;
+                unsigned int const next = points_[first + (at.corner == last ? 0 : at.corner + 1)];
+                unsigned int const before = at.corner == 0 ? last : at.corner - 1;
+                unsigned int const previous = points_[first + before];
+                if (next > point)
+                    leaving(Run{next, first + at.corner, at});
+                else if (next == point)
+                    adjacentEdges_[first + at.corner] = FaceEdge{};
+                if (previous > point)
+                    arriving(Run{previous, first + before, {at.face, before}});
+            }
+        }
+
+        /// Where points are numbered without order, each face lies somewhere else in memory.
+        [[gnu::always_inline]] void prefetch(std::uint64_t i) const noexcept
+        {
+            if (i < faceVertexCount_) {
+                std::uint64_t const first = ranges_[pointFaces_[i].face].begin;
+                __builtin_prefetch(points_ + first);
+                __builtin_prefetch(adjacentEdges_ + first, 1);
+            }
+        }
+
+        void findInSmallGroup(unsigned int point, std::uint64_t begin, std::uint64_t end)
+        {
+            std::array<Run, kSmallGroup> leaving;
+            std::array<Run, kSmallGroup> arriving;
+            std::size_t leavingCount = 0;
+            std::size_t arrivingCount = 0;
+            forEachRun(
+                point, begin, end, [&](Run const& run) { leaving[leavingCount++] = run; },
+                [&](Run const& run) { arriving[arrivingCount++] = run; });
+            auto const write = [&](auto const& runs, std::size_t count, auto const& others, std::size_t otherCount) {
+                for (std::size_t i = 0; i < count; ++i) {
+                    unsigned int lowest = kInvalidIndex;
+                    FaceEdge across;
+                    for (std::size_t j = 0; j < otherCount; ++j)
+                        if (others[j].other == runs[i].other && others[j].edge.face != runs[i].edge.face &&
+                            others[j].index < lowest) {
+                            lowest = others[j].index;
+                            across = others[j].edge;
+                        }
+                    adjacentEdges_[runs[i].index] = across;
+                }
+            };
+            write(leaving, leavingCount, arriving, arrivingCount);
+            write(arriving, arrivingCount, leaving, leavingCount);
+        }
+
+        void findInLargeGroup(unsigned int point, std::uint64_t begin, std::uint64_t end)
+        {
+            leaving_.clear();
+            arriving_.clear();
+            forEachRun(
+                point, begin, end, [&](Run const& run) { leaving_.push_back(run); },
+                [&](Run const& run) { arriving_.push_back(run); });
+            sort(leaving_);
+            sort(arriving_);
+            write(leaving_, arriving_);
+            write(arriving_, leaving_);
+        }
+
+        static void sort(std::vector<Run>& runs)
+        {
+            auto const isBefore = [](Run const& a, Run const& b) {
+                return a.other != b.other ? a.other < b.other : a.index < b.index;
+            };
+            if (runs.size() < kHugeGroup)
+                std::sort(runs.begin(), runs.end(), isBefore);
+            else
+                Nexil::parallel::sort(runs.begin(), runs.end(), isBefore);
+        }
+
+        /// For each of the sorted `runs` the lowest of the sorted `others` along the same edge in another face.
+        void write(std::vector<Run> const& runs, std::vector<Run> const& others)
+        {
+            std::size_t j = 0;
+            for (std::size_t i = 0; i < runs.size();) {
+                unsigned int const other = runs[i].other;
+                while (j < others.size() && others[j].other < other)
+                    ++j;
+                Candidates candidates;
+                for (; j < others.size() && others[j].other == other; ++j)
+                    candidates.add(others[j]);
+                for (; i < runs.size() && runs[i].other == other; ++i)
+                    adjacentEdges_[runs[i].index] = candidates.across(runs[i].edge);
+            }
+        }
+
+        unsigned int const* points_;
+        std::uint64_t faceVertexCount_;
+        Ranges const& ranges_;
+        FaceEdge const* pointFaces_;
+        FaceEdge* adjacentEdges_;
+        std::vector<Run> leaving_;
+        std::vector<Run> arriving_;
+    };
+
+    /// Per point and block how many face-vertices there are; false when one names no point of the mesh.
+    bool countFaceVertices(MeshFaces const& faces, FaceBlocks& blocks)
+    {
+        std::atomic<bool> isValid{true};
+        blocks.forEach([&](std::size_t block) {
+            blocks.counts(block).resize(faces.pointCount());
+            unsigned int* const counts = blocks.counts(block).data();
+            blocks.forEachChunk(block, [&](std::uint64_t begin, std::uint64_t end) {
+                Geometry::IndexRange const corners = faces.corners(begin, end);
+                for (std::uint64_t i = corners.begin; i < corners.end; ++i) {
+                    unsigned int const point = faces.points()[i];
+                    if (point >= faces.pointCount()) [[unlikely]] {
+                        isValid.store(false, std::memory_order_relaxed);
+                        return;
+                    }
+                    ++counts[point];
+                }
+            });
+        });
+        return isValid.load(std::memory_order_relaxed);
+    }
+
+} // namespace
+
+bool buildFaceVertexAdjacency(Object const& mesh, Nexil::Array<FaceEdge>& adjacentEdges,
+                              Nexil::Array<FaceEdge>& pointFaces, Nexil::Array<unsigned int>& pointFaceIndex,
+                              Nexil::RuntimeServices const*)
+{
+    MeshFaces faces;
+    if (!faces.read(mesh) || !faces.isPartition())
+        return false;
+    FaceBlocks blocks(faces);
+    if (!countFaceVertices(faces, blocks))
+        return false;
+
+    PendingOutput<FaceEdge> groups(pointFaces, faces.cornerCount());
+    PendingOutput<unsigned int> groupBegins(pointFaceIndex, faces.pointCount() + 1);
+    PendingOutput<FaceEdge> opposites(adjacentEdges, faces.cornerCount());
+    blocks.countsToPlaces(
+        faces.pointCount(), [](std::uint64_t) {},
+        [begins = groupBegins.data()](std::size_t point, unsigned int place) { begins[point] = place; });
+    groupBegins.data()[faces.pointCount()] = static_cast<unsigned int>(faces.cornerCount());
+
+    faces.withRanges([&](auto const& ranges) {
+        blocks.forEach([&](std::size_t block) {
+            blocks.forEachChunk(block, [&, points = faces.points(), places = blocks.counts(block).data(),
+                                        target = groups.data()](std::uint64_t begin, std::uint64_t end) {
+                for (std::uint64_t f = begin; f < end; ++f) {
+                    Geometry::IndexRange const range = ranges[f];
+                    for (std::uint64_t i = range.begin; i < range.end; ++i)
+                        target[places[points[i]]++] = {static_cast<unsigned int>(f),
+                                                       static_cast<unsigned int>(i - range.begin)};
+                }
+            });
+        });
+        Nexil::parallel::forRange(faces.pointCount(), grain::kPoints, [&](std::size_t begin, std::size_t end) {
+            Opposites finder(faces, ranges, groups.data(), opposites.data());
+            for (std::size_t point = begin; point < end; ++point)
+                finder.find(static_cast<unsigned int>(point), groupBegins.data()[point], groupBegins.data()[point + 1]);
+        });
+    });
+    opposites.commit();
+    groups.commit();
+    groupBegins.commit();
+    return true;
+}
+
+} // namespace Veldrin::GeometryAlgorithms

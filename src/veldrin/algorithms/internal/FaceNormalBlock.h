@@ -1,0 +1,58 @@
+#pragma once
+
+#include <veldrin/algorithms/internal/BlockMath.h>
+#include <veldrin/algorithms/internal/FaceNormal.h>
+#include <veldrin/algorithms/internal/MeshFaces.h>
+
+#include <array>
+
+namespace Veldrin::GeometryAlgorithms {
+
+/// Unit normals of up to `kSize` consecutive faces, computed together; on request times their areas.
+///
+/// Reading positions, the arithmetic, and writing elsewhere are three loops: one normal would wait for the other's square
+/// root and quotient, and a read for the writes just before it at a like address.
+template <bool isAreaWeighted>
+class FaceNormalBlock {
+public:
+    static constexpr std::size_t kSize = 64;
+
+    /// The faces [begin, end).
+    template <class Ranges>
+    [[gnu::always_inline]] void compute(Positions const& positions, unsigned int const* points, Ranges const& ranges,
+                                        std::uint64_t begin, std::uint64_t end)
+    {
+        for (std::uint64_t f = begin; f < end; ++f) {
+            Geometry::IndexRange const range = ranges[f];
+            std::uint64_t const n = range.end - range.begin;
+            unsigned int const* const corners = points + range.begin;
+            std::size_t const i = f - begin;
+            isCovered_[i] = positions.cover(corners, n);
+            // A face without a normal is a vector of no length to the loops that follow.
+            Math::float3 const vector = isCovered_[i] ? fanVector(positions, corners, n) : Math::float3{};
+            x_[i] = vector.x;
+            y_[i] = vector.y;
+            z_[i] = vector.z;
+            if constexpr (isAreaWeighted) {
+                Math::float3 const area = isCovered_[i] ? newellVector(positions, corners, n) : Math::float3{};
+                u_[i] = area.x;
+                v_[i] = area.y;
+                w_[i] = area.z;
+            }
+        }
+        unitsOrFallback(x_.data(), y_.data(), z_.data(), end - begin);
+        if constexpr (isAreaWeighted)
+            scaleByHalfLength(x_.data(), y_.data(), z_.data(), u_.data(), v_.data(), w_.data(), end - begin);
+    }
+
+    /// False for a degenerate face, or one that names a point without a position.
+    [[nodiscard]] bool isCovered(std::size_t i) const noexcept { return isCovered_[i]; }
+    [[nodiscard]] Math::float3 operator[](std::size_t i) const noexcept { return {x_[i], y_[i], z_[i]}; }
+
+private:
+    std::array<float, kSize> x_, y_, z_;
+    std::array<float, isAreaWeighted ? kSize : 0> u_, v_, w_;
+    std::array<bool, kSize> isCovered_;
+};
+
+} // namespace Veldrin::GeometryAlgorithms
