@@ -13,7 +13,7 @@ namespace Zon {
 /// Exit codes of the program; scripts rely on them.
 enum ExitCode : int {
     kDone = 0,
-    kFindings = 1, ///< differences, a damaged file, or names that resolve to nothing
+    kFindings = 1, ///< differences, a damaged file, faults of a mesh, or names that resolve to nothing
     kFailure = 2,  ///< wrong usage, or a file that cannot be read or written
 };
 
@@ -36,5 +36,8 @@ void addVerify(CLI::App& app, Run& run);
 void addDiff(CLI::App& app, Run& run);
 void addTags(CLI::App& app, Run& run);
 void addTag(CLI::App& app, Run& run);
+void addNormals(CLI::App& app, Run& run);
+void addDiagnose(CLI::App& app, Run& run);
+void addStrands(CLI::App& app, Run& run);
 
 } // namespace Zon

@@ -14,14 +14,18 @@ namespace {
     bool hasColor(std::FILE* stream)
     {
         char const* const noColor = std::getenv("NO_COLOR");
-        char const* const terminal = std::getenv("TERM");
-        return !(noColor && *noColor) && !(terminal && std::string_view(terminal) == "dumb") &&
-               isatty(fileno(stream)) == 1;
+        return !(noColor && *noColor) && isTerminal(stream);
     }
 
     constexpr std::uint64_t kBarWidth = 40;
 
 } // namespace
+
+bool isTerminal(std::FILE* stream)
+{
+    char const* const terminal = std::getenv("TERM");
+    return !(terminal && std::string_view(terminal) == "dumb") && isatty(fileno(stream)) == 1;
+}
 
 std::string colored(std::FILE* stream, Color color, std::string_view text)
 {
@@ -73,7 +77,7 @@ std::string byteText(std::uint64_t bytes)
 }
 
 Progress::Progress(std::string_view label, std::uint64_t total)
-    : label_(label), total_(total), isVisible_(total > 0 && isatty(STDERR_FILENO) == 1)
+    : label_(label), total_(total), isVisible_(total > 0 && isTerminal(stderr))
 {
 }
 

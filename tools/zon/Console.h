@@ -10,6 +10,9 @@ namespace Zon {
 
 enum class Color { Green, Red, Yellow, Bold };
 
+/// Whether a person looks at it who can be shown more than lines: a terminal, and TERM is not "dumb".
+[[nodiscard]] bool isTerminal(std::FILE* stream);
+
 /// `text` in colour when `stream` is a terminal and NO_COLOR is not set, else as it is.
 [[nodiscard]] std::string colored(std::FILE* stream, Color color, std::string_view text);
 

@@ -36,13 +36,9 @@ namespace {
     constexpr std::uint64_t kMostWarnings = 20;
 
     template <class T>
-    using ArrayPtr = Nexil::Ptr<Nexil::Array<T>>;
-
-    template <class T>
-    Nexil::Array<T> dataOf(Object const& object, char const* name)
+    Nexil::Array<T> copyOfData(Object const& object, char const* name)
     {
-        auto const property = getPropertyAs<Nexil::Ptr<Object>>(object, name);
-        auto const data = property ? getPropertyAs<ArrayPtr<T>>(*property, Geometry::sData) : nullptr;
+        auto const data = dataOf<T>(object, name);
         return data ? *data : Nexil::Array<T>();
     }
 
@@ -75,7 +71,7 @@ namespace {
         if (!property || !indices || !(Geometry::getGeoPropTargetName(*property) == rangeName) ||
             !(Geometry::getGeoPropTargetName(object, rangeName) == Geometry::sFaceVertexComp))
             return std::nullopt;
-        CornerValues<T> result{dataOf<T>(object, name), *indices};
+        CornerValues<T> result{copyOfData<T>(object, name), *indices};
         if (result.values.empty() || result.indices.size() != cornerCount)
             return std::nullopt;
         checkIndices(result.indices, result.values.size(), true, place + std::string(rangeName.view()));
@@ -102,15 +98,15 @@ namespace {
     MeshArrays arraysOf(Object const& object, std::string const& place)
     {
         MeshArrays arrays;
-        arrays.positions = dataOf<Math::float3>(object, Geometry::sPointPosition);
+        arrays.positions = copyOfData<Math::float3>(object, Geometry::sPointPosition);
         makeNaNsAlike(arrays.positions);
         if (auto const name = cleanName(std::string(getPropertyAs<Nexil::String>(object, "name").view()));
             !name.empty())
             arrays.name = name;
         if (!Object::isA(object, *Geometry::getMeshPrototype()))
             return arrays;
-        arrays.corners = dataOf<unsigned int>(object, Geometry::sFaceVertex);
-        auto offsets = dataOf<unsigned int>(object, Geometry::sFaceOffset);
+        arrays.corners = copyOfData<unsigned int>(object, Geometry::sFaceVertex);
+        auto offsets = copyOfData<unsigned int>(object, Geometry::sFaceOffset);
         if (offsets.size() < 2)
             return arrays;
         for (std::uint64_t face = 0; face + 1 < offsets.size(); ++face)
@@ -175,7 +171,7 @@ namespace {
         for (std::uint64_t i = 0; i < objects.size(); ++i) {
             auto const place = fmt::format("object {}: ", i);
             if (!objects[i] || !Object::isA(*objects[i], *Geometry::getPointCloudPrototype()) ||
-                dataOf<Math::float3>(*objects[i], Geometry::sPointPosition).empty()) {
+                copyOfData<Math::float3>(*objects[i], Geometry::sPointPosition).empty()) {
                 losses.push_back(place + "neither a mesh nor a point cloud with points");
                 continue;
             }

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "GeoValues.h"
+
 #include <nexil/Array.h>
 #include <nexil/Ptr.h>
 #include <veldrin/math/Vector.h>
@@ -13,13 +15,6 @@
 
 /// What mesh files and objects have in common: the arrays of one mesh or point cloud.
 namespace Zon {
-
-/// Values shared out to the corners of faces. A corner without one has the index `kInvalidIndex`.
-template <class T>
-struct CornerValues {
-    Nexil::Array<T> values;
-    Nexil::Array<unsigned int> indices;
-};
 
 struct MeshArrays {
     std::optional<std::string> name;

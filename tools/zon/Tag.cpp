@@ -254,12 +254,8 @@ namespace {
             isStored = isStored || !selections[i].storedName.empty();
         }
         bool const isRefused = options.isStrict && !isComplete;
-        if (isStored && !isRefused) {
-            auto const header = readZonHeader(options.input);
-            if (header.hasHandles)
-                warn(options.input + ": its list of handles is not kept");
-            writeZon(objects, options.output.empty() ? options.input : options.output, std::clamp(header.level, 0, 9));
-        }
+        if (isStored && !isRefused)
+            rewriteZon(objects, options.input, options.output);
         Json list = Json::array();
         for (std::size_t i = 0; i < selections.size(); ++i) {
             auto selection = selections[i];

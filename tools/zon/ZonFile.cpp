@@ -13,6 +13,7 @@
 
 #include <sys/stat.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <fstream>
 #include <streambuf>
@@ -162,6 +163,14 @@ void writeZon(Objects const& objects, std::string const& path, int level)
                                                                    : messages.errorText()));
     }
     file.commit();
+}
+
+void rewriteZon(Objects const& objects, std::string const& input, std::string const& output)
+{
+    auto const header = readZonHeader(input);
+    if (header.hasHandles)
+        warn(input + ": its list of handles is not kept");
+    writeZon(objects, output.empty() ? input : output, std::clamp(header.level, 0, 9));
 }
 
 std::uint64_t streamSize(Objects const& objects, int level)

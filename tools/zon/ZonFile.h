@@ -6,6 +6,7 @@
 #include <veldrin/object/Object.h>
 
 #include <cstdint>
+#include <map>
 #include <string>
 
 /// Reading and writing whole zon files for the subcommands.
@@ -39,6 +40,30 @@ struct ZonHeader {
 
 /// Writes beside the target and renames. Errors: Failure; the target is as before then.
 void writeZon(Objects const& objects, std::string const& path, int level);
+
+/// Writes changed objects of the file `input` to `output`, or in place of them when `output` is "", at the level that the
+/// file has; warns when it had handles. Errors: as for `writeZon`.
+void rewriteZon(Objects const& objects, std::string const& input, std::string const& output);
+
+/// Calls edit(number, object) for each object that is not null; one that stands in the list twice is edited once and stays
+/// one object. An object may be replaced by an edited copy of its own.
+template <class Edit>
+void editEach(Objects& objects, Edit const& edit)
+{
+    std::map<Veldrin::Object const*, Nexil::Ptr<Veldrin::Object>> edited;
+    // Keeps what was read, so that no edited copy takes the address of another object.
+    auto const given = objects;
+    for (std::uint64_t i = 0; i < objects.size(); ++i) {
+        if (!given[i])
+            continue;
+        auto const [place, isNew] = edited.try_emplace(given[i].get(), nullptr);
+        if (isNew) {
+            edit(i, objects[i]);
+            place->second = objects[i];
+        }
+        objects[i] = place->second;
+    }
+}
 
 /// Bytes that a stream of these objects takes at this level, without writing one.
 [[nodiscard]] std::uint64_t streamSize(Objects const& objects, int level);

@@ -1,0 +1,174 @@
+#include "Command.h"
+#include "Console.h"
+#include "Working.h"
+#include "ZonFile.h"
+
+#include <veldrin/algorithms/MeshDiagnostic.h>
+#include <veldrin/algorithms/MeshInvariants.h>
+#include <veldrin/geometry/GeoProperties.h>
+#include <veldrin/geometry/Prototypes.h>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+#include <fmt/ranges.h>
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+#include <memory>
+#include <optional>
+#include <vector>
+
+namespace Zon {
+
+namespace {
+
+    using namespace Veldrin;
+    using Geometry::Mesh::Diagnostic;
+    using Geometry::Mesh::HalfEdgeDataStructure;
+    using Json = nlohmann::ordered_json;
+
+    struct Options {
+        std::string input;
+        bool wantsJson = false;
+    };
+
+    struct Report {
+        unsigned int points = 0;
+        unsigned int faces = 0;
+        unsigned int faceVertices = 0;
+        std::uint64_t edges = 0;
+        std::uint64_t boundaryEdges = 0;
+        int eulerCharacteristic = 0;
+        int components = 0;
+        Math::int3 bettiNumbers;
+        Diagnostic found;
+    };
+
+    struct Finding {
+        char const* key; ///< in JSON
+        char const* one; ///< for people
+        char const* many;
+        Nexil::Array<unsigned int> Diagnostic::*elements;
+    };
+
+    constexpr Finding kFindingKinds[] = {
+        {"isolated_points", "isolated point", "isolated points", &Diagnostic::isolatedPoints},
+        {"degenerate_faces", "degenerate face", "degenerate faces", &Diagnostic::degenerateFaces},
+        {"zero_area_faces", "face without area", "faces without area", &Diagnostic::zeroAreaFaces},
+        {"non_manifold_faces", "face on an edge of three or more faces", "faces on edges of three or more faces",
+         &Diagnostic::nonManifoldFaces},
+        {"inconsistent_faces", "face turned against a neighbour", "faces turned against neighbours",
+         &Diagnostic::inconsistentFaces}};
+
+    constexpr std::uint64_t kMostShown = 10;
+
+    Report examine(Object const& mesh)
+    {
+        Report report;
+        report.points = Geometry::getElementCount(mesh, Geometry::sPointComp);
+        report.faces = Geometry::getElementCount(mesh, Geometry::sFaceComp);
+        report.faceVertices = Geometry::getElementCount(mesh, Geometry::sFaceVertexComp);
+        {
+            HalfEdgeDataStructure const edges(mesh);
+            report.edges = edges.edgeCount();
+            edges.forEachEdge(0, edges.pointCount(), [&](HalfEdgeDataStructure::Edge const& edge) {
+                report.boundaryEdges += edge.isBoundary() ? 1 : 0;
+            });
+            report.eulerCharacteristic = Geometry::Mesh::eulerCharacteristic(mesh, edges);
+        }
+        report.components = Geometry::Mesh::connectedComponents(mesh);
+        report.bettiNumbers = Geometry::Mesh::bettiNumbers(mesh);
+        report.found = Geometry::Mesh::diagnose(mesh);
+        return report;
+    }
+
+    std::vector<unsigned int> firstOf(Nexil::Array<unsigned int> const& elements)
+    {
+        return {elements.begin(), elements.begin() + std::min<std::uint64_t>(elements.size(), kMostShown)};
+    }
+
+    std::string findingText(Finding const& kind, Nexil::Array<unsigned int> const& elements)
+    {
+        return fmt::format("{} {}: {}{}", elements.size(), elements.size() == 1 ? kind.one : kind.many,
+                           fmt::join(firstOf(elements), ", "), elements.size() > kMostShown ? ", ..." : "");
+    }
+
+    void print(std::size_t number, std::optional<Report> const& report)
+    {
+        if (!report) {
+            fmt::print("object {}: no mesh\n", number);
+            return;
+        }
+        fmt::print("object {}: {}, {}, {}, {} of them on a border\n", number, counted(report->points, "point"),
+                   counted(report->faces, "face"), counted(report->edges, "edge"), report->boundaryEdges);
+        fmt::print("    Euler characteristic {}; {}\n", report->eulerCharacteristic,
+                   counted(static_cast<std::uint64_t>(std::max(report->components, 0)), "component"));
+        fmt::print("    Betti numbers {}, {}, {}\n", report->bettiNumbers.x, report->bettiNumbers.y,
+                   report->bettiNumbers.z);
+        for (auto const& kind : kFindingKinds)
+            if (auto const& elements = report->found.*kind.elements; !elements.empty())
+                fmt::print("    {}\n", colored(stdout, Color::Yellow, findingText(kind, elements)));
+        if (report->found == Diagnostic{})
+            fmt::print("    {}\n", colored(stdout, Color::Green, "nothing found"));
+    }
+
+    Json toJson(std::optional<Report> const& report)
+    {
+        if (!report)
+            return {{"is_mesh", false}};
+        Json findings = Json::object();
+        for (auto const& kind : kFindingKinds) {
+            auto const& elements = report->found.*kind.elements;
+            findings[kind.key] = {{"count", elements.size()}, {"first", firstOf(elements)}};
+        }
+        auto const& betti = report->bettiNumbers;
+        return {{"is_mesh", true},
+                {"points", report->points},
+                {"faces", report->faces},
+                {"face_vertices", report->faceVertices},
+                {"edges", report->edges},
+                {"boundary_edges", report->boundaryEdges},
+                {"euler_characteristic", report->eulerCharacteristic},
+                {"components", report->components},
+                {"betti_numbers", {betti.x, betti.y, betti.z}},
+                {"findings", findings}};
+    }
+
+    ExitCode runDiagnose(Options const& options)
+    {
+        std::vector<std::optional<Report>> reports;
+        {
+            Working const working("diagnosis");
+            for (auto const& object : readZon(options.input)) {
+                reports.emplace_back();
+                if (object && Object::isA(*object, *Geometry::getMeshPrototype()))
+                    reports.back() = examine(*object);
+            }
+        }
+        Json list = Json::array();
+        for (std::size_t i = 0; i < reports.size(); ++i) {
+            if (options.wantsJson)
+                list.push_back(toJson(reports[i]));
+            else
+                print(i, reports[i]);
+        }
+        if (options.wantsJson)
+            fmt::print("{}\n", Json{{"file", options.input}, {"objects", list}}.dump(2, ' ', false,
+                                                                                     Json::error_handler_t::replace));
+        bool const isClean =
+            std::ranges::all_of(reports, [](auto const& report) { return !report || report->found == Diagnostic{}; });
+        return isClean ? kDone : kFindings;
+    }
+
+} // namespace
+
+void addDiagnose(CLI::App& app, Run& run)
+{
+    auto const options = std::make_shared<Options>();
+    auto* const command = app.add_subcommand("diagnose", "Measures the topology of meshes and looks for faults in it");
+    command->add_option("file", options->input, "zon file")->required();
+    command->add_flag("--json", options->wantsJson, "Report as JSON on stdout");
+    command->callback([options, &run] { run = [options] { return runDiagnose(*options); }; });
+}
+
+} // namespace Zon

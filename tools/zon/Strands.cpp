@@ -1,0 +1,119 @@
+#include "Command.h"
+#include "Console.h"
+#include "Working.h"
+#include "ZonFile.h"
+
+#include <veldrin/algorithms/StrandMeasures.h>
+#include <veldrin/geometry/GeoProperties.h>
+#include <veldrin/geometry/Prototypes.h>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+#include <fmt/ranges.h>
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+#include <memory>
+#include <optional>
+#include <vector>
+
+namespace Zon {
+
+namespace {
+
+    using namespace Veldrin;
+    using Json = nlohmann::ordered_json;
+
+    struct Options {
+        std::string input;
+        std::uint64_t mostLengths = 10;
+        bool wantsJson = false;
+    };
+
+    struct Report {
+        unsigned int points = 0;
+        Nexil::Array<float> lengths;
+        double total = 0;
+
+        [[nodiscard]] float shortest() const { return lengths.empty() ? 0 : *std::ranges::min_element(lengths); }
+        [[nodiscard]] float longest() const { return lengths.empty() ? 0 : *std::ranges::max_element(lengths); }
+        [[nodiscard]] double mean() const { return lengths.empty() ? 0 : total / static_cast<double>(lengths.size()); }
+    };
+
+    /// Nothing for what is no strands, or strands that are broken.
+    std::optional<Report> measure(Object const& object)
+    {
+        Report report;
+        Nexil::Array<float> segments;
+        if (!Object::isA(object, *Geometry::getStrandPrototype()) ||
+            !GeometryAlgorithms::computeStrandLength(object, report.lengths, segments, nullptr))
+            return std::nullopt;
+        report.points = Geometry::getElementCount(object, Geometry::sPointComp);
+        for (float const length : report.lengths)
+            report.total += length;
+        return report;
+    }
+
+    std::vector<float> firstLengths(Report const& report, std::uint64_t most)
+    {
+        return {report.lengths.begin(), report.lengths.begin() + std::min<std::uint64_t>(report.lengths.size(), most)};
+    }
+
+    void print(std::size_t number, std::optional<Report> const& report, std::uint64_t most)
+    {
+        if (!report) {
+            fmt::print("object {}: no strands\n", number);
+            return;
+        }
+        fmt::print("object {}: {}, {}\n", number, counted(report->lengths.size(), "strand"),
+                   counted(report->points, "point"));
+        fmt::print("    length {:.6g} in all; shortest {:.6g}, mean {:.6g}, longest {:.6g}\n", report->total,
+                   report->shortest(), report->mean(), report->longest());
+        if (most > 0 && !report->lengths.empty())
+            fmt::print("    lengths: {:.6g}{}\n", fmt::join(firstLengths(*report, most), ", "),
+                       report->lengths.size() > most ? ", ..." : "");
+    }
+
+    Json toJson(std::optional<Report> const& report, std::uint64_t most)
+    {
+        if (!report)
+            return {{"is_strands", false}};
+        return {{"is_strands", true},           {"strands", report->lengths.size()},     {"points", report->points},
+                {"total", report->total},       {"shortest", report->shortest()},        {"mean", report->mean()},
+                {"longest", report->longest()}, {"lengths", firstLengths(*report, most)}};
+    }
+
+    ExitCode runStrands(Options const& options)
+    {
+        std::vector<std::optional<Report>> reports;
+        {
+            Working const working("strands");
+            for (auto const& object : readZon(options.input))
+                reports.push_back(object ? measure(*object) : std::nullopt);
+        }
+        Json list = Json::array();
+        for (std::size_t i = 0; i < reports.size(); ++i) {
+            if (options.wantsJson)
+                list.push_back(toJson(reports[i], options.mostLengths));
+            else
+                print(i, reports[i], options.mostLengths);
+        }
+        if (options.wantsJson)
+            fmt::print("{}\n", Json{{"file", options.input}, {"objects", list}}.dump(2, ' ', false,
+                                                                                     Json::error_handler_t::replace));
+        return kDone;
+    }
+
+} // namespace
+
+void addStrands(CLI::App& app, Run& run)
+{
+    auto const options = std::make_shared<Options>();
+    auto* const command = app.add_subcommand("strands", "Measures the lengths of strands");
+    command->add_option("file", options->input, "zon file")->required();
+    command->add_option("--max", options->mostLengths, "How many lengths to list")->capture_default_str();
+    command->add_flag("--json", options->wantsJson, "Report as JSON on stdout");
+    command->callback([options, &run] { run = [options] { return runStrands(*options); }; });
+}
+
+} // namespace Zon
