@@ -54,6 +54,11 @@
 #include <veldrin/tags/TagResolver.h>
 #include <veldrin/tags/TagSetOperations.h>
 #include <veldrin/tags/TagToken.h>
+#include <veldrin/validation/GeoValidator.h>
+#include <veldrin/validation/MeshValidator.h>
+#include <veldrin/validation/PointCloudValidator.h>
+#include <veldrin/validation/StrandValidator.h>
+#include <veldrin/validation/VolumeValidator.h>
 #include <veldrin/volume/ValidUpdatedVolume.h>
 #include <veldrin/volume/VldProxyAccess.h>
 #include <veldrin/volume/VldProxyComponentChannel.h>

@@ -1,0 +1,75 @@
+#include "Edits.h"
+
+#include <nexil/JobCancel.h>
+#include <veldrin/validation/GeoValidator.h>
+#include <veldrin/validation/MeshValidator.h>
+#include <vld/Cancellation.h>
+
+#include <gtest/gtest.h>
+
+#include <stdexcept>
+
+namespace {
+
+using namespace Veldrin;
+using namespace support;
+
+TEST(Validation, NeverFetchesWhatATypeOrASizeTells)
+{
+    /// Data whose array would have to be built.
+    class Computed : public Object {
+    public:
+        [[nodiscard]] Nexil::Any getProperty(Nexil::String const& key) const override
+        {
+            if (key == Geometry::sData || key == Geometry::sIndices)
+                throw std::logic_error("built");
+            return Object::getProperty(key);
+        }
+        [[nodiscard]] PropertyInfo propertyInfo(Nexil::String const& key) const override
+        {
+            return Object(*this).propertyInfo(key);
+        }
+    };
+    auto const object = createObject();
+    addComponent(*object, "c", 3);
+    auto data = Nexil::makeMutable<Computed>();
+    Geometry::createDataGeoProperty(0.0f, "c", array<float>({1, 2, 3}), *data);
+    setProperty(*object, "d", std::move(data));
+    auto range = Nexil::makeMutable<Computed>();
+    Geometry::populateRangeGeoProperty(array<unsigned int>({0, 1, 2}), "c", *range);
+    setProperty(*object, "r", std::move(range));
+    EXPECT_EQ(Geometry::GeoValidator().validate(*object).message.view(), "");
+}
+
+TEST(Validation, ReadsAnArrayOnceHoweverManyPropertiesShareIt)
+{
+    // Read once for each property, these would be 10^12 indices.
+    auto const object = createObject();
+    auto const indices = array(Indices(10'000'000));
+    addComponent(*object, "c", 1);
+    for (int i = 0; i < 50'000; ++i) {
+        auto const number = std::to_string(i);
+        auto range = createObject();
+        Geometry::populateRangeGeoProperty(indices, "c", *range);
+        setProperty(*object, ("r" + number).c_str(), std::move(range));
+        addData(*object, ("d" + number).c_str(), ("r" + number).c_str(), {1});
+        addData(*object, ("e" + number).c_str(), ("r" + number).c_str(), {1});
+    }
+    EXPECT_EQ(Geometry::GeoValidator().validate(*object).message.view(), "");
+}
+
+TEST(Validation, StopsWhenTheJobIsCancelled)
+{
+    auto const object = filled([](Object& mesh) { Geometry::populatePlaneMesh(1, 10, mesh); });
+    Nexil::setJobCancelHook([] { return true; });
+    std::string text;
+    try {
+        (void)Geometry::validateMesh(*object);
+    } catch (std::runtime_error const& error) {
+        text = error.what();
+    }
+    Nexil::setJobCancelHook(nullptr);
+    EXPECT_EQ(text, VLD::exceptionMessage.view());
+}
+
+} // namespace

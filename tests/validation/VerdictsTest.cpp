@@ -1,0 +1,402 @@
+#include "Edits.h"
+
+#include <veldrin/geometry/Prototypes.h>
+#include <veldrin/validation/MeshValidator.h>
+#include <veldrin/validation/PointCloudValidator.h>
+#include <veldrin/validation/StrandValidator.h>
+#include <veldrin/validation/VolumeValidator.h>
+
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <memory>
+
+namespace {
+
+using namespace Veldrin;
+using namespace support;
+using Code = Geometry::GeoValidator::ErrorCode;
+
+enum class Kind { Any, Mesh, PointCloud, Strand, Volume };
+
+std::unique_ptr<Geometry::GeoValidator> validatorOf(Kind kind)
+{
+    switch (kind) {
+    case Kind::Mesh: return std::make_unique<Geometry::MeshValidator>();
+    case Kind::PointCloud: return std::make_unique<Geometry::PointCloudValidator>();
+    case Kind::Strand: return std::make_unique<Geometry::StrandValidator>();
+    case Kind::Volume: return std::make_unique<Geometry::VolumeValidator>();
+    default: return std::make_unique<Geometry::GeoValidator>();
+    }
+}
+
+/// Two triangles over four points: 6 corners.
+Nexil::MutablePtr<Object> twoTriangles()
+{
+    return support::mesh({{0, 0, 0}, {1, 0, 0}, {0, 1, 0}, {1, 1, 0}}, {{0, 1, 2}, {2, 1, 3}});
+}
+
+Nexil::MutablePtr<Object> twoStrands()
+{
+    return filled([](Object& strand) {
+        Geometry::populateStrand(array<Math::float3>({{}, {}, {}, {}}), array<unsigned int>({0, 2, 4}), strand);
+    });
+}
+
+Nexil::MutablePtr<Object> threePoints()
+{
+    return filled([](Object& cloud) { Geometry::populatePointCloud(array<Math::float3>({{}, {}, {}}), cloud); });
+}
+
+/// Three elements of "c", and the shape of data shared out by a range.
+void shareOut(Object& o, std::vector<float> const& values, Indices const& indices)
+{
+    addComponent(o, "c", 3);
+    addRange(o, "d_index", "c", indices);
+    addData(o, "d", "d_index", values);
+}
+
+struct Case {
+    char const* what;
+    Kind kind;
+    /// Breaks a valid object of the kind; an empty one for Kind::Any.
+    std::function<void(Object&)> change;
+    Code code = Code::Success;
+    char const* message = "";
+};
+
+Nexil::MutablePtr<Object> validObject(Kind kind)
+{
+    switch (kind) {
+    case Kind::Mesh: return twoTriangles();
+    case Kind::PointCloud: return threePoints();
+    case Kind::Strand: return twoStrands();
+    case Kind::Volume: return filled(&Geometry::populateVolume);
+    default: return createObject();
+    }
+}
+
+constexpr char kFaceOffsetFailure[] = "face_offset contains an invalid index into face_component";
+constexpr char kStrandOffsetFailure[] = "strand_offset contains an invalid index into strand_component";
+constexpr char kIndexFailure[] = "d_index contains an invalid index into d";
+
+Nexil::Ptr<Nexil::Array<unsigned int>> const kNoIndices;
+
+Case const kCases[] = {
+    {"a mesh", Kind::Mesh, [](Object&) {}},
+    {"no mesh at all", Kind::Mesh, [](Object& o) { o.eraseAllProperties(); }, Code::InvalidObject,
+     "Object is not a valid mesh"},
+    {"positions of four components", Kind::Mesh,
+     [](Object& o) {
+         setField(o, "point_position", "data", array<Math::float4>({{}, {}, {}, {}}));
+     },
+     Code::InvalidObject, "Object is not a valid mesh"},
+    {"a null array of positions", Kind::Mesh,
+     [](Object& o) { setField(o, "point_position", "data", Nexil::Ptr<Nexil::Array<Math::float3>>()); },
+     Code::InvalidProperty, "point_position contains an invalid property data"},
+    {"more points than positions", Kind::Mesh, [](Object& o) { setField(o, "point_component", "count", 5u); },
+     Code::InvalidElementCount, "point_position has an invalid number of elements"},
+    {"more positions than points", Kind::Mesh,
+     [](Object& o) {
+         setField(o, "point_position", "data", array<Math::float3>({{}, {}, {}, {}, {}}));
+     }},
+    {"a null array of corners", Kind::Mesh, [](Object& o) { setField(o, "face_vertex", "data", kNoIndices); },
+     Code::InvalidProperty, "face_vertex contains an invalid property data"},
+    {"a corner behind the last point", Kind::Mesh,
+     [](Object& o) {
+         setIndices(o, "face_vertex", {0, 1, 4, 2, 1, 3});
+     },
+     Code::InvalidIndex, "face_vertex contains an invalid index into point_component"},
+    {"a corner without a point", Kind::Mesh,
+     [](Object& o) {
+         setIndices(o, "face_vertex", {0, 1, 2, 2, 1, kInvalidIndex});
+     },
+     Code::InvalidIndex, "face_vertex contains an invalid index into point_component"},
+    {"a wrong corner beyond those that count", Kind::Mesh,
+     [](Object& o) {
+         setIndices(o, "face_vertex", {0, 1, 2, 2, 1, 3, 9});
+     },
+     Code::InvalidIndex, "face_vertex contains an invalid index into point_component"},
+    {"fewer corners than counted, found by the check of all properties", Kind::Mesh,
+     [](Object& o) {
+         setIndices(o, "face_vertex", {0, 1, 2, 2, 1});
+     },
+     Code::InvalidElementCount, "face_vertex has an invalid number of elements"},
+    {"a null array of offsets", Kind::Mesh, [](Object& o) { setField(o, "face_offset", "data", kNoIndices); },
+     Code::InvalidProperty, "face_offset contains an invalid property data"},
+    {"an offset too few", Kind::Mesh,
+     [](Object& o) {
+         setIndices(o, "face_offset", {0, 6});
+     },
+     Code::InvalidIndex, kFaceOffsetFailure},
+    {"an offset too many", Kind::Mesh,
+     [](Object& o) {
+         setIndices(o, "face_offset", {0, 3, 6, 6});
+     },
+     Code::InvalidIndex, kFaceOffsetFailure},
+    {"a first offset above 0", Kind::Mesh,
+     [](Object& o) {
+         setIndices(o, "face_offset", {1, 3, 6});
+     },
+     Code::InvalidIndex, kFaceOffsetFailure},
+    {"offsets that fall", Kind::Mesh,
+     [](Object& o) {
+         setField(o, "face_component", "count", 3u);
+         setIndices(o, "face_offset", {0, 4, 3, 6});
+     },
+     Code::InvalidIndex, kFaceOffsetFailure},
+    {"a last offset above the corners", Kind::Mesh,
+     [](Object& o) {
+         setIndices(o, "face_offset", {0, 3, 7});
+     },
+     Code::InvalidIndex, kFaceOffsetFailure},
+    {"a last offset below the corners", Kind::Mesh,
+     [](Object& o) {
+         setIndices(o, "face_offset", {0, 3, 5});
+     }},
+    {"offsets that target nothing, thus no face", Kind::Mesh, [](Object& o) { setTarget(o, "face_offset", "nowhere"); },
+     Code::InvalidIndex, "face_offset contains an invalid index into nowhere"},
+    {"no faces and the offset 0", Kind::Mesh,
+     [](Object& o) {
+         o.eraseAllProperties();
+         Geometry::populateMesh(o);
+     }},
+    {"no faces and the offset 1", Kind::Mesh,
+     [](Object& o) {
+         o.eraseAllProperties();
+         Geometry::populateMesh(o);
+         setIndices(o, "face_offset", {1});
+     },
+     Code::InvalidIndex, kFaceOffsetFailure},
+    {"no faces and no offset", Kind::Mesh,
+     [](Object& o) {
+         o.eraseAllProperties();
+         Geometry::populateMesh(o);
+         setIndices(o, "face_offset", {});
+     },
+     Code::InvalidIndex, kFaceOffsetFailure},
+    {"a broken further property", Kind::Mesh,
+     [](Object& o) {
+         addData(o, "point_mass", "point_component", {1, 2});
+     },
+     Code::InvalidElementCount, "point_mass has an invalid number of elements"},
+
+    {"points", Kind::PointCloud, [](Object&) {}},
+    {"no points at all", Kind::PointCloud, [](Object& o) { o.eraseProperty("point_component"); }, Code::InvalidObject,
+     "Object is not a valid point cloud"},
+    {"fewer positions than points", Kind::PointCloud, [](Object& o) { setField(o, "point_component", "count", 4u); },
+     Code::InvalidElementCount, "point_position has an invalid number of elements"},
+
+    {"strands", Kind::Strand, [](Object&) {}},
+    {"no strands at all", Kind::Strand, [](Object& o) { o.eraseProperty("strand_offset"); }, Code::InvalidObject,
+     "Object is not a valid strand"},
+    {"no offsets of strands", Kind::Strand, [](Object& o) { setField(o, "strand_offset", "data", kNoIndices); },
+     Code::InvalidProperty, "strand_offset contains an invalid property data"},
+    {"a strand beyond the points", Kind::Strand,
+     [](Object& o) {
+         setIndices(o, "strand_offset", {0, 2, 5});
+     },
+     Code::InvalidIndex, kStrandOffsetFailure},
+    {"positions fewer than the points of strands", Kind::Strand,
+     [](Object& o) { setField(o, "point_component", "count", 9u); }, Code::InvalidElementCount,
+     "point_position has an invalid number of elements"},
+
+    {"a volume", Kind::Volume, [](Object&) {}},
+    {"no volume at all", Kind::Volume, [](Object& o) { o.eraseProperty("voxel_tile_tree"); }, Code::InvalidObject,
+     "Object is not a valid volume"},
+    {"a volume whose voxels are claimed by numbers alone", Kind::Volume,
+     [](Object& o) { setField(o, "voxel_component", "count", 1u); }, Code::InvalidObject,
+     "Object is not a valid volume"},
+
+    {"nothing", Kind::Any, [](Object&) {}},
+    {"plain values, components and further objects", Kind::Any,
+     [](Object& o) {
+         setProperty(o, "name", "value");
+         setProperty(o, "null", Nexil::Ptr<Object>());
+         setProperty(o, "further", createObject());
+         addComponent(o, "c", 3);
+     }},
+    {"data that targets nothing", Kind::Any, [](Object& o) { addData(o, "d", "", {1}); }, Code::MissingTarget,
+     "d has no target"},
+    {"data that targets what is not there", Kind::Any, [](Object& o) { addData(o, "d", "c", {1}); },
+     Code::MissingTarget, "d has no target"},
+    {"data that targets itself", Kind::Any, [](Object& o) { addData(o, "d", "d", {1}); }, Code::InvalidTarget,
+     "d target itself"},
+    {"data shorter than its component", Kind::Any,
+     [](Object& o) {
+         addComponent(o, "c", 3);
+         addData(o, "d", "c", {1, 2});
+     },
+     Code::InvalidElementCount, "d has an invalid number of elements"},
+    {"a null array over a component", Kind::Any,
+     [](Object& o) {
+         addComponent(o, "c", 1);
+         addData(o, "d", "c", {});
+         setField(o, "d", "data", Nexil::Ptr<Nexil::Array<float>>());
+     },
+     Code::InvalidElementCount, "d has an invalid number of elements"},
+    {"data that targets data", Kind::Any,
+     [](Object& o) {
+         addComponent(o, "c", 1);
+         addData(o, "e", "c", {1});
+         addData(o, "d", "e", {1});
+     },
+     Code::InvalidTarget, "d has an invalid target e"},
+    {"data over a range", Kind::Any,
+     [](Object& o) {
+         shareOut(o, {5, 6}, {0, 1, 1});
+     }},
+    {"data over a range that asks for no value", Kind::Any,
+     [](Object& o) {
+         shareOut(o, {5, 6}, {kInvalidIndex, 1, kInvalidIndex});
+     }},
+    {"data over a range that asks for no value of none", Kind::Any,
+     [](Object& o) {
+         shareOut(o, {}, {kInvalidIndex, kInvalidIndex, kInvalidIndex});
+     }},
+    {"an index at the number of values", Kind::Any,
+     [](Object& o) {
+         shareOut(o, {5, 6}, {0, 2, 1});
+     },
+     Code::InvalidIndex, kIndexFailure},
+    {"a last index at the number of values, one more than elements", Kind::Any,
+     [](Object& o) {
+         shareOut(o, {5, 6}, {0, 1, 1, 2});
+     }},
+    {"a last index at the number of values, as many as elements", Kind::Any,
+     [](Object& o) {
+         shareOut(o, {5, 6}, {0, 1, 2});
+     },
+     Code::InvalidIndex, kIndexFailure},
+    {"a last index behind the number of values", Kind::Any,
+     [](Object& o) {
+         shareOut(o, {5, 6}, {0, 1, 1, 3});
+     },
+     Code::InvalidIndex, kIndexFailure},
+    {"a first index at the number of values, one more than elements", Kind::Any,
+     [](Object& o) {
+         shareOut(o, {5, 6}, {2, 1, 1, 2});
+     },
+     Code::InvalidIndex, kIndexFailure},
+    {"a range that is told first, though the data over it fails as well", Kind::Any,
+     [](Object& o) {
+         shareOut(o, {5, 6}, {0, 9});
+     },
+     Code::InvalidElementCount, "indices has an invalid number of elements"},
+    {"data over a range without indices", Kind::Any,
+     [](Object& o) {
+         addData(o, "d", "d_index", {1});
+         addComponent(o, "c", 0);
+         addRange(o, "d_index", "c", {});
+         setField(o, "d_index", "indices", kNoIndices);
+     },
+     Code::InvalidTarget, "d has an invalid target d_index"},
+    {"a range that targets nothing", Kind::Any, [](Object& o) { addRange(o, "r", "c", {}); }, Code::MissingTarget,
+     "r has no target"},
+    {"a range that targets itself, its indices being null", Kind::Any,
+     [](Object& o) {
+         addRange(o, "r", "r", {});
+         setField(o, "r", "indices", kNoIndices);
+     },
+     Code::InvalidTarget, "r target itself"},
+    {"a range without indices", Kind::Any,
+     [](Object& o) {
+         addComponent(o, "c", 0);
+         addRange(o, "r", "c", {});
+         setField(o, "r", "indices", kNoIndices);
+     },
+     Code::InvalidProperty, "r contains an invalid property indices"},
+    {"a range shorter than its component", Kind::Any,
+     [](Object& o) {
+         addComponent(o, "c", 3);
+         addRange(o, "r", "c", {0, 0});
+     },
+     Code::InvalidElementCount, "indices has an invalid number of elements"},
+    {"a range that targets a range", Kind::Any,
+     [](Object& o) {
+         addComponent(o, "c", 0);
+         addRange(o, "q", "c", {});
+         addRange(o, "r", "q", {});
+     },
+     Code::InvalidTarget, "r has an invalid target q"},
+};
+
+TEST(Verdicts, EachFaultHasItsCodeAndMessage)
+{
+    for (Case const& c : kCases) {
+        auto const object = validObject(c.kind);
+        c.change(*object);
+        auto const before = support::dump(*object);
+        auto const status = validatorOf(c.kind)->validate(*object);
+        EXPECT_EQ(static_cast<unsigned>(status.code), static_cast<unsigned>(c.code))
+            << c.what << ": " << status.message;
+        EXPECT_EQ(status.message.view(), c.message) << c.what;
+        EXPECT_EQ(static_cast<bool>(status), c.code == Code::Success) << c.what;
+        EXPECT_EQ(support::dump(*object), before) << c.what;
+    }
+}
+
+TEST(Verdicts, EveryPopulatedKindIsValid)
+{
+    using Populate = std::function<void(Object&)>;
+    std::pair<Kind, Populate> const kinds[] = {
+        {Kind::Mesh, static_cast<void (*)(Object&)>(&Geometry::populateMesh)},
+        {Kind::Mesh, [](Object& o) { Geometry::populateCubeMesh(2, o); }},
+        {Kind::Mesh, [](Object& o) { Geometry::populatePlaneMesh(1, 7, o); }},
+        {Kind::Mesh, [](Object& o) { Geometry::populateSphereMesh(-1, o); }},
+        {Kind::PointCloud, static_cast<void (*)(Object&)>(&Geometry::populatePointCloud)},
+        {Kind::Strand, static_cast<void (*)(Object&)>(&Geometry::populateStrand)},
+        {Kind::Volume, &Geometry::populateVolume},
+        {Kind::Volume, &Geometry::populateLevelSet},
+        {Kind::Volume, &Geometry::populateFogVolume},
+    };
+    for (auto const& [kind, populate] : kinds) {
+        auto const object = filled(populate);
+        EXPECT_EQ(validatorOf(kind)->validate(*object).message.view(), "") << static_cast<int>(kind);
+    }
+    // Shapes of instances are attached to nothing, which is all that is wrong with them.
+    EXPECT_EQ(Geometry::GeoValidator().validate(*filled(&Geometry::populateInstances)).message.view(),
+              "instance_shape has no target");
+}
+
+TEST(Verdicts, OfSeveralFailuresTheFirstKeyIsTold)
+{
+    auto const object = createObject();
+    addComponent(*object, "c", 2);
+    // Far more keys than one thread takes at once; the first to fail needs its indices read, later ones do not.
+    for (int i = 0; i < 3000; ++i)
+        addData(*object, ("good" + std::to_string(i)).c_str(), "c", {1, 2});
+    addRange(*object, "range", "c", {0, 5});
+    addData(*object, "first", "range", {1});
+    for (int i = 0; i < 3000; ++i)
+        addData(*object, ("bad" + std::to_string(i)).c_str(), "c", {1});
+    onThreadCounts([&] {
+        EXPECT_EQ(Geometry::GeoValidator().validate(*object).message.view(),
+                  "range contains an invalid index into first");
+    });
+    object->eraseProperty("first");
+    onThreadCounts([&] {
+        EXPECT_EQ(Geometry::GeoValidator().validate(*object).message.view(), "bad0 has an invalid number of elements");
+        EXPECT_EQ(Geometry::GeoValidator().findFailures(*object).size(), 3000u);
+    });
+}
+
+TEST(Verdicts, AllFailuresNameEachBrokenPropertyOnce)
+{
+    auto const object = twoTriangles();
+    setField(*object, "point_component", "count", 5u);
+    setIndices(*object, "face_vertex", {0, 1, 9, 2});
+    setIndices(*object, "face_offset", {0, 9, 6});
+    addData(*object, "point_mass", "nowhere", {1});
+    addData(*object, "point_width", "point_component", {1, 2, 3, 4, 5});
+    std::string found;
+    for (auto const& failure : Geometry::MeshValidator().findFailures(*object))
+        found += std::string(failure.property.view()) + ": " + failure.status.message.c_str() + "\n";
+    EXPECT_EQ(found, "point_position: point_position has an invalid number of elements\n"
+                     "face_vertex: face_vertex contains an invalid index into point_component\n"
+                     "face_offset: face_offset contains an invalid index into face_component\n"
+                     "point_mass: point_mass has no target\n");
+    EXPECT_TRUE(Geometry::MeshValidator().findFailures(*twoTriangles()).empty());
+}
+
+} // namespace

@@ -1,0 +1,74 @@
+#include "../volume/Samples.h"
+
+#include <support/Geometry.h>
+
+#include <veldrin/validation/VolumeValidator.h>
+#include <veldrin/volume/VolumeConversion.h>
+#include <vld/Container.h>
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+
+namespace {
+
+using namespace Veldrin;
+using VLD::TileTree3D::Container;
+using VLD::TileTree3D::TileLevels;
+using VLD::TileTree3D::VoxelTopology;
+
+template <class Traits>
+class VolumeVerdicts : public ::testing::Test {};
+TYPED_TEST_SUITE(VolumeVerdicts, support::BothConfigurations);
+
+template <class Traits>
+std::string verdictOf(TileLevels levels, float voxelSize)
+{
+    auto const topology = Nexil::makePtr<VoxelTopology<Traits>>("voxel_component", std::move(levels));
+    auto volume = VLD::createObject();
+    volume->addComponent(topology);
+    volume->addComponent(Nexil::makePtr<Container<Traits>>("voxel_tile_tree", topology, voxelSize));
+    auto const geometry = Geometry::move_vld_volume_to_object(*volume);
+    return Geometry::VolumeValidator().validate(*geometry).message.c_str();
+}
+
+TYPED_TEST(VolumeVerdicts, ConvertedVolumesAreValid)
+{
+    auto const geometry = Geometry::move_vld_volume_to_object(*support::sphereVolume<TypeParam>());
+    support::onThreadCounts([&] {
+        EXPECT_EQ(Geometry::VolumeValidator().validate(*geometry).message.view(), "");
+        // And as geo properties, with the identity of a container as the range.
+        EXPECT_EQ(Geometry::GeoValidator().validate(*geometry).message.view(), "");
+    });
+    EXPECT_TRUE(Geometry::VolumeValidator().findFailures(*geometry).empty());
+}
+
+TYPED_TEST(VolumeVerdicts, InconsistentOnesAreNot)
+{
+    auto const grid = support::sphere<TypeParam>({.channelName = "voxel_signed_distance"});
+    TileLevels const good = grid.topology->levels();
+    char const invalid[] = "Object is not a valid volume";
+    EXPECT_EQ(verdictOf<TypeParam>(good, 1), "");
+    for (float const size : {0.0f, -1.0f, std::nanf(""), HUGE_VALF})
+        EXPECT_EQ(verdictOf<TypeParam>(good, size), invalid) << size;
+    auto const broken = [&](auto const& change) {
+        TileLevels levels = good;
+        change(levels);
+        return verdictOf<TypeParam>(std::move(levels), 1);
+    };
+    EXPECT_EQ(broken([](TileLevels& l) { l.leafOrigins[1].x += 1; }), invalid);
+    EXPECT_EQ(broken([](TileLevels& l) { l.leafOrigins[1] = l.leafOrigins[0]; }), invalid);
+    EXPECT_EQ(broken([](TileLevels& l) { l.leafParents[0] = 0xFFFFFFF0u; }), invalid);
+    EXPECT_EQ(broken([](TileLevels& l) { l.innerChildren.resize(l.innerChildren.size() - 1); }), invalid);
+}
+
+TYPED_TEST(VolumeVerdicts, WhatDoesNotConvertIsNone)
+{
+    auto const geometry = Geometry::move_vld_volume_to_object(*support::sphereVolume<TypeParam>());
+    // The container is attached to nothing any more.
+    auto const tileTree = support::part(*geometry, "voxel_tile_tree");
+    setProperty(*geometry, "lost", tileTree);
+    EXPECT_EQ(Geometry::VolumeValidator().validate(*geometry).message.view(), "Object is not a valid volume");
+}
+
+} // namespace
