@@ -1,8 +1,37 @@
 """zon tags and zon tag: what they select, store, refuse and warn about."""
+import struct
+
 import tool
 
 # Four quads of a 2 x 2 square in the plane y = 0, and points by row.
 PLANE = ["make", "plane", "plane.zon", "--size", "2", "--subdivisions", "2"]
+
+
+
+
+def packed(value):
+    """A MessagePack item: of a list, a text, bytes, a number or a truth value."""
+    if isinstance(value, bool):
+        return b"\xc3" if value else b"\xc2"
+    if isinstance(value, int):
+        return b"\xce" + struct.pack(">I", value)
+    if isinstance(value, bytes):
+        return b"\xc4" + bytes([len(value)]) + value
+    if isinstance(value, str):
+        return b"\xd9" + bytes([len(value.encode())]) + value.encode()
+    return b"\xdc" + struct.pack(">H", len(value)) + b"".join(map(packed, value))
+
+
+def file_of_tags(tags):
+    """A zon file of version 5, which has no hashes: one object of 3 points, tags by (name, component, flags)."""
+    properties = ["point_component", [362, ["count", [2, 3]]]]
+    for name, component, flags in tags:
+        properties += [name, [362, ["data", [130, [0, [len(flags), [flags]]]], "target", [11, component]]]]
+    head = packed(["file_identifier", [2, 6611198], "file_version", [2, 5], "compression_level", [6, 0],
+                   "serialize_handles", [10, False]])
+    item = packed([362, properties])
+    position = len(head) + 9
+    return head + b"\xcf" + struct.pack(">Q", position + len(item)) + item + packed(position) + packed(1)
 
 
 class Tags(tool.ToolTest):
@@ -36,13 +65,16 @@ class Tags(tool.ToolTest):
         self.zon("import", "tenth.off", "plane.zon")
         self.assertEqual(self.selected_points("x == 0.1"), [0])
         self.assertEqual(self.selected_points("x > 0.1"), [1])
+        # Also one that is next to nothing.
+        self.assertEqual(self.selected_points("x > 1e-60 & y <= 1e-45 & x < +0.2"), [0])
 
     def test_wrong_rules_and_expressions_show_where(self):
         for arguments, column, message in (
                 (["--where", "w > 0"], 0, "expecting x, y or z"), (["--where", "x > 0 & "], 8, "expecting x, y or z"),
                 (["--where", "x = 0"], 2, "expecting <, <=, >, >=, == or !="), (["--where", "x > a"], 4, "expecting a number"),
                 (["--where", "x > 1e99"], 4, "within the range"), (["--where", "x > inf"], 4, "expecting a number"),
-                (["--where", "x > 0 | y > 0"], 6, "expecting '&'"), (["--where", "x > 0.5.5"], 7, "expecting '&'"),
+                (["--where", "x > 0 | y > 0"], 6, "expecting '&'"), (["--where", "x > 0.5.5"], 4, "expecting a number"),
+                (["--where", ""], 0, "expecting x, y or z"), ([""], 0, "Expression Invalid"),
                 (["(a"], 2, "Expecting a ')'"), (["a b"], 2, "Expression Invalid"), (["a + é"], 4, "Expecting:  ("),
                 (["(é"], 1, "Expecting:  ("), (["a é é"], 2, "Expression Invalid"), (["a\n+"], 3, "Expecting:  (")):
             lines = self.zon("tag", "plane.zon", *arguments, code=2).stderr.splitlines()
@@ -86,6 +118,21 @@ class Tags(tool.ToolTest):
         self.zon("make", "cube", "bare.zon")
         self.assertIn("there are no tags", self.zon("tag", "bare.zon", "a").stderr)
 
+    def test_tags_that_expressions_cannot_use_are_listed_and_not_recommended(self):
+        self.write("odd.zon", file_of_tags([("good", "point_component", b"\1\0\1"), ("two words", "point_component", b"\1"),
+                                            ("ünï*", "point_component", b""), ("own", "own_component", b"\1\1\0"),
+                                            ("loose", "", b"\0")]))
+        self.assertEqual([(t["name"], t["component"], t["selected"], t["elements"])
+                          for t in self.json("tags", "odd.zon")["objects"][0]["tags"]],
+                         [("good", "point_component", 2, 3), ("two words", "point_component", 1, 1),
+                          ("ünï*", "point_component", 0, 0), ("own", "own_component", 2, 3), ("loose", "", 0, 1)])
+        for expression, warning in (("two", "'two' is no tag; nearest: good"), ("own*", "no tag matches 'own*'; nearest: good"),
+                                    ("own", "'own' is a tag of 'own_component', a component that expressions do not know"),
+                                    ("loose - good", "'loose' is a tag of no component")):
+            self.assertEqual(self.zon("tag", "odd.zon", expression).stderr, f"zon: warning: object 0: {warning}\n")
+        warnings = self.json("tag", "odd.zon", " + ".join(f"n{i}" for i in range(50)))["objects"][0]["warnings"]
+        self.assertEqual((len(warnings), warnings[-1]), (21, "30 names more that resolve to nothing"))
+
     def test_what_cannot_be_stored_is_not(self):
         before = (self.folder / "plane.zon").read_bytes()
         self.assertEqual(self.ask("missing", "--store", "a", code=1), (None, [], None))
@@ -93,7 +140,8 @@ class Tags(tool.ToolTest):
         self.assertEqual(self.ask("s(*)", "--store", "a", code=1)[2], None)
         for arguments, words in ((["*", "--store", "a b"], "a tag's name holds"), (["*", "--store", "a*"], "a tag's name holds"),
                                  (["*", "-o", "x.zon"], "--store"), (["*", "--where", "x > 0"], "--where"),
-                                 ([], "one of the two"), ([""], "one of the two")):
+                                 ([], "one of the two"), (["*", "--store", ""], "a tag's name holds"),
+                                 (["*", "--store", "", "-o", "x.zon"], "a tag's name holds")):
             self.assertIn(words, self.zon("tag", "plane.zon", *arguments, code=2).stderr)
         self.assertEqual((self.folder / "plane.zon").read_bytes(), before)
         self.assertEqual(self.names(), ["plane.zon"])

@@ -2,6 +2,7 @@
 
 #include "Command.h"
 #include "Console.h"
+#include "TextInput.h"
 
 #include <veldrin/geometry/GeoProperties.h>
 #include <veldrin/math/Vector.h>
@@ -10,7 +11,6 @@
 #include <fmt/format.h>
 
 #include <algorithm>
-#include <charconv>
 #include <cmath>
 
 namespace Zon {
@@ -59,10 +59,12 @@ PositionRule::Term PositionRule::readTerm(std::string_view text, std::size_t& pl
     term.comparison = comparison->second;
     place += comparison->first.size();
     skipBlanks(text, place);
-    auto const [end, fault] = std::from_chars(text.data() + place, text.data() + text.size(), term.number);
-    if (fault != std::errc() || !std::isfinite(term.number))
+    std::size_t const end = std::min(text.find_first_of(" \t\n\v\f\r&", place), text.size());
+    auto const number = parseFloat(text.substr(place, end - place));
+    if (!number || !std::isfinite(*number))
         failAt("--where", text, place, "expecting a number within the range of float");
-    place = static_cast<std::size_t>(end - text.data());
+    term.number = *number;
+    place = end;
     return term;
 }
 

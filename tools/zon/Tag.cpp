@@ -29,11 +29,14 @@ namespace {
     using Json = nlohmann::ordered_json;
     using MaskPtr = Nexil::Ptr<Nexil::Array<bool>>;
 
+    /// More words that resolve to nothing are counted only.
+    constexpr std::size_t kMostToldOf = 20;
+
     struct Options {
         std::string input;
-        std::string expression;
-        std::string rule;
-        std::string tag;
+        std::optional<std::string> expression;
+        std::optional<std::string> rule;
+        std::optional<std::string> tag;
         std::string output;
         bool wantsIndices = false;
         bool isStrict = false;
@@ -83,31 +86,62 @@ namespace {
         return !component.empty();
     }
 
-    std::string warningAbout(std::string const& word, std::vector<TagLine> const& tags)
+    bool isTagName(std::string_view text)
     {
-        bool const isPattern = word.find('*') != std::string::npos;
-        std::string plain = word;
-        std::erase(plain, '*');
-        auto nearest = nearestNames(plain, tags);
-        for (auto& name : nearest)
-            name = printable(name);
-        return fmt::format("{}; {}", isPattern ? "no tag matches '" + word + "'" : "'" + word + "' is no tag",
-                           nearest.empty() ? "there are no tags"
-                                           : fmt::format("nearest: {}", fmt::join(nearest, ", ")));
+        return !text.empty() &&
+               std::ranges::all_of(text, [](char c) { return c != '*' && VLD::Utils::Internal::isNameChar(c); });
     }
+
+    /// Tells of words that resolve to nothing. Looks for names alike only when there is such a word.
+    class Missing {
+    public:
+        explicit Missing(Object const& object) : object_(object) {}
+
+        [[nodiscard]] std::string warningAbout(std::string const& word)
+        {
+            MaskPtr mask;
+            Nexil::String component;
+            if (Geometry::getTagData(object_, toString(word), mask, component))
+                return component.empty()
+                           ? fmt::format("'{}' is a tag of no component", word)
+                           : fmt::format("'{}' is a tag of '{}', a component that expressions do not know", word,
+                                         printable(component.view()));
+            if (!usable_)
+                usable_ = usableTags();
+            std::string plain = word;
+            std::erase(plain, '*');
+            auto const nearest = nearestNames(plain, *usable_);
+            bool const isPattern = plain.size() < word.size();
+            return fmt::format("{}; {}", isPattern ? "no tag matches '" + word + "'" : "'" + word + "' is no tag",
+                               nearest.empty() ? "there are no tags"
+                                               : fmt::format("nearest: {}", fmt::join(nearest, ", ")));
+        }
+
+    private:
+        /// Those that an expression can name and that resolve.
+        [[nodiscard]] std::vector<Tag> usableTags() const
+        {
+            auto tags = tagsOf(object_);
+            std::erase_if(tags, [&](Tag const& tag) { return !isTagName(tag.name) || !resolves(tag.name, object_); });
+            return tags;
+        }
+
+        Object const& object_;
+        std::optional<std::vector<Tag>> usable_;
+    };
 
     /// One expression or rule, asked of one object after the other.
     class Question {
     public:
         explicit Question(Options const& options)
         {
-            if (!options.rule.empty()) {
-                rule_.emplace(options.rule);
+            if (options.rule) {
+                rule_.emplace(*options.rule);
                 return;
             }
-            if (auto const status = resolver_.parses(toString(options.expression)); !status)
-                failAt("expression", options.expression, status.byteOffset, status.message.view());
-            words_ = wordsOf(options.expression);
+            if (auto const status = resolver_.parses(toString(*options.expression)); !status)
+                failAt("expression", *options.expression, status.byteOffset, status.message.view());
+            words_ = wordsOf(*options.expression);
         }
 
         [[nodiscard]] Selection ask(Object const& object) const
@@ -123,10 +157,17 @@ namespace {
             selection.mask = resolver_.resolve(object, selection.component);
             if (selection.component.empty())
                 selection.mask.reset();
-            auto const tags = tagsOf(object);
+            Missing missing(object);
+            std::size_t untold = 0;
             for (auto const& word : words_.tags)
-                if (!resolves(word, object))
-                    selection.warnings.push_back(warningAbout(word, tags));
+                if (!resolves(word, object)) {
+                    if (selection.warnings.size() < kMostToldOf)
+                        selection.warnings.push_back(missing.warningAbout(word));
+                    else
+                        ++untold;
+                }
+            if (untold != 0)
+                selection.warnings.push_back(fmt::format("{} more that resolve to nothing", counted(untold, "name")));
             for (auto const& function : words_.functions)
                 if (function != "v" && function != "f" && function != "fv" && function != "s")
                     selection.warnings.push_back(
@@ -231,17 +272,17 @@ namespace {
                 continue;
             }
             selections.push_back(objects[i] ? question.ask(*objects[i]) : Selection{nullptr, "", "", {"is null"}});
-            if (!options.tag.empty())
-                store(options.tag, objects[i], selections.back());
+            if (options.tag)
+                store(*options.tag, objects[i], selections.back());
         }
         return selections;
     }
 
     ExitCode runTag(Options const& options)
     {
-        if (options.expression.empty() == options.rule.empty())
+        if (options.expression.has_value() == options.rule.has_value())
             throw Failure("an expression or --where, one of the two");
-        if (!std::ranges::all_of(options.tag, [](char c) { return c != '*' && VLD::Utils::Internal::isNameChar(c); }))
+        if (options.tag && !isTagName(*options.tag))
             throw Failure("--store: a tag's name holds letters, digits, '.', ':' and '_'");
         auto objects = readZon(options.input);
         auto const selections = askAll(options, objects);
@@ -269,7 +310,7 @@ namespace {
         if (options.wantsJson)
             fmt::print("{}\n", Json{{"file", options.input}, {"objects", list}}.dump(2, ' ', false,
                                                                                      Json::error_handler_t::replace));
-        return isRefused || (!options.tag.empty() && !isStored) ? kFindings : kDone;
+        return isRefused || (options.tag && !isStored) ? kFindings : kDone;
     }
 
 } // namespace
@@ -279,8 +320,10 @@ void addTag(CLI::App& app, Run& run)
     auto const options = std::make_shared<Options>();
     auto* const command = app.add_subcommand("tag", "Selects elements by tags or positions, and stores them as a tag");
     command->add_option("file", options->input, "zon file")->required();
-    auto* const expression = command->add_option("expression", options->expression,
-                                                 "Tags and how to combine them, as in 'point_a_tag ^ !face_b*'");
+    auto* const expression =
+        command->add_option("expression", options->expression,
+                            "Tags and how to combine them, as in 'point_a_tag ^ !face_b*'; behind '--' when it "
+                            "begins with '-'");
     command->add_option("--where", options->rule, "Points by position instead, as in 'y > 0.1 & x <= 3'")
         ->excludes(expression);
     auto* const tag = command->add_option("--store", options->tag, "Store the selection as a tag of this name");
@@ -288,7 +331,7 @@ void addTag(CLI::App& app, Run& run)
         ->needs(tag);
     command->add_flag("--indices", options->wantsIndices, "Show which elements are selected");
     command->add_flag("--strict", options->isStrict,
-                      "End with exit code 1, and store nothing, when a name resolves to nothing");
+                      "End with exit code 1, and store nothing, when there is any warning about an object");
     command->add_flag("--json", options->wantsJson, "Report as JSON on stdout");
     command->callback([options, &run] { run = [options] { return runTag(*options); }; });
 }

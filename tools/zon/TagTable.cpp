@@ -36,7 +36,7 @@ namespace {
     }
 
     /// A full name without what `createTagName` puts around the name given to it.
-    std::string_view givenName(TagLine const& tag)
+    std::string_view givenName(Tag const& tag)
     {
         std::string_view name = tag.name;
         auto const stem = std::string_view(tag.component).substr(0, tag.component.rfind('_') + 1);
@@ -50,15 +50,14 @@ namespace {
 
 } // namespace
 
-std::vector<TagLine> tagsOf(Veldrin::Object const& object)
+std::vector<Tag> tagsOf(Veldrin::Object const& object)
 {
-    std::vector<TagLine> tags;
+    std::vector<Tag> tags;
     Nexil::Ptr<Nexil::Array<bool>> mask;
     Nexil::String component;
     for (auto const& name : object.keys())
         if (Veldrin::Geometry::getTagData(object, name, mask, component))
-            tags.push_back(
-                {std::string(name.view()), std::string(component.view()), countSelected(*mask), mask->size()});
+            tags.push_back({std::string(name.view()), std::string(component.view()), mask});
     return tags;
 }
 
@@ -74,7 +73,7 @@ std::string shareText(std::uint64_t selected, std::uint64_t elements)
     return fmt::format("{:.1f} %", 100 * static_cast<double>(selected) / static_cast<double>(elements));
 }
 
-std::vector<std::string> nearestNames(std::string_view name, std::vector<TagLine> const& tags)
+std::vector<std::string> nearestNames(std::string_view name, std::vector<Tag> const& tags)
 {
     std::vector<std::pair<std::size_t, std::string>> byDistance;
     for (auto const& tag : tags)

@@ -10,15 +10,14 @@
 /// The tags that objects carry, for the subcommands that show and make them.
 namespace Zon {
 
-struct TagLine {
+struct Tag {
     std::string name; ///< the full name
     std::string component;
-    std::uint64_t selected = 0;
-    std::uint64_t elements = 0;
+    Nexil::Ptr<Nexil::Array<bool>> mask;
 };
 
-/// All tags of an object, in its order.
-[[nodiscard]] std::vector<TagLine> tagsOf(Veldrin::Object const& object);
+/// All tags of an object, in its order. Looks at no flag.
+[[nodiscard]] std::vector<Tag> tagsOf(Veldrin::Object const& object);
 
 /// How many flags are set.
 [[nodiscard]] std::uint64_t countSelected(Nexil::Array<bool> const& mask);
@@ -28,6 +27,6 @@ struct TagLine {
 
 /// Up to three of the tags' names, the likest to `name` first, by the number of characters to change. What a full name
 /// has around the name that the user gave it does not count.
-[[nodiscard]] std::vector<std::string> nearestNames(std::string_view name, std::vector<TagLine> const& tags);
+[[nodiscard]] std::vector<std::string> nearestNames(std::string_view name, std::vector<Tag> const& tags);
 
 } // namespace Zon

@@ -21,7 +21,7 @@ namespace {
         bool wantsJson = false;
     };
 
-    void printTable(std::size_t number, std::vector<TagLine> const& tags)
+    void printTable(std::size_t number, std::vector<Tag> const& tags)
     {
         fmt::print("object {}: {}\n", number, counted(tags.size(), "tag"));
         if (tags.empty())
@@ -38,19 +38,21 @@ namespace {
                                selected, elements, share);
         };
         fmt::print("{}\n", colored(stdout, Color::Bold, line("tag", "component", "selected", "of", "share")));
-        for (auto const& tag : tags)
-            fmt::print("{}\n", line(printable(tag.name), printable(tag.component), tag.selected, tag.elements,
-                                    shareText(tag.selected, tag.elements)));
+        for (auto const& tag : tags) {
+            auto const selected = countSelected(*tag.mask);
+            fmt::print("{}\n", line(printable(tag.name), printable(tag.component), selected, tag.mask->size(),
+                                    shareText(selected, tag.mask->size())));
+        }
     }
 
-    Json toJson(std::vector<TagLine> const& tags)
+    Json toJson(std::vector<Tag> const& tags)
     {
         Json list = Json::array();
         for (auto const& tag : tags)
             list.push_back({{"name", tag.name},
                             {"component", tag.component},
-                            {"selected", tag.selected},
-                            {"elements", tag.elements}});
+                            {"selected", countSelected(*tag.mask)},
+                            {"elements", tag.mask->size()}});
         return {{"tags", list}};
     }
 
@@ -59,7 +61,7 @@ namespace {
         auto const objects = readZon(options.input);
         Json list = Json::array();
         for (std::size_t i = 0; i < objects.size(); ++i) {
-            auto const tags = objects[i] ? tagsOf(*objects[i]) : std::vector<TagLine>();
+            auto const tags = objects[i] ? tagsOf(*objects[i]) : std::vector<Tag>();
             if (options.wantsJson)
                 list.push_back(toJson(tags));
             else
