@@ -1,4 +1,5 @@
 #include "Tables.h"
+#include "TreeText.h"
 
 #include <veldrin/tags/TagParser.h>
 #include <veldrin/tags/TagResolver.h>
@@ -9,54 +10,11 @@
 
 #include <memory>
 #include <sstream>
+#include <tuple>
 
 namespace {
 
-using namespace VLD::Utils::Internal;
-
-/// The tree as the tables write it.
-class Writer : public ExpressionVisitor {
-public:
-    using ExpressionVisitor::visit;
-    void visit(Literal& literal) override
-    {
-        text += literal.kind() == TokenKind::Pattern ? "/" + literal.id() + "/" : literal.id();
-    }
-    void visit(NegateExpression& complement) override { write("(! ", complement.expr()); }
-    void visit(FuncOp& function) override { write("(" + function.id() + ": ", function.expr()); }
-    void visit(BinaryOp& operation) override
-    {
-        text += std::string("(") + "+-^"[static_cast<int>(operation.op())] + " ";
-        visitExpression(operation.left());
-        text += " ";
-        visitExpression(operation.right());
-        text += ")";
-    }
-
-    std::string text;
-
-private:
-    void write(std::string const& head, Expression& operand)
-    {
-        text += head;
-        visitExpression(operand);
-        text += ")";
-    }
-};
-
-std::string treeOf(Expression& expression)
-{
-    Writer writer;
-    writer.visitExpression(expression);
-    return writer.text;
-}
-
-std::string dumpOf(Expression const& expression)
-{
-    std::ostringstream stream;
-    expression.dump(stream);
-    return stream.str();
-}
+using namespace trees;
 
 std::string repeated(std::string const& text, int count)
 {
@@ -147,9 +105,30 @@ TEST(TagLanguage, NestingIsLimitedToAThousand)
     EXPECT_TRUE(parseTagExpression("a" + repeated(" + (!b - v(c))", 2000)));
 }
 
+/// Runs `work` on a thread with a stack of 1 MiB, or more where code is not optimised.
+void onSmallStack(void (*work)())
+{
+#if defined(NDEBUG)
+    constexpr std::size_t kStackBytes = std::size_t(1) << 20;
+#else
+    constexpr std::size_t kStackBytes = std::size_t(1) << 22;
+#endif
+    pthread_attr_t attributes;
+    pthread_attr_init(&attributes);
+    pthread_attr_setstacksize(&attributes, kStackBytes);
+    pthread_t thread;
+    auto const run = [](void* argument) -> void* {
+        (*static_cast<void (**)()>(argument))();
+        return nullptr;
+    };
+    ASSERT_EQ(pthread_create(&thread, &attributes, run, &work), 0);
+    pthread_join(thread, nullptr);
+    pthread_attr_destroy(&attributes);
+}
+
 TEST(TagLanguage, ChainsOfAnyLengthNeedNoStack)
 {
-    auto const useChain = [](void*) -> void* {
+    onSmallStack([] {
         std::string const text = "a0" + repeated(" + a1 - !b ^ (c - d)", 33'334);
         auto const tree = parseTagExpression(text);
         EXPECT_EQ(dumpOf(*tree), text);
@@ -159,15 +138,26 @@ TEST(TagLanguage, ChainsOfAnyLengthNeedNoStack)
         Nexil::String component = "unset";
         EXPECT_TRUE(resolver.resolve(*Veldrin::createObject(), component)->empty());
         EXPECT_EQ(component, "");
-        return nullptr;
-    };
-    pthread_attr_t attributes;
-    pthread_attr_init(&attributes);
-    pthread_attr_setstacksize(&attributes, std::size_t(1) << 20);
-    pthread_t thread;
-    ASSERT_EQ(pthread_create(&thread, &attributes, useChain, nullptr), 0);
-    pthread_join(thread, nullptr);
-    pthread_attr_destroy(&attributes);
+    });
+}
+
+TEST(TagLanguage, TheDeepestNestingNeedsLittleStack)
+{
+    onSmallStack([] {
+        for (auto const& [opening, closing, depth] : {std::tuple{"!", "", 1000},
+                                                      {"v(", ")", 1000},
+                                                      {"*^(", ")", 1000},
+                                                      {"(", "+*)", 1000},
+                                                      {"(!* - a*)^v(", ")", 999},
+                                                      {"(* + !a)^!(", ")", 499}}) {
+            Veldrin::Geometry::TagResolver resolver;
+            ASSERT_TRUE(
+                resolver.parses(Nexil::String((repeated(opening, depth) + "*" + repeated(closing, depth)).c_str())));
+            Nexil::String component;
+            (void)resolver.resolve(*Veldrin::createObject(), component);
+            EXPECT_EQ(component, "point_component");
+        }
+    });
 }
 
 TEST(TagLanguage, AResolverKeepsTheLastExpressionThatParsed)

