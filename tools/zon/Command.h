@@ -13,8 +13,9 @@ namespace Zon {
 /// Exit codes of the program; scripts rely on them.
 enum ExitCode : int {
     kDone = 0,
-    kFindings = 1, ///< differences, a damaged file, faults of a mesh, or names that resolve to nothing
-    kFailure = 2,  ///< wrong usage, or a file that cannot be read or written
+    kFindings =
+        1, ///< differences, a damaged file, an invalid object, faults of a mesh, or names that resolve to nothing
+    kFailure = 2, ///< wrong usage, or a file that cannot be read or written
 };
 
 /// Ends a subcommand with `kFailure`; the text says which file and why.
@@ -39,5 +40,6 @@ void addTag(CLI::App& app, Run& run);
 void addNormals(CLI::App& app, Run& run);
 void addDiagnose(CLI::App& app, Run& run);
 void addStrands(CLI::App& app, Run& run);
+void addValidate(CLI::App& app, Run& run);
 
 } // namespace Zon

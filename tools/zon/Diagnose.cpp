@@ -1,16 +1,15 @@
 #include "Command.h"
 #include "Console.h"
+#include "MeshFindings.h"
 #include "Working.h"
 #include "ZonFile.h"
 
-#include <veldrin/algorithms/MeshDiagnostic.h>
 #include <veldrin/algorithms/MeshInvariants.h>
 #include <veldrin/geometry/GeoProperties.h>
 #include <veldrin/geometry/Prototypes.h>
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <fmt/ranges.h>
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
@@ -44,24 +43,6 @@ namespace {
         Diagnostic found;
     };
 
-    struct Finding {
-        char const* key; ///< in JSON
-        char const* one; ///< for people
-        char const* many;
-        Nexil::Array<unsigned int> Diagnostic::*elements;
-    };
-
-    constexpr Finding kFindingKinds[] = {
-        {"isolated_points", "isolated point", "isolated points", &Diagnostic::isolatedPoints},
-        {"degenerate_faces", "degenerate face", "degenerate faces", &Diagnostic::degenerateFaces},
-        {"zero_area_faces", "face without area", "faces without area", &Diagnostic::zeroAreaFaces},
-        {"non_manifold_faces", "face on an edge of three or more faces", "faces on edges of three or more faces",
-         &Diagnostic::nonManifoldFaces},
-        {"inconsistent_faces", "face turned against a neighbour", "faces turned against neighbours",
-         &Diagnostic::inconsistentFaces}};
-
-    constexpr std::uint64_t kMostShown = 10;
-
     Report examine(Object const& mesh)
     {
         Report report;
@@ -82,17 +63,6 @@ namespace {
         return report;
     }
 
-    std::vector<unsigned int> firstOf(Nexil::Array<unsigned int> const& elements)
-    {
-        return {elements.begin(), elements.begin() + std::min<std::uint64_t>(elements.size(), kMostShown)};
-    }
-
-    std::string findingText(Finding const& kind, Nexil::Array<unsigned int> const& elements)
-    {
-        return fmt::format("{} {}: {}{}", elements.size(), elements.size() == 1 ? kind.one : kind.many,
-                           fmt::join(firstOf(elements), ", "), elements.size() > kMostShown ? ", ..." : "");
-    }
-
     void print(std::size_t number, std::optional<Report> const& report)
     {
         if (!report) {
@@ -105,9 +75,9 @@ namespace {
                    counted(static_cast<std::uint64_t>(std::max(report->components, 0)), "component"));
         fmt::print("    Betti numbers {}, {}, {}\n", report->bettiNumbers.x, report->bettiNumbers.y,
                    report->bettiNumbers.z);
-        for (auto const& kind : kFindingKinds)
-            if (auto const& elements = report->found.*kind.elements; !elements.empty())
-                fmt::print("    {}\n", colored(stdout, Color::Yellow, findingText(kind, elements)));
+        for (auto const& kind : findingKinds())
+            if (!(report->found.*kind.elements).empty())
+                fmt::print("    {}\n", colored(stdout, Color::Yellow, findingText(kind, report->found)));
         if (report->found == Diagnostic{})
             fmt::print("    {}\n", colored(stdout, Color::Green, "nothing found"));
     }
@@ -117,10 +87,8 @@ namespace {
         if (!report)
             return {{"is_mesh", false}};
         Json findings = Json::object();
-        for (auto const& kind : kFindingKinds) {
-            auto const& elements = report->found.*kind.elements;
-            findings[kind.key] = {{"count", elements.size()}, {"first", firstOf(elements)}};
-        }
+        for (auto const& kind : findingKinds())
+            findings[kind.key] = findingJson(kind, report->found);
         auto const& betti = report->bettiNumbers;
         return {{"is_mesh", true},
                 {"points", report->points},

@@ -1,5 +1,6 @@
 #include "Command.h"
 #include "Console.h"
+#include "GeometryKind.h"
 #include "ValueRows.h"
 #include "ZonFile.h"
 
@@ -43,23 +44,6 @@ namespace {
         std::vector<std::pair<std::string, unsigned int>> components;
         std::vector<PropertyLine> properties;
     };
-
-    /// The most particular kind of geometry that the object is.
-    std::string kindOf(Object const& object)
-    {
-        std::pair<Nexil::Ptr<Object>, char const*> const kinds[] = {
-            {Geometry::getLevelSetPrototype(), "level set"},
-            {Geometry::getFogVolumePrototype(), "fog volume"},
-            {Geometry::getVolumePrototype(), "volume"},
-            {Geometry::getInstancesPrototype(), "instances"},
-            {Geometry::getMeshPrototype(), "mesh"},
-            {Geometry::getStrandPrototype(), "strands"},
-            {Geometry::getPointCloudPrototype(), "point cloud"}};
-        for (auto const& [prototype, name] : kinds)
-            if (Object::isA(object, *prototype))
-                return name;
-        return "object";
-    }
 
     /// What a property adds to a file of its own that is written at this level.
     std::uint64_t storedAlone(Nexil::String const& name, Nexil::Any const& value, int level)
@@ -105,7 +89,7 @@ namespace {
     ObjectReport describe(Object const& object, int level)
     {
         ObjectReport report;
-        report.kind = kindOf(object);
+        report.kind = nameOf(kindOf(object));
         report.name = std::string(getPropertyAs<Nexil::String>(object, "name").view());
         for (auto const& key : object.keys()) {
             auto line = describe(key, object.getProperty(key), level);

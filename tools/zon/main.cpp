@@ -36,8 +36,9 @@ int main(int argumentCount, char** arguments)
 {
     CLI::App app("Reads, writes and compares zon files: geometry objects in a compressed, checked stream.", "zon");
     app.require_subcommand(1);
-    app.footer("Exit codes: 0 done; 1 differences, a damaged file, faults of a mesh, or names that resolve to nothing; "
-               "2 wrong usage, or a file that cannot be read or written.\n'zon SUBCOMMAND --help' tells more.");
+    app.footer("Exit codes: 0 done; 1 differences, a damaged file, an invalid object, faults of a mesh, or names that "
+               "resolve to nothing; 2 wrong usage, or a file that cannot be read or written.\n'zon SUBCOMMAND --help' "
+               "tells more.");
     Run run;
     addImport(app, run);
     addExport(app, run);
@@ -51,6 +52,7 @@ int main(int argumentCount, char** arguments)
     addNormals(app, run);
     addDiagnose(app, run);
     addStrands(app, run);
+    addValidate(app, run);
     try {
         app.parse(argumentCount, arguments);
     } catch (CLI::ParseError const& wrongUsage) {

@@ -1,0 +1,84 @@
+"""zon validate: what it judges, how it reports, how it ends."""
+import tool
+import zon_files
+from zon_files import component, indices, mesh, obj, points, shapes, text
+
+TRIANGLE = [(0, 0, 0), (1, 0, 0), (0, 1, 0)]
+
+
+class Validate(tool.ToolTest):
+    def store(self, name, *objects):
+        return self.write(name, zon_files.stream([obj(each) for each in objects]))
+
+    def judged(self, *arguments, code=0):
+        """Path, kind and messages of each object."""
+        report = self.json("validate", *arguments, code=code)
+        objects = [each for file in report["files"] for each in file["objects"]]
+        self.assertEqual(report["valid"], all(each["valid"] for each in objects))
+        return [(each["path"], each["kind"], [failure["message"] for failure in each["failures"]]) for each in objects]
+
+    def test_what_the_tool_makes_is_valid(self):
+        for shape in ("cube", "plane", "sphere"):
+            self.zon("make", shape, f"{shape}.zon")
+        self.zon("make", "strands", "cube.zon", "hair.zon")
+        self.write("cloud.off", "OFF 1 0 0\n0 0 0\n")
+        self.zon("import", "cloud.off", "cloud.zon")
+        self.assertEqual(self.judged("cube.zon", "plane.zon", "sphere.zon", "hair.zon", "cloud.zon", "--strict"),
+                         [("0", kind, []) for kind in ("mesh", "mesh", "mesh", "strands", "point cloud")])
+        self.assertEqual(self.zon("validate", "cube.zon").stdout, "cube.zon: object 0: mesh: valid\n")
+
+    def test_the_first_failure_or_all_of_them(self):
+        self.store("bad.zon", mesh(TRIANGLE[:2], [0, 1, 3], [0, 4], counts=(3, 3, 1),
+                                   point_mass=indices([1], "nowhere"), face_mass=indices([5], "face_component")))
+        messages = ["point_position has an invalid number of elements",
+                    "face_vertex contains an invalid index into point_component",
+                    "face_offset contains an invalid index into face_component",
+                    "point_mass has no target"]
+        self.assertEqual(self.judged("bad.zon", code=1), [("0", "mesh", messages[:1])])
+        self.assertEqual(self.judged("bad.zon", "--all", code=1), [("0", "mesh", messages)])
+        one = self.json("validate", "bad.zon", code=1)["files"][0]["objects"][0]["failures"][0]
+        self.assertEqual(one, {"code": 4, "name": "InvalidElementCount", "property": "point_position",
+                               "message": messages[0]})
+        self.assertIn("object 0: mesh: invalid\n    4 InvalidElementCount: " + messages[0],
+                      self.zon("validate", "bad.zon", code=1).stdout)
+
+    def test_objects_are_judged_by_what_they_were_meant_to_be_and_wherever_they_are(self):
+        broken = mesh(TRIANGLE, [0, 1, 2], [0, 3])
+        broken["face_offset"] = points(TRIANGLE, "face_component")
+        instances = {"point_component": component(2),
+                     "instance_shape": shapes([obj(mesh(TRIANGLE, [0, 1, 2], [0, 3])), obj(broken)])}
+        strands = {"point_component": component(2), "strand_component": component(1),
+                   "point_position": points(TRIANGLE[:2]), "strand_offset": indices([0, 3], "strand_component")}
+        self.store("mixed.zon", {"note": text("no geometry")}, instances, strands, {"point_position": component(1)},
+                   {"lost": indices([], "")}, {"voxel_tile_tree": component(1)})
+        self.assertEqual(self.judged("mixed.zon", code=1), [
+            ("0", "object", []),
+            ("1", "instances", []),
+            ("2", "strands", ["strand_offset contains an invalid index into strand_component"]),
+            ("3", "point cloud", ["Object is not a valid point cloud"]),
+            ("4", "object", ["lost has no target"]),
+            ("5", "volume", ["Object is not a valid volume"]),
+            ("1/instance_shape/data[0]", "mesh", []),
+            ("1/instance_shape/data[1]", "mesh", ["Object is not a valid mesh"])])
+
+    def test_notes_count_only_when_asked_to(self):
+        self.store("notes.zon", mesh(TRIANGLE + [(9, 9, 9)], [0, 1, 2, 0, 1, 1], [0, 3, 6]))
+        one = self.json("validate", "notes.zon")["files"][0]["objects"][0]
+        self.assertEqual([(note["finding"], note["count"], note["first"]) for note in one["notes"]],
+                         [("isolated_points", 1, [3]), ("degenerate_faces", 1, [1])])
+        text = self.zon("validate", "notes.zon", "--strict", code=1).stdout
+        self.assertIn("mesh: valid\n    note: 1 isolated point: 3\n        " + one["notes"][0]["remedy"], text)
+        self.assertTrue(self.json("validate", "notes.zon", "--strict", code=1)["valid"])
+
+    def test_files_that_cannot_be_read_end_with_code_2(self):
+        self.zon("make", "cube", "cube.zon")
+        self.write("cut.zon", (self.folder / "cube.zon").read_bytes()[:-9])
+        for name in ("cut.zon", "missing.zon"):
+            result = self.zon("validate", "cube.zon", name, "--json", code=2)
+            self.assertIn(name, result.stderr)
+            self.assertEqual(result.stdout, "")
+        self.zon("validate", code=2)
+
+
+if __name__ == "__main__":
+    tool.main()
