@@ -108,7 +108,7 @@ void writeBox(VoxelTopology<Traits> const& topology, Coordinate const& origin, C
             fillElements(elements, begin * Traits::kLeafVoxels, end * Traits::kLeafVoxels, bytes.background,
                          elementSize);
             for (std::size_t leaf = begin; leaf < end; ++leaf) {
-                Coordinate const leafOrigin = topology.levels().leafOrigins[leaf];
+                Coordinate const leafOrigin = topology.leafOrigins()[leaf];
                 visitSharedRows<Traits>(box, leafOrigin, [&](int x, int y, int zBegin, int zEnd) {
                     std::uint64_t const place =
                         leaf * Traits::kLeafVoxels + topology.placeInLeaf(leafOrigin, {x, y, zBegin});

@@ -158,6 +158,28 @@ namespace {
         return all;
     }
 
+    /// Takes the distances from one more sphere at the voxels of a leaf tile, where they are smaller.
+    template <class Traits>
+    void lowerDistances(Sphere const& sphere, Coordinate const& origin, double voxelSize, double* distances)
+    {
+        constexpr int w = Traits::kDataWidth;
+        double squares[3][w];
+        for (int axis = 0; axis < 3; ++axis)
+            for (int i = 0; i < w; ++i) {
+                double const offset = (origin[axis] + i + 0.5) * voxelSize - sphere.centre[axis];
+                squares[axis][i] = offset * offset;
+            }
+        for (int x = 0; x < w; ++x)
+            for (int y = 0; y < w; ++y)
+                for (int z = 0; z < w; ++z, ++distances) {
+                    // Most voxels are nearer to another sphere, which the square tells without its root.
+                    double const reach = sphere.radius + *distances;
+                    double const square = squares[0][x] + squares[1][y] + squares[2][z];
+                    if (reach > 0 && square < reach * reach)
+                        *distances = std::min(*distances, std::sqrt(square) - sphere.radius);
+                }
+    }
+
     /// value(distance) turns a distance within the range into what a voxel holds.
     template <class Traits, class Value>
     Grid<Traits> build(GridDescription const& description, Spheres const& spheres, Range const& range, float background,
@@ -196,17 +218,12 @@ namespace {
         Nexil::Internal::resizeUninitialized(values, topology->elementCount());
         Nexil::parallel::forRange(topology->leafCount(), grain::kTiles, [&](std::size_t begin, std::size_t end) {
             for (std::size_t leaf = begin; leaf < end; ++leaf) {
-                Coordinate const& origin = topology->levels().leafOrigins[leaf];
+                Coordinate const& origin = topology->leafOrigins()[leaf];
                 double distances[Traits::kLeafVoxels];
                 std::fill(std::begin(distances), std::end(distances), range.outer);
                 for (std::uint64_t i = starts[leaf]; i < touched.leaves.size() && touched.leaves[i].leaf == origin;
                      ++i) {
-                    Sphere const sphere = spheres[touched.leaves[i].point];
-                    for (unsigned int place = 0; place < Traits::kLeafVoxels; ++place) {
-                        Coordinate const voxel = origin + cellAtPlace<Traits::kDataWidth>(place);
-                        double const distance = sphere.distance(Internal::centreOf(voxel, 1, voxelSize));
-                        distances[place] = std::min(distances[place], distance);
-                    }
+                    lowerDistances<Traits>(spheres[touched.leaves[i].point], origin, voxelSize, distances);
                 }
                 for (unsigned int place = 0; place < Traits::kLeafVoxels; ++place)
                     values[leaf * Traits::kLeafVoxels + place] = value(std::max(distances[place], -range.inner));

@@ -165,7 +165,7 @@ void writeVoxels(VoxelLayout<Traits> const& layout, Nexil::Array<Coordinate> con
         Nexil::parallel::forRange(topology.leafCount(), grain::kTiles, [&](std::size_t begin, std::size_t end) {
             fillElements(elements, begin * Traits::kLeafVoxels, end * Traits::kLeafVoxels, bytes.background, size);
             for (std::size_t leaf = begin; leaf < end; ++leaf) {
-                Coordinate const origin = topology.levels().leafOrigins[leaf];
+                Coordinate const origin = topology.leafOrigins()[leaf];
                 for (std::uint64_t r = layout.runOffsets[leaf]; r < layout.runOffsets[leaf + 1]; ++r)
                     for (std::uint64_t i = layout.runs[r].begin; i < layout.runs[r].end; ++i)
                         copyElement(elements, leaf * Traits::kLeafVoxels + topology.placeInLeaf(origin, voxels[i]),

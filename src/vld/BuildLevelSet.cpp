@@ -223,7 +223,7 @@ Grid<Traits> buildLevelSet(GridDescription const& description, VoxelBox const& b
     Nexil::Internal::resizeUninitialized(distances, topology->elementCount());
     Nexil::parallel::forRange(topology->leafCount(), grain::kTiles, [&](std::size_t begin, std::size_t end) {
         for (std::size_t leaf = begin; leaf < end; ++leaf) {
-            Coordinate const& origin = topology->levels().leafOrigins[leaf];
+            Coordinate const& origin = topology->leafOrigins()[leaf];
             float* const values = distances.data() + leaf * Traits::kLeafVoxels;
             field.fill(field.function, origin, Traits::kDataWidth, voxelSize, band, values);
             judge.clip<Traits::kDataWidth>(origin, values);
@@ -232,7 +232,7 @@ Grid<Traits> buildLevelSet(GridDescription const& description, VoxelBox const& b
     Nexil::parallel::forRange(topology->innerCount(), grain::kTiles, [&](std::size_t begin, std::size_t end) {
         for (std::size_t inner = begin; inner < end; ++inner) {
             float* const cells = distances.data() + topology->voxelCount() + inner * Traits::kInnerCells;
-            Coordinate const& origin = topology->levels().innerOrigins[inner];
+            Coordinate const& origin = topology->innerOrigins()[inner];
             bool const isInside = judge.sideOf(origin, Traits::kInnerWidth) == Side::Inside;
             for (unsigned int cell = 0; cell < Traits::kInnerCells; ++cell) {
                 bool const isCellInside =

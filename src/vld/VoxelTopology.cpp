@@ -63,6 +63,18 @@ namespace {
         bool report_;
     };
 
+    template <class T>
+    Nexil::Ptr<Nexil::Array<T>> shared(Nexil::Array<T>&& array)
+    {
+        return Nexil::makePtr<Nexil::Array<T>>(std::move(array));
+    }
+
+    SharedTileLevels shared(TileLevels&& levels)
+    {
+        return {shared(std::move(levels.leafOrigins)), shared(std::move(levels.leafParents)),
+                shared(std::move(levels.innerOrigins)), shared(std::move(levels.innerChildren))};
+    }
+
     /// The place among its inner tile's cells of the leaf tile at `leaf`.
     template <class Traits>
     unsigned int cellOfLeaf(Coordinate const& leaf)
@@ -73,35 +85,37 @@ namespace {
     }
 
     template <class Traits>
-    bool areConsistent(TileLevels const& levels, Findings const& findings)
+    bool areConsistent(SharedTileLevels const& levels, Findings const& findings)
     {
-        std::uint64_t const leafCount = levels.leafOrigins.size();
-        std::uint64_t const innerCount = levels.innerOrigins.size();
-        if (!findings.accept(levels.leafParents.size() == leafCount, "parents are not one per leaf tile") ||
-            !findings.accept(levels.innerChildren.size() == innerCount * Traits::kInnerCells,
+        auto const& leafOrigins = *levels.leafOrigins;
+        auto const& leafParents = *levels.leafParents;
+        auto const& innerOrigins = *levels.innerOrigins;
+        auto const& innerChildren = *levels.innerChildren;
+        std::uint64_t const leafCount = leafOrigins.size();
+        std::uint64_t const innerCount = innerOrigins.size();
+        if (!findings.accept(leafParents.size() == leafCount, "parents are not one per leaf tile") ||
+            !findings.accept(innerChildren.size() == innerCount * Traits::kInnerCells,
                              "children are not one per cell") ||
             !findings.accept(leafCount * Traits::kLeafVoxels + innerCount * Traits::kInnerCells < kNoElement,
                              "more elements than 32 bits count") ||
-            !findings.acceptAll(firstWrongOrigin<Traits::kDataWidth>(levels.leafOrigins),
-                                "wrong origin of leaf tile") ||
-            !findings.acceptAll(firstWrongOrigin<Traits::kInnerWidth>(levels.innerOrigins),
-                                "wrong origin of inner tile"))
+            !findings.acceptAll(firstWrongOrigin<Traits::kDataWidth>(leafOrigins), "wrong origin of leaf tile") ||
+            !findings.acceptAll(firstWrongOrigin<Traits::kInnerWidth>(innerOrigins), "wrong origin of inner tile"))
             return false;
 
         auto const wrongParent = firstWrong(leafCount, [&](std::uint64_t leaf) {
-            Coordinate const& origin = levels.leafOrigins[leaf];
-            std::uint64_t const parent = levels.leafParents[leaf];
-            return parent >= innerCount || levels.innerOrigins[parent] != tileOrigin<Traits::kInnerWidth>(origin) ||
-                   levels.innerChildren[parent * Traits::kInnerCells + cellOfLeaf<Traits>(origin)] != leaf;
+            Coordinate const& origin = leafOrigins[leaf];
+            std::uint64_t const parent = leafParents[leaf];
+            return parent >= innerCount || innerOrigins[parent] != tileOrigin<Traits::kInnerWidth>(origin) ||
+                   innerChildren[parent * Traits::kInnerCells + cellOfLeaf<Traits>(origin)] != leaf;
         });
         if (!findings.acceptAll(wrongParent, "no cell of its parent points at leaf tile"))
             return false;
 
         // Together with the check above: each cell in use belongs to a leaf tile that knows it.
-        auto const wrongChild = firstWrong(levels.innerChildren.size(), [&](std::uint64_t cell) {
-            unsigned int const leaf = levels.innerChildren[cell];
-            return leaf != kNoTile && (leaf >= leafCount || levels.leafParents[leaf] != cell / Traits::kInnerCells ||
-                                       cellOfLeaf<Traits>(levels.leafOrigins[leaf]) != cell % Traits::kInnerCells);
+        auto const wrongChild = firstWrong(innerChildren.size(), [&](std::uint64_t cell) {
+            unsigned int const leaf = innerChildren[cell];
+            return leaf != kNoTile && (leaf >= leafCount || leafParents[leaf] != cell / Traits::kInnerCells ||
+                                       cellOfLeaf<Traits>(leafOrigins[leaf]) != cell % Traits::kInnerCells);
         });
         return findings.acceptAll(wrongChild, "wrong child in cell");
     }
@@ -110,7 +124,19 @@ namespace {
 
 template <class Traits>
 VoxelTopology<Traits>::VoxelTopology(Nexil::String name, TileLevels levels)
-    : Component(std::move(name)), levels_(std::move(levels)), hash_(levels_.innerOrigins)
+    : VoxelTopology(std::move(name), shared(std::move(levels)))
+{
+}
+
+template <class Traits>
+VoxelTopology<Traits>::VoxelTopology(Nexil::String name, SharedTileLevels levels)
+    : Component(std::move(name)), levels_(std::move(levels)), hash_(Nexil::makePtr<TileHash>(innerOrigins()))
+{
+}
+
+template <class Traits>
+VoxelTopology<Traits>::VoxelTopology(Nexil::String name, VoxelTopology const& tiles)
+    : Component(std::move(name)), levels_(tiles.levels_), hash_(tiles.hash_)
 {
 }
 
@@ -123,7 +149,14 @@ VoxelTopology<Traits>::VoxelTopology(VoxelTopology const&) = default;
 template <class Traits>
 Nexil::Ptr<VoxelTopology<Traits>> VoxelTopology<Traits>::create(Nexil::String name, TileLevels levels)
 {
-    if (name.empty() || !areConsistent<Traits>(levels, Findings(name, false)))
+    return create(std::move(name), shared(std::move(levels)));
+}
+
+template <class Traits>
+Nexil::Ptr<VoxelTopology<Traits>> VoxelTopology<Traits>::create(Nexil::String name, SharedTileLevels levels)
+{
+    if (name.empty() || !levels.leafOrigins || !levels.leafParents || !levels.innerOrigins || !levels.innerChildren ||
+        !areConsistent<Traits>(levels, Findings(name, false)))
         return nullptr;
     return Nexil::makePtr<VoxelTopology>(std::move(name), std::move(levels));
 }
@@ -160,9 +193,9 @@ Nexil::Ptr<Nexil::Array<unsigned int>> VoxelTopology<Traits>::elementIndices() c
 template <class Traits>
 std::uint64_t VoxelTopology<Traits>::byteSize() const noexcept
 {
-    return sizeof(*this) + hash_.byteSize() +
-           (levels_.leafOrigins.size() + levels_.innerOrigins.size()) * sizeof(Coordinate) +
-           (levels_.leafParents.size() + levels_.innerChildren.size()) * sizeof(unsigned int);
+    return sizeof(*this) + sizeof(TileHash) + hash_->byteSize() +
+           (leafOrigins().size() + innerOrigins().size()) * sizeof(Coordinate) +
+           (leafParents().size() + innerChildren().size()) * sizeof(unsigned int);
 }
 
 template class VoxelTopology<SmallTiles>;

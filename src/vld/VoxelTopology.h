@@ -28,6 +28,14 @@ struct TileLevels {
     Nexil::Array<unsigned int> innerChildren;
 };
 
+/// The same as shared arrays, none of them null.
+struct SharedTileLevels {
+    Nexil::Ptr<Nexil::Array<Coordinate>> leafOrigins;
+    Nexil::Ptr<Nexil::Array<unsigned int>> leafParents;
+    Nexil::Ptr<Nexil::Array<Coordinate>> innerOrigins;
+    Nexil::Ptr<Nexil::Array<unsigned int>> innerChildren;
+};
+
 /// A cube of voxels: `width` along each axis from `origin` on.
 struct VoxelCube {
     Coordinate origin;
@@ -46,35 +54,40 @@ public:
     /// `create`, or is asked for `isConsistent` before anything is looked up in it.
     /// Cost: linear in the inner tiles.
     VoxelTopology(Nexil::String name, TileLevels levels);
+    VoxelTopology(Nexil::String name, SharedTileLevels levels);
+    /// The same tiles under another name, shared. Cost: constant.
+    VoxelTopology(Nexil::String name, VoxelTopology const& tiles);
     ~VoxelTopology() override;
     VoxelTopology(VoxelTopology const&);
 
     /// Takes any tiles; null when they are not consistent or the name is empty.
     [[nodiscard]] static Nexil::Ptr<VoxelTopology> create(Nexil::String name, TileLevels levels);
+    /// The same from shared arrays, which stay shared; null also when one of them is null.
+    [[nodiscard]] static Nexil::Ptr<VoxelTopology> create(Nexil::String name, SharedTileLevels levels);
 
-    [[nodiscard]] TileLevels const& levels() const noexcept { return levels_; }
-    [[nodiscard]] unsigned int leafCount() const noexcept
-    {
-        return static_cast<unsigned int>(levels_.leafOrigins.size());
-    }
-    [[nodiscard]] unsigned int innerCount() const noexcept
-    {
-        return static_cast<unsigned int>(levels_.innerOrigins.size());
-    }
+    [[nodiscard]] Nexil::Array<Coordinate> const& leafOrigins() const noexcept { return *levels_.leafOrigins; }
+    [[nodiscard]] Nexil::Array<unsigned int> const& leafParents() const noexcept { return *levels_.leafParents; }
+    [[nodiscard]] Nexil::Array<Coordinate> const& innerOrigins() const noexcept { return *levels_.innerOrigins; }
+    [[nodiscard]] Nexil::Array<unsigned int> const& innerChildren() const noexcept { return *levels_.innerChildren; }
+    /// All four of them.
+    [[nodiscard]] SharedTileLevels const& levels() const noexcept { return levels_; }
+
+    [[nodiscard]] unsigned int leafCount() const noexcept { return static_cast<unsigned int>(leafOrigins().size()); }
+    [[nodiscard]] unsigned int innerCount() const noexcept { return static_cast<unsigned int>(innerOrigins().size()); }
     /// Number of leaf voxels: elements from here on are cells of inner tiles.
-    [[nodiscard]] std::uint64_t voxelCount() const noexcept { return levels_.leafOrigins.size() * Traits::kLeafVoxels; }
+    [[nodiscard]] std::uint64_t voxelCount() const noexcept { return leafOrigins().size() * Traits::kLeafVoxels; }
     /// Voxels of leaf tiles and cells of inner tiles; below 2^32 in a consistent topology.
     [[nodiscard]] std::uint64_t elementCount() const noexcept
     {
-        return voxelCount() + levels_.innerOrigins.size() * Traits::kInnerCells;
+        return voxelCount() + innerOrigins().size() * Traits::kInnerCells;
     }
 
     /// The leaf tile that holds a voxel, or `kNoTile`.
     [[nodiscard]] unsigned int findLeaf(Coordinate const& voxel) const noexcept
     {
         Coordinate const origin = tileOrigin<Traits::kInnerWidth>(voxel);
-        unsigned int const inner = hash_.find(origin);
-        return inner == kNoTile ? kNoTile : levels_.innerChildren[cellElement(inner, origin, voxel)];
+        unsigned int const inner = hash_->find(origin);
+        return inner == kNoTile ? kNoTile : innerChildren()[cellElement(inner, origin, voxel)];
     }
 
     /// The element that holds a voxel's value: of the voxel itself where there is a leaf tile, else of the inner cell that
@@ -82,25 +95,25 @@ public:
     [[nodiscard]] unsigned int findElement(Coordinate const& voxel) const noexcept
     {
         Coordinate const origin = tileOrigin<Traits::kInnerWidth>(voxel);
-        unsigned int const inner = hash_.find(origin);
+        unsigned int const inner = hash_->find(origin);
         if (inner == kNoTile)
             return kNoElement;
         std::uint64_t const cell = cellElement(inner, origin, voxel);
-        unsigned int const leaf = levels_.innerChildren[cell];
+        unsigned int const leaf = innerChildren()[cell];
         if (leaf == kNoTile)
             return static_cast<unsigned int>(voxelCount() + cell);
-        return leaf * Traits::kLeafVoxels + placeInLeaf(levels_.leafOrigins[leaf], voxel);
+        return leaf * Traits::kLeafVoxels + placeInLeaf(leafOrigins()[leaf], voxel);
     }
 
     /// The voxels that an element stands for: one in a leaf tile, `Traits::kDataWidth` per axis for an inner cell.
     [[nodiscard]] VoxelCube elementCube(unsigned int element) const noexcept
     {
         if (element < voxelCount())
-            return {levels_.leafOrigins[element / Traits::kLeafVoxels] +
+            return {leafOrigins()[element / Traits::kLeafVoxels] +
                         cellAtPlace<Traits::kDataWidth>(element % Traits::kLeafVoxels),
                     1};
         auto const cell = static_cast<unsigned int>(element - voxelCount());
-        return {levels_.innerOrigins[cell / Traits::kInnerCells] +
+        return {innerOrigins()[cell / Traits::kInnerCells] +
                     cellAtPlace<Traits::kTileWidth>(cell % Traits::kInnerCells) * int(Traits::kDataWidth),
                 Traits::kDataWidth};
     }
@@ -108,7 +121,7 @@ public:
     /// True for the cell of an inner tile that has a leaf tile in it.
     [[nodiscard]] bool isCellWithLeaf(unsigned int element) const noexcept
     {
-        return element >= voxelCount() && levels_.innerChildren[element - voxelCount()] != kNoTile;
+        return element >= voxelCount() && innerChildren()[element - voxelCount()] != kNoTile;
     }
 
     [[nodiscard]] static constexpr unsigned int placeInLeaf(Coordinate const& leafOrigin,
@@ -152,8 +165,8 @@ private:
         Nexil::Ptr<Nexil::Array<unsigned int>> indices;
     };
 
-    TileLevels levels_;
-    TileHash hash_;
+    SharedTileLevels levels_;
+    Nexil::Ptr<TileHash> hash_;
     mutable IndexCache indexCache_;
 };
 

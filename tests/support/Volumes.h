@@ -35,10 +35,17 @@ bool sameBytes(Nexil::Array<T> const& a, Nexil::Array<T> const& b)
     return a.size() == b.size() && (a.empty() || std::memcmp(a.data(), b.data(), a.size() * sizeof(T)) == 0);
 }
 
-inline bool sameTiles(VLD::TileTree3D::TileLevels const& a, VLD::TileTree3D::TileLevels const& b)
+inline bool sameTiles(VLD::TileTree3D::SharedTileLevels const& a, VLD::TileTree3D::SharedTileLevels const& b)
 {
-    return sameBytes(a.leafOrigins, b.leafOrigins) && sameBytes(a.leafParents, b.leafParents) &&
-           sameBytes(a.innerOrigins, b.innerOrigins) && sameBytes(a.innerChildren, b.innerChildren);
+    return sameBytes(*a.leafOrigins, *b.leafOrigins) && sameBytes(*a.leafParents, *b.leafParents) &&
+           sameBytes(*a.innerOrigins, *b.innerOrigins) && sameBytes(*a.innerChildren, *b.innerChildren);
+}
+
+/// The tiles of a topology, copied, so that they can be changed.
+template <class Traits>
+VLD::TileTree3D::TileLevels tilesOf(VLD::TileTree3D::VoxelTopology<Traits> const& topology)
+{
+    return {topology.leafOrigins(), topology.leafParents(), topology.innerOrigins(), topology.innerChildren()};
 }
 
 } // namespace support

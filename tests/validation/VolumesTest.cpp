@@ -46,7 +46,7 @@ TYPED_TEST(VolumeVerdicts, ConvertedVolumesAreValid)
 TYPED_TEST(VolumeVerdicts, InconsistentOnesAreNot)
 {
     auto const grid = support::sphere<TypeParam>({.channelName = "voxel_signed_distance"});
-    TileLevels const good = grid.topology->levels();
+    TileLevels const good = support::tilesOf(*grid.topology);
     char const invalid[] = "Object is not a valid volume";
     EXPECT_EQ(verdictOf<TypeParam>(good, 1), "");
     for (float const size : {0.0f, -1.0f, std::nanf(""), HUGE_VALF})

@@ -130,7 +130,7 @@ TYPED_TEST(BuildFromValues, ABoxKeepsItsValuesAndTakesTilesOnlyWhereTheyDifferFr
         support::forEachVoxel(origin, size, [&](Coordinate const& voxel) { ASSERT_EQ(value(voxel), values[place++]); });
         for (unsigned int leaf = 0; leaf < grid.topology->leafCount(); ++leaf) {
             bool isWanted = false;
-            support::forEachVoxel(grid.topology->levels().leafOrigins[leaf],
+            support::forEachVoxel(grid.topology->leafOrigins()[leaf],
                                   {Traits::kDataWidth, Traits::kDataWidth, Traits::kDataWidth},
                                   [&](Coordinate const& voxel) { isWanted |= value(voxel) != 0.5; });
             EXPECT_TRUE(isWanted);

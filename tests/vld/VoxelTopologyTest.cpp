@@ -22,7 +22,7 @@ public:
             voxels.push_back({i * Traits::kDataWidth, i % 3 * Traits::kInnerWidth, 1});
         Nexil::Array<bool> values;
         values.resize(voxels.size());
-        return buildFromVoxels<Traits>({.channelName = "c"}, voxels, values, false).topology->levels();
+        return support::tilesOf(*buildFromVoxels<Traits>({.channelName = "c"}, voxels, values, false).topology);
     }
 };
 TYPED_TEST_SUITE(Topology, support::BothConfigurations);
@@ -67,7 +67,7 @@ TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
          }},
     };
     EXPECT_TRUE(VoxelTopology<Traits>::create("t", this->sound()));
-    EXPECT_TRUE(VoxelTopology<Traits>::create("t", {}));
+    EXPECT_TRUE(VoxelTopology<Traits>::create("t", TileLevels()));
     EXPECT_FALSE(VoxelTopology<Traits>::create("", this->sound()));
     for (Damage const& damage : damages) {
         SCOPED_TRACE(damage.name);

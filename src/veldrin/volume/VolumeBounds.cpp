@@ -74,7 +74,7 @@ namespace {
         {
             constexpr int w = Traits::kDataWidth;
             for (unsigned int leaf = begin; leaf < end; ++leaf) {
-                Coordinate const& origin = topology.levels().leafOrigins[leaf];
+                Coordinate const& origin = topology.leafOrigins()[leaf];
                 if (extent_.holds(origin, lastOf(origin, w)))
                     continue;
                 T const* const values = values_ + std::uint64_t(leaf) * Traits::kLeafVoxels;
@@ -92,12 +92,12 @@ namespace {
         void visitInner(VoxelTopology<Traits> const& topology, unsigned int begin, unsigned int end) override
         {
             for (unsigned int inner = begin; inner < end; ++inner) {
-                Coordinate const& origin = topology.levels().innerOrigins[inner];
+                Coordinate const& origin = topology.innerOrigins()[inner];
                 if (extent_.holds(origin, lastOf(origin, Traits::kInnerWidth)))
                     continue;
                 std::uint64_t const first = std::uint64_t(inner) * Traits::kInnerCells;
                 for (unsigned int cell = 0; cell < Traits::kInnerCells; ++cell) {
-                    if (topology.levels().innerChildren[first + cell] != kNoTile ||
+                    if (topology.innerChildren()[first + cell] != kNoTile ||
                         !isContent_(values_[topology.voxelCount() + first + cell]))
                         continue;
                     Coordinate const low =
@@ -121,14 +121,31 @@ namespace {
             return origin + Coordinate{width - 1, width - 1, width - 1};
         }
 
+        /// Which planes of the tile have content, along each axis. Without a branch, as half the voxels decide each way.
         void extendByVoxels(Coordinate const& origin, T const* values)
         {
-            for (unsigned int place = 0; place < Traits::kLeafVoxels; ++place) {
-                if (!isContent_(values[place]))
-                    continue;
-                Coordinate const voxel = origin + VLD::TileTree3D::cellAtPlace<Traits::kDataWidth>(place);
-                extent_.extend(voxel, voxel);
-            }
+            constexpr int w = Traits::kDataWidth;
+            bool inX[w]{}, inY[w]{}, inZ[w]{};
+            for (int x = 0; x < w; ++x)
+                for (int y = 0; y < w; ++y, values += w) {
+                    bool inRow = false;
+                    for (int z = 0; z < w; ++z) {
+                        bool const isContent = isContent_(values[z]);
+                        inZ[z] |= isContent;
+                        inRow |= isContent;
+                    }
+                    inX[x] |= inRow;
+                    inY[y] |= inRow;
+                }
+            auto first = [](bool const* in) { return static_cast<int>(std::find(in, in + w, true) - in); };
+            auto last = [](bool const* in) {
+                int plane = w - 1;
+                while (!in[plane])
+                    --plane;
+                return plane;
+            };
+            extent_.extend(origin + Coordinate{first(inX), first(inY), first(inZ)},
+                           origin + Coordinate{last(inX), last(inY), last(inZ)});
         }
 
         T const* values_;
@@ -161,7 +178,7 @@ namespace {
     template <class Traits>
     bool hasAllChildren(VoxelTopology<Traits> const& topology)
     {
-        return topology.levels().innerChildren.size() == std::uint64_t(topology.innerCount()) * Traits::kInnerCells;
+        return topology.innerChildren().size() == std::uint64_t(topology.innerCount()) * Traits::kInnerCells;
     }
 
     template <class IsContent, class Traits>
