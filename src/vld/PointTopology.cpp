@@ -37,7 +37,21 @@ namespace {
 template <class Traits>
 PointTopology<Traits>::PointTopology(Nexil::String name, Nexil::Array<Coordinate> leafOrigins,
                                      Nexil::Array<unsigned int> offsets)
+    : PointTopology(std::move(name), Nexil::makePtr<Nexil::Array<Coordinate>>(std::move(leafOrigins)),
+                    Nexil::makePtr<Nexil::Array<unsigned int>>(std::move(offsets)))
+{
+}
+
+template <class Traits>
+PointTopology<Traits>::PointTopology(Nexil::String name, Nexil::Ptr<Nexil::Array<Coordinate>> leafOrigins,
+                                     Nexil::Ptr<Nexil::Array<unsigned int>> offsets)
     : Component(std::move(name)), leafOrigins_(std::move(leafOrigins)), offsets_(std::move(offsets))
+{
+}
+
+template <class Traits>
+PointTopology<Traits>::PointTopology(Nexil::String name, PointTopology const& points)
+    : PointTopology(std::move(name), points.leafOrigins_, points.offsets_)
 {
 }
 
@@ -50,7 +64,7 @@ PointTopology<Traits>::PointTopology(PointTopology const&) = default;
 template <class Traits>
 bool PointTopology<Traits>::isConsistent() const
 {
-    return areConsistent<Traits>(leafOrigins_, offsets_);
+    return areConsistent<Traits>(*leafOrigins_, *offsets_);
 }
 
 template <class Traits>
@@ -58,7 +72,16 @@ Nexil::Ptr<PointTopology<Traits>> PointTopology<Traits>::create(Nexil::String na
                                                                 Nexil::Array<Coordinate> leafOrigins,
                                                                 Nexil::Array<unsigned int> offsets)
 {
-    if (name.empty() || !areConsistent<Traits>(leafOrigins, offsets))
+    return create(std::move(name), Nexil::makePtr<Nexil::Array<Coordinate>>(std::move(leafOrigins)),
+                  Nexil::makePtr<Nexil::Array<unsigned int>>(std::move(offsets)));
+}
+
+template <class Traits>
+Nexil::Ptr<PointTopology<Traits>> PointTopology<Traits>::create(Nexil::String name,
+                                                                Nexil::Ptr<Nexil::Array<Coordinate>> leafOrigins,
+                                                                Nexil::Ptr<Nexil::Array<unsigned int>> offsets)
+{
+    if (name.empty() || !leafOrigins || !offsets || !areConsistent<Traits>(*leafOrigins, *offsets))
         return nullptr;
     return Nexil::makePtr<PointTopology>(std::move(name), std::move(leafOrigins), std::move(offsets));
 }

@@ -22,12 +22,21 @@ class VELDRIN_PLATFORM_API PointTopology final : public Component {
 public:
     /// Takes tiles that are known to fit together; what comes from elsewhere goes through `create`.
     PointTopology(Nexil::String name, Nexil::Array<Coordinate> leafOrigins, Nexil::Array<unsigned int> offsets);
+    /// The same from shared arrays, none of them null, which stay shared.
+    PointTopology(Nexil::String name, Nexil::Ptr<Nexil::Array<Coordinate>> leafOrigins,
+                  Nexil::Ptr<Nexil::Array<unsigned int>> offsets);
+    /// The same points under another name, shared. Cost: constant.
+    PointTopology(Nexil::String name, PointTopology const& points);
     ~PointTopology() override;
     PointTopology(PointTopology const&);
 
     /// Null when `isConsistent` would be false, or the name is empty.
     [[nodiscard]] static Nexil::Ptr<PointTopology> create(Nexil::String name, Nexil::Array<Coordinate> leafOrigins,
                                                           Nexil::Array<unsigned int> offsets);
+    /// The same from shared arrays, which stay shared; null also when one of them is null.
+    [[nodiscard]] static Nexil::Ptr<PointTopology> create(Nexil::String name,
+                                                          Nexil::Ptr<Nexil::Array<Coordinate>> leafOrigins,
+                                                          Nexil::Ptr<Nexil::Array<unsigned int>> offsets);
 
     /// Sorts points into tiles of voxels of the given size.
     ///
@@ -38,11 +47,16 @@ public:
                                                          Nexil::Array<Veldrin::Math::float3> const& positions,
                                                          float voxelSize, Nexil::Array<unsigned int>& order);
 
-    [[nodiscard]] Nexil::Array<Coordinate> const& leafOrigins() const noexcept { return leafOrigins_; }
-    [[nodiscard]] Nexil::Array<unsigned int> const& offsets() const noexcept { return offsets_; }
+    [[nodiscard]] Nexil::Array<Coordinate> const& leafOrigins() const noexcept { return *leafOrigins_; }
+    [[nodiscard]] Nexil::Array<unsigned int> const& offsets() const noexcept { return *offsets_; }
+    [[nodiscard]] Nexil::Ptr<Nexil::Array<Coordinate>> const& sharedLeafOrigins() const noexcept
+    {
+        return leafOrigins_;
+    }
+    [[nodiscard]] Nexil::Ptr<Nexil::Array<unsigned int>> const& sharedOffsets() const noexcept { return offsets_; }
     [[nodiscard]] std::uint64_t elementCount() const noexcept
     {
-        return offsets_.empty() ? 0 : offsets_[offsets_.size() - 1];
+        return offsets().empty() ? 0 : offsets()[offsets().size() - 1];
     }
 
     /// True when origins are increasing, unique, aligned and within the limits, and offsets start at 0, do not fall, and
@@ -50,8 +64,8 @@ public:
     [[nodiscard]] bool isConsistent() const;
 
 private:
-    Nexil::Array<Coordinate> leafOrigins_;
-    Nexil::Array<unsigned int> offsets_;
+    Nexil::Ptr<Nexil::Array<Coordinate>> leafOrigins_;
+    Nexil::Ptr<Nexil::Array<unsigned int>> offsets_;
 };
 
 extern template class PointTopology<SmallTiles>;

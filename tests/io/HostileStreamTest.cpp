@@ -1,7 +1,11 @@
 #include <support/StreamDescription.h>
 #include <support/Streams.h>
+#include <volume/Samples.h>
 
 #include <veldrin/object/Properties.h>
+#include <veldrin/volume/VldProxyComponentTopology.h>
+#include <veldrin/volume/VolumeConversion.h>
+#include <vld/BuildFromValues.h>
 
 #include <gtest/gtest.h>
 
@@ -30,6 +34,16 @@ std::vector<std::string> sweptStreams()
             auto const objects = support::read(valid(name)).objects;
             streams.push_back(support::written(objects, level));
         }
+    // Points and voxels in one tile each, with damage that the sweep may reach before the checksum tells of it.
+    auto volume = VLD::createObject();
+    Nexil::Array<VLD::TileTree3D::Coordinate> const voxel{{-3, 0, 5}};
+    VLD::TileTree3D::buildFromVoxels<VLD::TileTree3D::SmallTiles>({.channelName = "density"}, voxel,
+                                                                  Nexil::Array<unsigned char>{7}, '\0')
+        .addTo(*volume);
+    support::addPoints<VLD::TileTree3D::SmallTiles>(*volume);
+    Nexil::Ptr<Veldrin::Object> const geometry = Veldrin::Geometry::move_vld_volume_to_object(*volume);
+    for (int const level : {0, 9})
+        streams.push_back(support::written({geometry}, level));
     streams.push_back(valid("v6_handles"));
     streams.push_back(valid("v6_handles_level9"));
     return streams;
@@ -192,6 +206,17 @@ TEST(HostileStream, NoStreamTakesMuchMoreMemoryThanItsSize)
         properties += static_cast<char>(0xA0 + name.size()) + name + std::string("\x92\x0A\xC3");
     }
     dense.emplace_back("properties", old(properties));
+    // Tiles without voxels: all of them increasing, so that little compresses as well.
+    VLD::TileTree3D::TileLevels levels;
+    for (int i = 0; i < 2000000; ++i)
+        levels.innerOrigins.push_back({0, i / 100000 * 8, i % 100000 * 8});
+    for (int i = 0; i < 16000000; ++i)
+        levels.innerChildren.push_back(VLD::TileTree3D::kNoTile);
+    auto geometry = Veldrin::createObject();
+    Veldrin::setProperty(*geometry, "tiles",
+                         Nexil::Ptr<Veldrin::Object>(Nexil::makePtr<Veldrin::Geometry::VldProxyComponentTopology>(
+                             VLD::TileTree3D::VoxelTopology<VLD::TileTree3D::SmallTiles>::create("t", levels))));
+    dense.emplace_back("empty tiles", support::written({Nexil::Ptr<Veldrin::Object>(std::move(geometry))}, 9));
     for (auto const& [name, bytes] : dense) {
         EXPECT_TRUE(support::read(bytes).isRead) << name;
         expectModest(name, bytes);

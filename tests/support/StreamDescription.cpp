@@ -5,6 +5,7 @@
 #include <veldrin/geometry/GeoLocation.h>
 #include <veldrin/geometry/internal/ValueTypes.h>
 #include <veldrin/math/FCurve.h>
+#include <veldrin/volume/internal/ProxyDescription.h>
 
 #include <xxhash.h>
 
@@ -159,12 +160,25 @@ namespace {
         std::string object(ObjectPtr const& held)
         {
             return shared(held, [&] {
-                return "\"properties\":" + listed(held->keys(), [&](Nexil::String const& key) {
-                           Nexil::Any const value = held->getProperty(key);
+                Veldrin::Object const& content = contentOf(*held);
+                std::string const lead = &content == held.get() ? "" : "\"proxy\":true,";
+                return lead + "\"properties\":" + listed(content.keys(), [&](Nexil::String const& key) {
+                           Nexil::Any const value = content.getProperty(key);
                            std::string const frame = framed(value);
                            return "[" + quoted(key.view()) + "," + (value.empty() ? "null,null]" : frame.substr(1));
                        });
             });
+        }
+
+        /// The object itself, or what a file holds for a proxy of a volume.
+        Veldrin::Object const& contentOf(Veldrin::Object const& object)
+        {
+            auto const [place, isNew] = proxies_.try_emplace(&object);
+            if (isNew && !Veldrin::Geometry::Internal::describeProxy(object, place->second)) {
+                proxies_.erase(place);
+                return object;
+            }
+            return place->second;
         }
 
         std::string objects(ArrayPtr<ObjectPtr> const& array)
@@ -239,6 +253,8 @@ namespace {
         }
 
         std::unordered_map<void const*, std::size_t> numbers_;
+        // Kept, so that the addresses of what they hold are no other value's.
+        std::unordered_map<Veldrin::Object const*, Veldrin::Object> proxies_;
     };
 
 } // namespace

@@ -325,6 +325,105 @@ def valid():
     yield "v5_level9", one(frame(122, blob(large, 4, 9)), version=5, level=9)
 
 
+# --------------------------------------------------------------------------------------------- volumes
+
+INT3S, UINTS, STRINGS = 149, 122, 131
+
+
+def int3s(*triples, level=0):
+    return frame(INT3S, blob(struct.pack(f"<{3 * len(triples)}i", *(v for t in triples for v in t)), 12, level))
+
+
+def uints(*numbers, level=0):
+    return frame(UINTS, u32s(numbers, level))
+
+
+def configured(kind, name, tile_width, data_width):
+    return [("vld_component", string(kind)), ("name", string(name)), ("voxelTileWidth", u32(tile_width)),
+            ("voxelTileDataWidth", u32(data_width)), ("voxelOffsetType", u32(0)), ("voxelInnerLevels", u32(1))]
+
+
+def tiles(name, count, widths, leaves, parents, inners, children):
+    return obj(("count", u32(count)), *configured("voxel_topology", name, *widths), ("leaf_origins", leaves),
+               ("leaf_parents", parents), ("inner_origins", inners), ("inner_children", children))
+
+
+def points(name, widths, leaves, offsets):
+    return frame(362, obj(*configured("point_topology", name, *widths), ("leaf_origins", leaves), ("offsets", offsets)))
+
+
+def container(name, topology, size, level=0):
+    return frame(362, obj(
+        ("indices", uints(level=level)), ("target", string(topology)), ("depends_on", frame(STRINGS, elements())),
+        ("vld_component", string("container")), ("name", string(name)), ("topology", string(topology)),
+        ("voxelSize", frame(8, single(size)))))
+
+
+def channel(name, target, widths, code, data, default, mode=1):
+    return frame(362, obj(
+        ("data", frame(code + 120, data)), ("target", string(target)), ("depends_on", frame(STRINGS, elements())),
+        ("default", frame(code, default)), ("interpolation_mode", frame(360, pack(mode))),
+        *configured("channel", name, *widths), ("container", string(target))))
+
+
+NONE = 0xFFFFFFFF
+SMALL, WIDE = (2, 4), (5, 5)
+
+
+def small_levels(level=0, parents=(0, 0, 1)):
+    """Three leaf tiles in two inner ones, at the origin and at the lower limit."""
+    far, children = -2147483600, [NONE] * 16
+    children[1], children[7], children[8] = 0, 1, 2
+    return [int3s((far, -8, 4), (far + 4, -4, 4), (0, 0, 0), level=level), uints(*parents, level=level),
+            int3s((far, -8, 0), (0, 0, 0), level=level), uints(*children, level=level)]
+
+
+def small_volume(level=0, **options):
+    component = frame(362, tiles("voxel_component", 208, SMALL, *small_levels(level, **options)))
+    distances = blob(struct.pack("<208f", *(i / 4 - 3 for i in range(208))), 4, level)
+    return dict(voxel_component=component,
+                voxel_tile_tree=container("voxel_tile_tree", "voxel_component", 0.5, level),
+                voxel_signed_distance=channel("voxel_signed_distance", "voxel_tile_tree", SMALL, 8, distances,
+                                              single(1.5)))
+
+
+def full_volume(level):
+    children = [NONE] * 125
+    children[31] = 0
+    flags = blob(bytes(i % 3 == 0 for i in range(250)), 1, level)
+    wide = tiles("t", 250, WIDE, int3s((5, 5, 5), level=level), uints(0, level=level), int3s((0, 0, 0), level=level),
+                 uints(*children, level=level))
+    return obj(
+        # A channel may stand in front of what it targets.
+        ("flags", channel("flags", "c", WIDE, 10, flags, pack(True), 0)), *small_volume(level).items(),
+        ("t", frame(362, wide)), ("c", container("c", "t", 2.0, level)),
+        ("points", points("points", WIDE, int3s((-5, 0, 0), (0, 0, 0), (0, 5, 0), level=level),
+                          uints(0, 2, 2, 3, level=level))),
+        ("sizes", channel("sizes", "points", WIDE, 8, f32s([0.5, 1, 2], level), single(0.0), 2)),
+        ("other", frame(362, obj(n=u32(1)))))
+
+
+def valid_volumes():
+    for level in (0, 9):
+        yield f"v6_volume_level{level}", stream([frame(362, full_volume(level))], level=level)
+    # One topology in two geometries; in the second one, its tiles under another name as well.
+    levels = [frame(code, pack(entry)) for code, entry in ((INT3S, 3), (UINTS, 4), (INT3S, 5), (UINTS, 6))]
+    first, again = (frame(362, tiles(name, 208, SMALL, *levels)) for name in ("voxel_component", "again"))
+    reference = frame(362, pack(2))
+    yield "v6_volume_shared", stream(
+        [*small_levels(), first, frame(362, obj(**{**small_volume(), "voxel_component": reference})),
+         frame(362, obj(voxel_component=reference, again=again))],
+        [(5, 1), (6, 1), (4, 0), (0, 0), (1, 0), (2, 0), (3, 0)])
+    # What targets a damaged component is kept plain, too; others are not.
+    yield "v6_volume_damaged", stream(
+        [frame(362, obj(
+            **small_volume(parents=(0, 1, 1)),
+            points=points("points", SMALL, int3s((0, 0, 0), (0, 4, 0)), uints(0, 2, 3)),
+            sizes=channel("sizes", "points", SMALL, 8, f32s([0.5, 1]), single(0.0)),
+            odd=points("odd", SMALL, int3s((0, 0, 1)), uints(0, 2)))),
+         frame(362, obj(vld_component=small_volume()["voxel_component"]))])
+
+
 # --------------------------------------------------------------------------------------- bad streams
 
 
@@ -647,7 +746,7 @@ def main(folder):
     root = pathlib.Path(folder)
     for kind in ("valid", "bad"):
         (root / kind).mkdir(parents=True, exist_ok=True)
-    for name, data in valid():
+    for name, data in (*valid(), *valid_volumes()):
         (root / "valid" / f"{name}.zon").write_bytes(data)
     expected = []
     for name, data, message in bad():

@@ -11,6 +11,7 @@
 #include <veldrin/io/internal/StreamHeader.h>
 #include <veldrin/io/internal/StreamReader.h>
 #include <veldrin/io/internal/StreamWriter.h>
+#include <veldrin/volume/internal/ProxyDescription.h>
 
 #include <cstring>
 #include <fstream>
@@ -54,7 +55,21 @@ namespace {
         }
     }
 
-    bool readObjects(std::streambuf& buffer, std::uint64_t position, std::uint64_t end, Objects& out)
+    /// Once everything is read: a stream that fails is told by its failure alone.
+    void warnOfDamaged(Geometry::Internal::ProxyRebuilder const& proxies, Nexil::RuntimeServices const* services)
+    {
+        if (!services)
+            return;
+        for (Nexil::String const& name : proxies.damaged()) {
+            Nexil::String text = "Volume component '";
+            text += name;
+            text += "' is damaged. It is kept as a plain object.";
+            services->logMessage({Nexil::RuntimeMessageCategory::Warning, text});
+        }
+    }
+
+    bool readObjects(std::streambuf& buffer, std::uint64_t position, std::uint64_t end, Objects& out,
+                     Nexil::RuntimeServices const* services)
     {
         Object header;
         ByteSource headerSource(buffer, position, end, ByteSource::ReadAhead::None);
@@ -63,15 +78,17 @@ namespace {
         if (version == 0)
             return false;
         ByteSource source(buffer, headerSource.position(), end, ByteSource::ReadAhead::Window);
+        Geometry::Internal::ProxyRebuilder proxies;
         Objects objects = version <= 4 ? readSequentialStream(source, header, version)
-                                       : readEntryStream(source, header, version >= kCurrentVersion);
+                                       : readEntryStream(source, header, version >= kCurrentVersion, &proxies);
+        warnOfDamaged(proxies, services);
         out.reserve(out.size() + objects.size());
         for (auto& object : objects)
             out.push_back(std::move(object));
         return true;
     }
 
-    bool readStream(std::istream& stream, Objects& out)
+    bool readStream(std::istream& stream, Objects& out, Nexil::RuntimeServices const* services)
     {
         std::streambuf* const buffer = stream.rdbuf();
         if (!buffer)
@@ -82,12 +99,12 @@ namespace {
         if (end < position || end < 0) {
             std::vector<char> const bytes = readAll(*buffer);
             InputMemoryBuf memory(bytes.data(), bytes.size());
-            return readObjects(memory, 0, bytes.size(), out);
+            return readObjects(memory, 0, bytes.size(), out, services);
         }
         if (buffer->pubseekpos(std::streampos(position), std::ios_base::in) != std::streampos(position))
             throwTruncated();
         bool const isRead =
-            readObjects(*buffer, static_cast<std::uint64_t>(position), static_cast<std::uint64_t>(end), out);
+            readObjects(*buffer, static_cast<std::uint64_t>(position), static_cast<std::uint64_t>(end), out, services);
         buffer->pubseekpos(std::streampos(end), std::ios_base::in);
         return isRead;
     }
@@ -152,13 +169,14 @@ bool serialize(Nexil::Array<Nexil::Ptr<Object>*> const& handles, Nexil::OutputSt
 bool deserialize(Nexil::InputStream& stream, Objects& out, DeserializationOptions const&,
                  Nexil::RuntimeServices const* services)
 {
-    return runReported(services, "Cannot read from stream", [&] { return readStream(stream.standardStream(), out); });
+    return runReported(services, "Cannot read from stream",
+                       [&] { return readStream(stream.standardStream(), out, services); });
 }
 
 bool deserialize(Nexil::String const& path, Objects& out, DeserializationOptions const&,
                  Nexil::RuntimeServices const* services)
 {
-    return withInputFile(path, services, [&](std::istream& file) { return readStream(file, out); });
+    return withInputFile(path, services, [&](std::istream& file) { return readStream(file, out, services); });
 }
 
 bool deserializeHeader(Nexil::InputStream& stream, Object& header, Nexil::RuntimeServices const* services)

@@ -34,10 +34,11 @@ namespace {
 
     class EntryReader final : private V3::References {
     public:
-        EntryReader(ByteSource& source, Object const& header, bool hasHashes)
+        EntryReader(ByteSource& source, Object const& header, bool hasHashes,
+                    Geometry::Internal::ProxyRebuilder* proxies)
             : source_(source), hasHashes_(hasHashes), isCompressed_(headerSigned(header, sCompressionLevel) > 0),
               hasHandles_(headerFlag(header, sStreamHandles)), table_(readEntryTable(source)), entries_(table_.entries),
-              reader_(source), visitor_(reader_, isCompressed_, this)
+              reader_(source), visitor_(reader_, isCompressed_, this, proxies)
         {
             checkRoles();
             layOutItems();
@@ -200,9 +201,10 @@ namespace {
 
 } // namespace
 
-Nexil::Array<Nexil::Ptr<Object>> readEntryStream(ByteSource& source, Object const& header, bool hasHashes)
+Nexil::Array<Nexil::Ptr<Object>> readEntryStream(ByteSource& source, Object const& header, bool hasHashes,
+                                                 Geometry::Internal::ProxyRebuilder* proxies)
 {
-    return EntryReader(source, header, hasHashes).read();
+    return EntryReader(source, header, hasHashes, proxies).read();
 }
 
 } // namespace Veldrin::IO

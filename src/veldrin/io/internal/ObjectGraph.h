@@ -17,7 +17,8 @@ namespace Veldrin::IO {
 /// Entries are the top-level objects, whatever is held more than once, and what lies deeper than kMaxInlineLevels below
 /// an entry. Everything else is written where it is held. Entries are ordered so that each comes behind those that it
 /// refers to.
-/// An object of a class of its own is asked for its properties once, as it may make them up anew each time.
+/// An object of a class of its own is asked for its properties once, as it may make them up anew each time; a proxy of a
+/// volume is written as its description.
 /// Cost: linear in the pointers held. Needs no stack for deep chains.
 class ObjectGraph {
 public:
@@ -39,7 +40,7 @@ public:
     /// True, and its number in `entry`, when the value at the address is an entry.
     [[nodiscard]] bool findEntry(void const* address, std::uint64_t& entry) const;
 
-    /// What is written for an object: the object itself, or the properties that its own class answered.
+    /// What is written for an object: the object itself, or what its own class answered.
     [[nodiscard]] Object const& contentOf(Object const& object) const;
 
 private:

@@ -38,7 +38,7 @@ namespace {
             return std::make_unique<V1::UnpackVisitor>(reader);
         if (version == 2)
             return std::make_unique<V2::UnpackVisitor>(reader);
-        return std::make_unique<V3::UnpackVisitor>(reader, true, references);
+        return std::make_unique<V3::UnpackVisitor>(reader, true, references, nullptr);
     }
 
 } // namespace

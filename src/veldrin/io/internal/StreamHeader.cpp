@@ -88,7 +88,7 @@ void readHeader(ByteSource& source, Object& header)
     if (item.type != msgpack::type::ARRAY)
         throw Nexil::String("bad header");
     Object unpacked;
-    V3::UnpackVisitor(reader, true, nullptr).unpackObject(item, unpacked);
+    V3::UnpackVisitor(reader, true, nullptr, nullptr).unpackObject(item, unpacked);
     if (headerUnsigned(unpacked, sStreamIdentifier) != kStreamIdentifier)
         throw Nexil::String("Incorrect zon stream identifier");
     for (Nexil::String const& key : unpacked.keys())

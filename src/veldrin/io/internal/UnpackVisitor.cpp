@@ -111,6 +111,7 @@ namespace V1 {
     {
         if (node.type != msgpack::type::ARRAY || node.via.array.size % 2 != 0)
             throwMalformed();
+        bool hasDescriptions = false;
         auto const* const end = node.via.array.ptr + node.via.array.size;
         for (auto const* pair = node.via.array.ptr; pair != end; pair += 2) {
             Nexil::String const name = unpackString(pair[0]);
@@ -122,10 +123,16 @@ namespace V1 {
                     throw Nexil::String("Unknown property: ") + name;
                 value = unpackPayload(code, *payload);
             }
+            if (auto const* const held = value.get<ObjectPtr>(); held && *held)
+                hasDescriptions = hasDescriptions || Geometry::Internal::isProxyDescription(**held);
             // Refuses an empty name: such a property is dropped.
             object.setPropertyAny(name, std::move(value));
         }
+        if (hasDescriptions)
+            rebuildProxies(object);
     }
+
+    void UnpackVisitor::rebuildProxies(Object&) {}
 
     Nexil::Ptr<Object> UnpackVisitor::unpackObjectPointer(msgpack::object const& node)
     {
@@ -268,6 +275,12 @@ namespace V2 {
 } // namespace V2
 
 namespace V3 {
+
+    void UnpackVisitor::rebuildProxies(Object& geometry)
+    {
+        if (proxies_)
+            proxies_->rebuild(geometry);
+    }
 
     namespace {
 

@@ -5,6 +5,7 @@
 #include <veldrin/io/internal/ChunkReader.h>
 #include <veldrin/io/internal/ItemReader.h>
 #include <veldrin/object/Object.h>
+#include <veldrin/volume/internal/ProxyDescription.h>
 
 #include <cstdint>
 
@@ -37,6 +38,8 @@ namespace V1 {
         [[nodiscard]] static unsigned int unpackFrame(msgpack::object const& frame, msgpack::object const*& payload);
 
     protected:
+        /// Called with an object that was read and holds descriptions of volume proxies.
+        virtual void rebuildProxies(Object& geometry);
         /// Reads a pointer of type `code`: inline, and from version 2 on perhaps null or a reference.
         [[nodiscard]] virtual Nexil::Any unpackPointer(unsigned int code, msgpack::object const& payload);
         [[nodiscard]] virtual Nexil::Any unpackTrivialArray(ValueRow const& row, msgpack::object const& payload);
@@ -89,14 +92,18 @@ namespace V3 {
     class UnpackVisitor : public V2::UnpackVisitor {
     public:
         /// references: null for a stream without them; outlives the visitor.
-        UnpackVisitor(ItemReader& item, bool hasCompressedChunks, References* references)
-            : V2::UnpackVisitor(item), references_(references), hasCompressedChunks_(hasCompressedChunks)
+        /// proxies: rebuilds those of volumes; null for a stream that has none; outlives the visitor.
+        UnpackVisitor(ItemReader& item, bool hasCompressedChunks, References* references,
+                      Geometry::Internal::ProxyRebuilder* proxies)
+            : V2::UnpackVisitor(item), references_(references), proxies_(proxies),
+              hasCompressedChunks_(hasCompressedChunks)
         {
         }
 
         [[nodiscard]] Nexil::Ptr<Object> unpackObjectPointer(msgpack::object const& node) override;
 
     protected:
+        void rebuildProxies(Object& geometry) override;
         [[nodiscard]] Nexil::Any unpackPointer(unsigned int code, msgpack::object const& payload) override;
         [[nodiscard]] Nexil::Any unpackTrivialArray(ValueRow const& row, msgpack::object const& payload) override;
         [[nodiscard]] msgpack::object const& elementList(msgpack::object const& payload) override;
@@ -104,6 +111,7 @@ namespace V3 {
 
     private:
         References* references_;
+        Geometry::Internal::ProxyRebuilder* proxies_;
         bool hasCompressedChunks_;
     };
 

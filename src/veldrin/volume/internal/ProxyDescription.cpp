@@ -1,0 +1,371 @@
+#include <veldrin/volume/internal/ProxyDescription.h>
+
+#include <veldrin/geometry/DataInterpolationMode.h>
+#include <veldrin/geometry/Names.h>
+#include <veldrin/geometry/internal/ValueTypes.h>
+#include <veldrin/object/Properties.h>
+#include <veldrin/volume/VldProxyComponentChannel.h>
+#include <veldrin/volume/VldProxyComponentContainer.h>
+#include <veldrin/volume/VldProxyComponentTopology.h>
+#include <veldrin/volume/VolumeInterpolation.h>
+#include <veldrin/volume/internal/Configurations.h>
+#include <vld/Container.h>
+#include <vld/PointTopology.h>
+
+#include <cmath>
+#include <map>
+#include <type_traits>
+
+namespace Veldrin::Geometry::Internal {
+
+namespace {
+
+    using ObjectPtr = Nexil::Ptr<Object>;
+    using ComponentPtr = Nexil::Ptr<VLD::Component>;
+    template <class T>
+    using ArrayPtr = Nexil::Ptr<Nexil::Array<T>>;
+    using namespace VLD::TileTree3D;
+
+    // These texts are in files.
+    constexpr char kKind[] = "vld_component";
+    constexpr char kName[] = "name";
+    constexpr char kTileWidth[] = "voxelTileWidth";
+    constexpr char kTileDataWidth[] = "voxelTileDataWidth";
+    constexpr char kOffsetType[] = "voxelOffsetType";
+    constexpr char kInnerLevels[] = "voxelInnerLevels";
+    constexpr char kLeafOrigins[] = "leaf_origins";
+    constexpr char kLeafParents[] = "leaf_parents";
+    constexpr char kInnerOrigins[] = "inner_origins";
+    constexpr char kInnerChildren[] = "inner_children";
+    constexpr char kOffsets[] = "offsets";
+    constexpr char kTopology[] = "topology";
+    constexpr char kVoxelSize[] = "voxelSize";
+    constexpr char kContainer[] = "container";
+
+    constexpr char kVoxelTopologyKind[] = "voxel_topology";
+    constexpr char kPointTopologyKind[] = "point_topology";
+    constexpr char kContainerKind[] = "container";
+    constexpr char kChannelKind[] = "channel";
+
+    void setKind(Object& description, char const* kind, VLD::Component const& component)
+    {
+        setProperty(description, kKind, kind);
+        setProperty(description, kName, component.name());
+    }
+
+    void setParameters(Object& description, TileParameters const& parameters)
+    {
+        setProperty(description, kTileWidth, parameters.tileWidth);
+        setProperty(description, kTileDataWidth, parameters.dataWidth);
+        setProperty(description, kOffsetType, parameters.offsetType);
+        setProperty(description, kInnerLevels, parameters.innerLevels);
+    }
+
+    TileParameters parametersOf(Object const& description)
+    {
+        return {getPropertyAs<unsigned int>(description, kTileWidth),
+                getPropertyAs<unsigned int>(description, kTileDataWidth),
+                getPropertyAs<unsigned int>(description, kOffsetType),
+                getPropertyAs<unsigned int>(description, kInnerLevels)};
+    }
+
+    bool describeTopology(VldProxyComponentTopology const& proxy, Object& description)
+    {
+        auto const component = proxy.getVldComponent();
+        bool isDescribed = false;
+        forEachConfiguration([&]<class Traits>() {
+            if (auto const voxels = Nexil::dynamicPtrCast<VoxelTopology<Traits>>(component)) {
+                description.setPropertyAny(sCount, proxy.getProperty(sCount));
+                setKind(description, kVoxelTopologyKind, *voxels);
+                setParameters(description, Traits::parameters());
+                setProperty(description, kLeafOrigins, voxels->levels().leafOrigins);
+                setProperty(description, kLeafParents, voxels->levels().leafParents);
+                setProperty(description, kInnerOrigins, voxels->levels().innerOrigins);
+                setProperty(description, kInnerChildren, voxels->levels().innerChildren);
+                isDescribed = true;
+            } else if (auto const points = Nexil::dynamicPtrCast<PointTopology<Traits>>(component)) {
+                setKind(description, kPointTopologyKind, *points);
+                setParameters(description, Traits::parameters());
+                setProperty(description, kLeafOrigins, points->sharedLeafOrigins());
+                setProperty(description, kOffsets, points->sharedOffsets());
+                isDescribed = true;
+            }
+        });
+        return isDescribed;
+    }
+
+    bool describeContainer(VldProxyComponentContainer const& proxy, Object& description)
+    {
+        bool isDescribed = false;
+        forEachConfiguration([&]<class Traits>() {
+            auto const container = Nexil::dynamicPtrCast<Container<Traits>>(proxy.getVldComponent());
+            if (!container)
+                return;
+            setProperty(description, sIndices, Nexil::makePtr<Nexil::Array<unsigned int>>());
+            description.setPropertyAny(sTarget, proxy.getProperty(sTarget));
+            description.setPropertyAny(sDependsOn, proxy.getProperty(sDependsOn));
+            setKind(description, kContainerKind, *container);
+            setProperty(description, kTopology, container->topologyName());
+            setProperty(description, kVoxelSize, container->voxelSize());
+            isDescribed = true;
+        });
+        return isDescribed;
+    }
+
+    bool describeChannel(VldProxyComponentChannel const& proxy, Object& description)
+    {
+        auto const channel = proxy.getVldComponent();
+        if (!channel)
+            return false;
+        for (Nexil::String const& key : proxy.keys())
+            description.setPropertyAny(key, proxy.getProperty(key));
+        setKind(description, kChannelKind, *channel);
+        setParameters(description, channel->tileParameters());
+        setProperty(description, kContainer, channel->containerName());
+        return true;
+    }
+
+} // namespace
+
+bool describeProxy(Object const& proxy, Object& description)
+{
+    if (auto const* const topology = dynamic_cast<VldProxyComponentTopology const*>(&proxy))
+        return describeTopology(*topology, description);
+    if (auto const* const container = dynamic_cast<VldProxyComponentContainer const*>(&proxy))
+        return describeContainer(*container, description);
+    auto const* const channel = dynamic_cast<VldProxyComponentChannel const*>(&proxy);
+    return channel && describeChannel(*channel, description);
+}
+
+bool isProxyDescription(Object const& object)
+{
+    return object.hasProperty(kKind);
+}
+
+/// The descriptions of one geometry.
+class ProxyRebuilder::Pass {
+public:
+    Pass(ProxyRebuilder& rebuilder, Object& geometry) : rebuilder_(rebuilder), geometry_(geometry) {}
+
+    void run()
+    {
+        // What is targeted comes before what targets it.
+        std::vector<Described> topologies, containers, channels;
+        for (Nexil::String const& key : geometry_.keys()) {
+            auto description = getPropertyAs<ObjectPtr>(geometry_, key);
+            if (!description || !isProxyDescription(*description))
+                continue;
+            auto const kind = getPropertyAs<Nexil::String>(*description, kKind);
+            auto& list = kind == kContainerKind ? containers : kind == kChannelKind ? channels : topologies;
+            list.push_back({key, std::move(description), kind});
+        }
+        for (Described const& described : topologies)
+            replace<VldProxyComponentTopology>(described, nullptr, [&] {
+                return described.kind == kVoxelTopologyKind   ? makeVoxelTopology(*described.description)
+                       : described.kind == kPointTopologyKind ? makePointTopology(*described.description)
+                                                              : nullptr;
+            });
+        for (Described const& described : containers) {
+            auto const target = targetOf(*described.description);
+            replace<VldProxyComponentContainer>(described, target,
+                                                [&] { return makeContainer(*described.description, target); });
+        }
+        for (Described const& described : channels) {
+            auto const target = targetOf(*described.description);
+            replace<VldProxyComponentChannel>(described, target,
+                                              [&] { return makeChannel(*described.description, target); });
+        }
+    }
+
+private:
+    struct Described {
+        Nexil::String key;
+        ObjectPtr description;
+        Nexil::String kind;
+    };
+
+    [[nodiscard]] ComponentPtr targetOf(Object const& description) const
+    {
+        auto const place = components_.find(getPropertyAs<Nexil::String>(description, sTarget));
+        return place == components_.end() ? nullptr : place->second;
+    }
+
+    /// Puts a proxy of the component that make() gives in the place of its description.
+    template <class Proxy, class Make>
+    void replace(Described const& described, ComponentPtr const& target, Make const& make)
+    {
+        Rebuilt& rebuilt = rebuilder_.rebuilt_[described.description.get()];
+        if (!rebuilt.proxy || !(rebuilt.target == target)) {
+            auto component = make();
+            if (!component) {
+                rebuilder_.damaged_.push_back(described.key);
+                return;
+            }
+            rebuilt = {described.description, target, proxyOf<Proxy>(std::move(component), *described.description)};
+        }
+        components_[described.key] = componentOf<Proxy>(rebuilt.proxy);
+        geometry_.setPropertyAny(described.key, rebuilt.proxy);
+    }
+
+    template <class Proxy, class Component>
+    static ObjectPtr proxyOf(Component component, Object const& description)
+    {
+        if constexpr (std::is_same_v<Proxy, VldProxyComponentTopology>)
+            return Nexil::makePtr<Proxy>(std::move(component));
+        else
+            return Nexil::makePtr<Proxy>(std::move(component), getPropertyAs<Nexil::String>(description, sTarget));
+    }
+
+    template <class Proxy>
+    static ComponentPtr componentOf(ObjectPtr const& proxy)
+    {
+        return static_cast<Proxy const&>(*proxy).getVldComponent();
+    }
+
+    /// What make() gives for arrays of tiles. Arrays that were looked at before are not again: they make what they made, and
+    /// together with others nothing.
+    template <class Make, class... T>
+    ComponentPtr topologyOf(Make const& make, ArrayPtr<T> const&... arrays)
+    {
+        if (!(arrays && ...))
+            return nullptr;
+        std::vector<void const*> const addresses{arrays.get()...};
+        bool const isEmpty[] = {arrays->empty()...};
+        bool isKnown = false;
+        std::size_t known = 0;
+        for (std::size_t i = 0; i < addresses.size(); ++i) {
+            auto const place = rebuilder_.tilesOfArray_.find(addresses[i]);
+            if (isEmpty[i] || place == rebuilder_.tilesOfArray_.end())
+                continue;
+            isKnown = true;
+            known = place->second;
+        }
+        if (isKnown)
+            return rebuilder_.tiles_[known].addresses == addresses ? rebuilder_.tiles_[known].topology : nullptr;
+        for (std::size_t i = 0; i < addresses.size(); ++i)
+            if (!isEmpty[i])
+                rebuilder_.tilesOfArray_.emplace(addresses[i], rebuilder_.tiles_.size());
+        rebuilder_.tiles_.push_back({addresses, {Nexil::Any(arrays)...}, nullptr});
+        rebuilder_.tiles_.back().topology = make();
+        return rebuilder_.tiles_.back().topology;
+    }
+
+    ComponentPtr makeVoxelTopology(Object const& description)
+    {
+        auto const name = getPropertyAs<Nexil::String>(description, kName);
+        SharedTileLevels const levels{getPropertyAs<ArrayPtr<Coordinate>>(description, kLeafOrigins),
+                                      getPropertyAs<ArrayPtr<unsigned int>>(description, kLeafParents),
+                                      getPropertyAs<ArrayPtr<Coordinate>>(description, kInnerOrigins),
+                                      getPropertyAs<ArrayPtr<unsigned int>>(description, kInnerChildren)};
+        ComponentPtr made;
+        forEachConfiguration([&]<class Traits>() {
+            if (parametersOf(description) != Traits::parameters() || name.empty())
+                return;
+            auto const topology = Nexil::dynamicPtrCast<VoxelTopology<Traits>>(
+                topologyOf([&]() -> ComponentPtr { return VoxelTopology<Traits>::create(name, levels); },
+                           levels.leafOrigins, levels.leafParents, levels.innerOrigins, levels.innerChildren));
+            auto const count = description.getProperty(sCount);
+            auto const* const heldCount = count.get<unsigned int>();
+            if (topology && heldCount && *heldCount == topology->elementCount())
+                made = underName(topology, name);
+        });
+        return made;
+    }
+
+    ComponentPtr makePointTopology(Object const& description)
+    {
+        auto const name = getPropertyAs<Nexil::String>(description, kName);
+        auto const origins = getPropertyAs<ArrayPtr<Coordinate>>(description, kLeafOrigins);
+        auto const offsets = getPropertyAs<ArrayPtr<unsigned int>>(description, kOffsets);
+        ComponentPtr made;
+        forEachConfiguration([&]<class Traits>() {
+            if (parametersOf(description) != Traits::parameters() || name.empty())
+                return;
+            auto const topology = Nexil::dynamicPtrCast<PointTopology<Traits>>(
+                topologyOf([&]() -> ComponentPtr { return PointTopology<Traits>::create(name, origins, offsets); },
+                           origins, offsets));
+            if (topology)
+                made = underName(topology, name);
+        });
+        return made;
+    }
+
+    /// The topology itself, or its tiles under another name.
+    template <class Topology>
+    static ComponentPtr underName(Nexil::Ptr<Topology> const& topology, Nexil::String const& name)
+    {
+        if (topology->name() == name)
+            return topology;
+        return Nexil::makePtr<Topology>(name, *topology);
+    }
+
+    static ComponentPtr makeContainer(Object const& description, ComponentPtr const& target)
+    {
+        auto const name = getPropertyAs<Nexil::String>(description, kName);
+        float const voxelSize = getPropertyAs<float>(description, kVoxelSize);
+        if (name.empty() || !std::isfinite(voxelSize) || !(voxelSize > 0) ||
+            !description.getProperty(kTopology).holds<Nexil::String>())
+            return nullptr;
+        ComponentPtr made;
+        forEachConfiguration([&]<class Traits>() {
+            auto topology = Nexil::dynamicPtrCast<VoxelTopology<Traits>>(target);
+            if (!topology)
+                return;
+            auto container = Nexil::makeMutable<Container<Traits>>(name, std::move(topology), voxelSize);
+            container->setTopologyName(getPropertyAs<Nexil::String>(description, kTopology));
+            made = std::move(container);
+        });
+        return made;
+    }
+
+    static Nexil::Ptr<ChannelBase> makeChannel(Object const& description, ComponentPtr const& target)
+    {
+        Nexil::Ptr<ChannelBase> made;
+        forEachConfiguration([&]<class Traits>() {
+            if (parametersOf(description) != Traits::parameters())
+                return;
+            if (auto const container = Nexil::dynamicPtrCast<Container<Traits>>(target))
+                made = makeChannelOf<Traits>(description, container->elementCount());
+            else if (auto const points = Nexil::dynamicPtrCast<PointTopology<Traits>>(target))
+                made = makeChannelOf<Traits>(description, points->elementCount());
+        });
+        return made;
+    }
+
+    template <class Traits>
+    static Nexil::Ptr<ChannelBase> makeChannelOf(Object const& description, std::uint64_t elementCount)
+    {
+        auto const name = getPropertyAs<Nexil::String>(description, kName);
+        auto const container = description.getProperty(kContainer);
+        auto const* const containerName = container.get<Nexil::String>();
+        auto const mode = description.getProperty(sInterp);
+        auto const data = description.getProperty(sData);
+        auto const defaultValue = description.getProperty(sDefault);
+        auto const* const heldMode = mode.get<Common::DataInterpolationMode>();
+        if (name.empty() || !containerName || !heldMode || Nexil::AnyArray::get_any_array_size(data) != elementCount)
+            return nullptr;
+        Nexil::Ptr<ChannelBase> made;
+        forEachValueType([&]<class T>(unsigned int, char const*) {
+            if constexpr (std::is_trivially_copyable_v<T>) {
+                auto const* const values = data.get<ArrayPtr<T>>();
+                auto const* const held = defaultValue.get<T>();
+                if (values && *values && held)
+                    made = Nexil::makePtr<Channel<Traits>>(name, *containerName, *values, *held,
+                                                           to_vld_volume_interp(*heldMode));
+            }
+        });
+        return made;
+    }
+
+    ProxyRebuilder& rebuilder_;
+    Object& geometry_;
+    // What stands under each key now, for what targets it.
+    std::map<Nexil::String, ComponentPtr> components_;
+};
+
+void ProxyRebuilder::rebuild(Object& geometry)
+{
+    Pass(*this, geometry).run();
+}
+
+} // namespace Veldrin::Geometry::Internal
