@@ -1,0 +1,235 @@
+#include <vld/Spheres.h>
+
+#include <veldrin/volume/VolumeBounds.h>
+#include <vld/Accessor.h>
+#include <vld/BuildFromValues.h>
+
+#include <openvdb/openvdb.h>
+#include <openvdb/tools/LevelSetSphere.h>
+
+#include <benchmark/benchmark.h>
+
+#include <tbb/global_control.h>
+
+// A level set of a sphere of radius 125 with three voxels of band to each side: made, measured, visited and read, by our tile
+// trees and by the peer's trees, each on 1 and 2 threads where it is parallel. `held` is the number of voxels a side keeps
+// values of: the peer's active ones, all of ours in leaf tiles.
+namespace {
+
+using namespace VLD::TileTree3D;
+
+constexpr int kRadius = 125;
+
+struct ThreadLimit : tbb::global_control {
+    explicit ThreadLimit(benchmark::State const& state)
+        : tbb::global_control(max_allowed_parallelism, static_cast<std::size_t>(state.range(0)))
+    {
+    }
+};
+
+void perVoxel(benchmark::State& state, double voxelCount)
+{
+    state.counters["held"] = voxelCount;
+    state.counters["perVoxel"] =
+        benchmark::Counter(voxelCount, benchmark::Counter::kIsIterationInvariantRate | benchmark::Counter::kInvert);
+}
+
+template <class Traits>
+double heldVoxels(Grid<Traits> const& grid)
+{
+    return static_cast<double>(grid.topology->voxelCount());
+}
+
+openvdb::FloatGrid::Ptr peerSphere()
+{
+    return openvdb::tools::createLevelSetSphere<openvdb::FloatGrid>(float(kRadius), openvdb::Vec3f(0), 1, bench::kBand);
+}
+
+template <class Traits>
+void buildOurs(benchmark::State& state)
+{
+    ThreadLimit const limit(state);
+    Grid<Traits> grid;
+    for (auto _ : state)
+        grid = bench::sphere<Traits>(kRadius);
+    perVoxel(state, heldVoxels(grid));
+    state.counters["MB"] = static_cast<double>(grid.topology->byteSize() + grid.channel->elementCount() * 4) / 1e6;
+}
+
+void buildPeer(benchmark::State& state)
+{
+    ThreadLimit const limit(state);
+    openvdb::FloatGrid::Ptr grid;
+    for (auto _ : state)
+        grid = peerSphere();
+    perVoxel(state, static_cast<double>(grid->activeVoxelCount()));
+    state.counters["MB"] = static_cast<double>(grid->memUsage()) / 1e6;
+}
+
+template <class Traits>
+void buildFromListOurs(benchmark::State& state)
+{
+    ThreadLimit const limit(state);
+    bench::BandVoxels list(bench::sphere<Traits>(kRadius));
+    if (state.range(1) != 0)
+        list.shuffle();
+    for (auto _ : state)
+        benchmark::DoNotOptimize(buildFromVoxels<Traits>({.channelName = "c"}, list.voxels, list.values, bench::kBand));
+    perVoxel(state, static_cast<double>(list.voxels.size()));
+}
+
+void buildFromListPeer(benchmark::State& state)
+{
+    ThreadLimit const limit(state);
+    bench::BandVoxels list(bench::sphere<SmallTiles>(kRadius));
+    if (state.range(1) != 0)
+        list.shuffle();
+    for (auto _ : state) {
+        auto grid = openvdb::FloatGrid::create(bench::kBand);
+        auto accessor = grid->getAccessor();
+        for (std::uint64_t i = 0; i < list.voxels.size(); ++i) {
+            Coordinate const& c = list.voxels[i];
+            accessor.setValue(openvdb::Coord(c.x, c.y, c.z), list.values[i]);
+        }
+        benchmark::DoNotOptimize(grid.get());
+    }
+    perVoxel(state, static_cast<double>(list.voxels.size()));
+}
+
+template <class Traits>
+void boundsOurs(benchmark::State& state)
+{
+    ThreadLimit const limit(state);
+    auto const grid = bench::sphere<Traits>(kRadius);
+    auto volume = VLD::createObject();
+    grid.addTo(*volume);
+    for (auto _ : state) {
+        Veldrin::Math::bbox<Veldrin::Math::float3, float> box;
+        Veldrin::GeometryAlgorithms::volumeBounds(*volume, *grid.container, *grid.topology, box);
+        benchmark::DoNotOptimize(box);
+    }
+    perVoxel(state, heldVoxels(grid));
+}
+
+/// Of the active voxels, whatever their values: the question that the peer answers without reading any.
+void boundsPeer(benchmark::State& state)
+{
+    ThreadLimit const limit(state);
+    auto const grid = peerSphere();
+    for (auto _ : state)
+        benchmark::DoNotOptimize(grid->evalActiveVoxelBoundingBox());
+    perVoxel(state, static_cast<double>(grid->activeVoxelCount()));
+}
+
+/// Every value within the band, with its coordinates.
+template <class Traits>
+void visitOurs(benchmark::State& state)
+{
+    auto const grid = bench::sphere<Traits>(kRadius);
+    auto const values = grid.channel->template values<float>();
+    for (auto _ : state) {
+        double sum = 0;
+        std::int64_t places = 0;
+        for (unsigned int leaf = 0; leaf < grid.topology->leafCount(); ++leaf) {
+            float const* const tile = values->data() + std::uint64_t(leaf) * Traits::kLeafVoxels;
+            Coordinate const origin = grid.topology->leafOrigins()[leaf];
+            for (unsigned int place = 0; place < Traits::kLeafVoxels; ++place)
+                if (tile[place] > -bench::kBand && tile[place] < bench::kBand) {
+                    Coordinate const voxel = origin + cellAtPlace<Traits::kDataWidth>(place);
+                    sum += tile[place];
+                    places += voxel.x + voxel.y + voxel.z;
+                }
+        }
+        benchmark::DoNotOptimize(sum);
+        benchmark::DoNotOptimize(places);
+    }
+    perVoxel(state, heldVoxels(grid));
+}
+
+void visitPeer(benchmark::State& state)
+{
+    auto const grid = peerSphere();
+    for (auto _ : state) {
+        double sum = 0;
+        std::int64_t places = 0;
+        for (auto value = grid->cbeginValueOn(); value; ++value) {
+            openvdb::Coord const voxel = value.getCoord();
+            sum += *value;
+            places += voxel.x() + voxel.y() + voxel.z();
+        }
+        benchmark::DoNotOptimize(sum);
+        benchmark::DoNotOptimize(places);
+    }
+    perVoxel(state, static_cast<double>(grid->activeVoxelCount()));
+}
+
+constexpr std::uint64_t kReads = 1 << 16;
+
+template <class Traits>
+void readOurs(benchmark::State& state)
+{
+    auto const grid = bench::sphere<Traits>(kRadius);
+    auto const voxels = bench::voxelsInShell(kRadius, kReads);
+    Accessor<Traits, float> value(*grid.topology, *grid.channel);
+    std::uint64_t i = 0;
+    for (auto _ : state)
+        benchmark::DoNotOptimize(value(voxels[i++ % kReads]));
+}
+
+void readPeer(benchmark::State& state)
+{
+    auto const grid = peerSphere();
+    auto const voxels = bench::voxelsInShell(kRadius, kReads);
+    auto accessor = grid->getConstAccessor();
+    std::uint64_t i = 0;
+    for (auto _ : state) {
+        Coordinate const& c = voxels[i++ % kReads];
+        benchmark::DoNotOptimize(accessor.getValue(openvdb::Coord(c.x, c.y, c.z)));
+    }
+}
+
+/// Both sides hold the same distances, or nothing here compares anything.
+bool isSameSphere()
+{
+    auto const ours = bench::sphere<SmallTiles>(kRadius);
+    auto const peer = peerSphere();
+    auto accessor = peer->getConstAccessor();
+    Accessor<SmallTiles, float> value(*ours.topology, *ours.channel);
+    for (Coordinate const& c : bench::voxelsInShell(kRadius, 1000)) {
+        // The peer's values lie at integer positions, ours at centres of voxels: half a voxel apart along each axis.
+        if (std::abs(value(c) - accessor.getValue(openvdb::Coord(c.x, c.y, c.z))) > 0.9f)
+            return false;
+    }
+    return true;
+}
+
+#define VELDRIN_SIDES(name)                                                                        \
+    BENCHMARK(name##Peer)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime();                      \
+    BENCHMARK_TEMPLATE(name##Ours, SmallTiles)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime(); \
+    BENCHMARK_TEMPLATE(name##Ours, WideTiles)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime()
+
+VELDRIN_SIDES(build);
+BENCHMARK(buildFromListPeer)->ArgNames({"threads", "shuffled"})->ArgsProduct({{1}, {0, 1}})->UseRealTime();
+BENCHMARK_TEMPLATE(buildFromListOurs, SmallTiles)
+    ->ArgNames({"threads", "shuffled"})
+    ->ArgsProduct({{1, 2}, {0, 1}})
+    ->UseRealTime();
+VELDRIN_SIDES(bounds);
+BENCHMARK(visitPeer);
+BENCHMARK_TEMPLATE(visitOurs, SmallTiles);
+BENCHMARK_TEMPLATE(visitOurs, WideTiles);
+BENCHMARK(readPeer);
+BENCHMARK_TEMPLATE(readOurs, SmallTiles);
+BENCHMARK_TEMPLATE(readOurs, WideTiles);
+
+} // namespace
+
+int main(int argumentCount, char** arguments)
+{
+    openvdb::initialize();
+    if (!isSameSphere())
+        return 1;
+    benchmark::Initialize(&argumentCount, arguments);
+    benchmark::RunSpecifiedBenchmarks();
+    return 0;
+}
