@@ -28,13 +28,6 @@ namespace {
         [[nodiscard]] std::uint64_t size() const noexcept { return mask_->size(); }
         [[nodiscard]] bool* flags() noexcept { return mask_->data(); }
 
-        /// Several threads may set one flag at once.
-        void set(std::uint64_t index) noexcept
-        {
-            if (index < mask_->size())
-                std::atomic_ref<bool>(mask_->data()[index]).store(true, std::memory_order_relaxed);
-        }
-
         MaskPtr finish(bool isConverted)
         {
             if (success_)
@@ -47,13 +40,31 @@ namespace {
         bool* success_;
     };
 
+    /// Sets flags of a destination, also from several threads at once; indices beyond it are dropped.
+    class Marker {
+    public:
+        explicit Marker(Destination& destination) : flags_(destination.flags()), size_(destination.size()) {}
+
+        void operator()(std::uint64_t index) const noexcept
+        {
+            if (index < size_)
+                std::atomic_ref<bool>(flags_[index]).store(true, std::memory_order_relaxed);
+        }
+
+    private:
+        bool* flags_;
+        std::uint64_t size_;
+    };
+
     /// Calls body(i) for every i below `count`.
     template <class Body>
     void forEach(std::uint64_t count, Body const& body)
     {
         Nexil::parallel::forRange(count, grain::kElements, [&](std::size_t begin, std::size_t end) {
+            // A copy: after each atomic store, what is read through a reference is read again.
+            Body const own = body;
             for (std::size_t i = begin; i < end; ++i)
-                body(i);
+                own(i);
         });
     }
 
@@ -99,7 +110,7 @@ namespace {
     template <class Visit>
     void scatter(OffsetRanges const& ranges, Source const& source, Visit const& visit)
     {
-        forEach(std::min(ranges.count(), source.size()), [&](std::uint64_t i) {
+        forEach(std::min(ranges.count(), source.size()), [=](std::uint64_t i) {
             if (!source[i])
                 return;
             IndexRange const range = ranges[i];
@@ -131,8 +142,7 @@ namespace {
         auto const offsets = dataOf<unsigned int>(geometry, offsetName);
         if (!offsets)
             return destination.finish(false);
-        scatter(OffsetRanges(*offsets, destination.size()), Source(geometry, sourceName, mask),
-                [&](std::uint64_t i) { destination.set(i); });
+        scatter(OffsetRanges(*offsets, destination.size()), Source(geometry, sourceName, mask), Marker(destination));
         return destination.finish(true);
     }
 
@@ -180,10 +190,11 @@ MaskPtr faceVerticesToPoints(Object const& geometry, Mask const& mask, bool* suc
     if (!corners)
         return destination.finish(false);
     Source const source(geometry, sFaceVertexComp, mask);
-    forEach(std::min(corners->size(), source.size()), [&, points = corners->data()](std::uint64_t i) {
-        if (source[i])
-            destination.set(points[i]);
-    });
+    forEach(std::min(corners->size(), source.size()),
+            [source, points = corners->data(), mark = Marker(destination)](std::uint64_t i) {
+                if (source[i])
+                    mark(points[i]);
+            });
     return destination.finish(true);
 }
 
@@ -205,7 +216,7 @@ MaskPtr facesToPoints(Object const& geometry, Mask const& mask, bool* success)
     if (!offsets || !corners)
         return destination.finish(false);
     scatter(OffsetRanges(*offsets, corners->size()), Source(geometry, sFaceComp, mask),
-            [&, points = corners->data()](std::uint64_t i) { destination.set(points[i]); });
+            [points = corners->data(), mark = Marker(destination)](std::uint64_t i) { mark(points[i]); });
     return destination.finish(true);
 }
 
