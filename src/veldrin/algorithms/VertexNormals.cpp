@@ -8,6 +8,7 @@
 #include <veldrin/algorithms/internal/PointOwners.h>
 
 #include <algorithm>
+#include <array>
 
 namespace Veldrin::GeometryAlgorithms {
 
@@ -28,6 +29,23 @@ namespace {
         sum.x += value.x;
         sum.y += value.y;
         sum.z += value.z;
+    }
+
+    /// Scales each sum to length 1, a block at a time.
+    void normalize(Math::float3* sums, std::size_t count) noexcept
+    {
+        std::array<float, kBlockSize> x, y, z;
+        for (std::size_t begin = 0; begin < count; begin += kBlockSize) {
+            std::size_t const size = std::min(kBlockSize, count - begin);
+            for (std::size_t i = 0; i < size; ++i) {
+                x[i] = sums[begin + i].x;
+                y[i] = sums[begin + i].y;
+                z[i] = sums[begin + i].z;
+            }
+            unitsOrFallback(x.data(), y.data(), z.data(), size);
+            for (std::size_t i = 0; i < size; ++i)
+                sums[begin + i] = {x[i], y[i], z[i]};
+        }
     }
 
     /// What faces add to the normals of their points, a block of faces at a time.
@@ -241,10 +259,8 @@ void computeMeshVertexNormals(Object const& mesh, bool angleWeighted, bool areaW
         sumNormals<false, true>(faces, positions, sums);
     else
         sumNormals<false, false>(faces, positions, sums);
-    Nexil::parallel::forRange(faces.pointCount(), grain::kPoints, [&](std::size_t begin, std::size_t end) {
-        for (std::size_t p = begin; p < end; ++p)
-            sums[p] = unitOrFallback(sums[p]);
-    });
+    Nexil::parallel::forRange(faces.pointCount(), grain::kPoints,
+                              [&](std::size_t begin, std::size_t end) { normalize(sums + begin, end - begin); });
     output.commit();
 }
 

@@ -14,6 +14,61 @@ namespace {
 
 } // namespace
 
+template <unsigned int N>
+void fanVectors(CornerBlock<N> const& corners, float* __restrict x, float* __restrict y, float* __restrict z) noexcept
+{
+    for (std::size_t i = 0; i < kBlockSize; ++i) {
+        float const originX = corners.x[0][i];
+        float const originY = corners.y[0][i];
+        float const originZ = corners.z[0][i];
+        float previousX = corners.x[1][i] - originX;
+        float previousY = corners.y[1][i] - originY;
+        float previousZ = corners.z[1][i] - originZ;
+        float sumX = 0;
+        float sumY = 0;
+        float sumZ = 0;
+        for (unsigned int k = 2; k < N; ++k) {
+            float const nextX = corners.x[k][i] - originX;
+            float const nextY = corners.y[k][i] - originY;
+            float const nextZ = corners.z[k][i] - originZ;
+            sumX += previousY * nextZ - previousZ * nextY;
+            sumY += previousZ * nextX - previousX * nextZ;
+            sumZ += previousX * nextY - previousY * nextX;
+            previousX = nextX;
+            previousY = nextY;
+            previousZ = nextZ;
+        }
+        x[i] = sumX;
+        y[i] = sumY;
+        z[i] = sumZ;
+    }
+}
+
+template <unsigned int N>
+void newellVectors(CornerBlock<N> const& corners, float* __restrict x, float* __restrict y,
+                   float* __restrict z) noexcept
+{
+    for (std::size_t i = 0; i < kBlockSize; ++i) {
+        float sumX = 0;
+        float sumY = 0;
+        float sumZ = 0;
+        for (unsigned int k = 0; k < N; ++k) {
+            unsigned int const next = k + 1 == N ? 0 : k + 1;
+            sumX += corners.y[k][i] * corners.z[next][i] - corners.z[k][i] * corners.y[next][i];
+            sumY += corners.z[k][i] * corners.x[next][i] - corners.x[k][i] * corners.z[next][i];
+            sumZ += corners.x[k][i] * corners.y[next][i] - corners.y[k][i] * corners.x[next][i];
+        }
+        x[i] = sumX;
+        y[i] = sumY;
+        z[i] = sumZ;
+    }
+}
+
+template void fanVectors(CornerBlock<3> const&, float*, float*, float*) noexcept;
+template void fanVectors(CornerBlock<4> const&, float*, float*, float*) noexcept;
+template void newellVectors(CornerBlock<3> const&, float*, float*, float*) noexcept;
+template void newellVectors(CornerBlock<4> const&, float*, float*, float*) noexcept;
+
 void unitsOrFallback(float* __restrict x, float* __restrict y, float* __restrict z, std::size_t count) noexcept
 {
     for (std::size_t i = 0; i < count; ++i) {

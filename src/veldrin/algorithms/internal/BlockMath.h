@@ -8,6 +8,25 @@
 /// take a quarter of the time or less than one by one, and give the same bits. Arrays must not overlap.
 namespace Veldrin::GeometryAlgorithms {
 
+/// Faces computed together. A power of two that keeps all arrays of a block in the nearest cache.
+inline constexpr std::size_t kBlockSize = 64;
+
+/// Positions of the corners of `kBlockSize` faces that have N each.
+template <unsigned int N>
+struct CornerBlock {
+    float x[N][kBlockSize];
+    float y[N][kBlockSize];
+    float z[N][kBlockSize];
+};
+
+/// Sum of the cross products of the fan of triangles (0, k - 1, k) of each face, as `fanVector` gives it.
+template <unsigned int N>
+void fanVectors(CornerBlock<N> const& corners, float* x, float* y, float* z) noexcept;
+
+/// Sum of cross(p[k], p[k + 1]) over the closed loop of corners of each face, as `newellVector` gives it.
+template <unsigned int N>
+void newellVectors(CornerBlock<N> const& corners, float* x, float* y, float* z) noexcept;
+
 /// Scales each vector to length 1; one not longer than the smallest normal float becomes (0, 1, 0).
 void unitsOrFallback(float* x, float* y, float* z, std::size_t count) noexcept;
 

@@ -15,12 +15,29 @@ namespace Veldrin::GeometryAlgorithms {
 template <bool isAreaWeighted>
 class FaceNormalBlock {
 public:
-    static constexpr std::size_t kSize = 64;
+    static constexpr std::size_t kSize = kBlockSize;
 
     /// The faces [begin, end).
     template <class Ranges>
     [[gnu::always_inline]] void compute(Positions const& positions, unsigned int const* points, Ranges const& ranges,
                                         std::uint64_t begin, std::uint64_t end)
+    {
+        addUp(positions, points, ranges, begin, end);
+        unitsOrFallback(x_.data(), y_.data(), z_.data(), end - begin);
+        if constexpr (isAreaWeighted)
+            scaleByHalfLength(x_.data(), y_.data(), z_.data(), u_.data(), v_.data(), w_.data(), end - begin);
+    }
+
+    /// False for a degenerate face, or one that names a point without a position.
+    [[nodiscard]] bool isCovered(std::size_t i) const noexcept { return isCovered_[i]; }
+    [[nodiscard]] Math::float3 operator[](std::size_t i) const noexcept { return {x_[i], y_[i], z_[i]}; }
+
+private:
+    // In both of these a face without a normal is a vector of no length to the loops that follow.
+
+    template <class Ranges>
+    [[gnu::always_inline]] void addUp(Positions const& positions, unsigned int const* points, Ranges const& ranges,
+                                      std::uint64_t begin, std::uint64_t end)
     {
         for (std::uint64_t f = begin; f < end; ++f) {
             Geometry::IndexRange const range = ranges[f];
@@ -28,7 +45,6 @@ public:
             unsigned int const* const corners = points + range.begin;
             std::size_t const i = f - begin;
             isCovered_[i] = positions.cover(corners, n);
-            // A face without a normal is a vector of no length to the loops that follow.
             Math::float3 const vector = isCovered_[i] ? fanVector(positions, corners, n) : Math::float3{};
             x_[i] = vector.x;
             y_[i] = vector.y;
@@ -40,16 +56,29 @@ public:
                 w_[i] = area.z;
             }
         }
-        unitsOrFallback(x_.data(), y_.data(), z_.data(), end - begin);
-        if constexpr (isAreaWeighted)
-            scaleByHalfLength(x_.data(), y_.data(), z_.data(), u_.data(), v_.data(), w_.data(), end - begin);
     }
 
-    /// False for a degenerate face, or one that names a point without a position.
-    [[nodiscard]] bool isCovered(std::size_t i) const noexcept { return isCovered_[i]; }
-    [[nodiscard]] Math::float3 operator[](std::size_t i) const noexcept { return {x_[i], y_[i], z_[i]}; }
+    template <unsigned int N>
+    [[gnu::always_inline]] void addUp(Positions const& positions, unsigned int const* points,
+                                      Geometry::UniformRanges<N> const& ranges, std::uint64_t begin, std::uint64_t end)
+    {
+        CornerBlock<N> block;
+        for (std::uint64_t f = begin; f < end; ++f) {
+            unsigned int const* const corners = points + ranges[f].begin;
+            std::size_t const i = f - begin;
+            isCovered_[i] = positions.cover(corners, N);
+            for (unsigned int k = 0; k < N; ++k) {
+                Math::float3 const position = isCovered_[i] ? positions[corners[k]] : Math::float3{};
+                block.x[k][i] = position.x;
+                block.y[k][i] = position.y;
+                block.z[k][i] = position.z;
+            }
+        }
+        fanVectors(block, x_.data(), y_.data(), z_.data());
+        if constexpr (isAreaWeighted)
+            newellVectors(block, u_.data(), v_.data(), w_.data());
+    }
 
-private:
     std::array<float, kSize> x_, y_, z_;
     std::array<float, isAreaWeighted ? kSize : 0> u_, v_, w_;
     std::array<bool, kSize> isCovered_;

@@ -27,22 +27,51 @@ namespace {
 
 } // namespace
 
+struct PointOwners::Bounds {
+    unsigned int lowest = ~0u;
+    unsigned int highest = 0;
+
+    [[nodiscard]] std::size_t pageCount() const noexcept
+    {
+        return (highest >> kPageBits) - (lowest >> kPageBits) + std::size_t(1);
+    }
+};
+
+/// What bits all points have in common says where they lie, four times as fast as comparing them; next to a number that is
+/// divided by a high power of two it says little.
+PointOwners::Bounds PointOwners::looseBounds(unsigned int const* points, Geometry::IndexRange corners) noexcept
+{
+    Bounds bounds;
+    for (std::uint64_t i = corners.begin; i < corners.end; ++i) {
+        bounds.lowest &= points[i];
+        bounds.highest |= points[i];
+    }
+    return bounds;
+}
+
+PointOwners::Bounds PointOwners::exactBounds(unsigned int const* points, Geometry::IndexRange corners) noexcept
+{
+    Bounds bounds;
+    for (std::uint64_t i = corners.begin; i < corners.end; ++i) {
+        bounds.lowest = std::min(bounds.lowest, points[i]);
+        bounds.highest = std::max(bounds.highest, points[i]);
+    }
+    return bounds;
+}
+
 void PointOwners::meet(std::size_t part, std::uint64_t begin, std::uint64_t end)
 {
     Geometry::IndexRange const corners = faces_.corners(begin, end);
     unsigned int const* const points = faces_.points();
-    unsigned int lowest = ~0u;
-    unsigned int highest = 0;
-    for (std::uint64_t i = corners.begin; i < corners.end; ++i) {
-        lowest = std::min(lowest, points[i]);
-        highest = std::max(highest, points[i]);
-    }
     // Marking a page that no face meets costs a second look at most; marking each corner takes far longer.
-    constexpr unsigned int kMostPages = kChunkFaces / 4;
-    if (lowest <= highest && highest < faces_.pointCount() && (highest - lowest) >> kPageBits < kMostPages) {
+    constexpr std::size_t kMostPages = kChunkFaces / 4;
+    Bounds bounds = looseBounds(points, corners);
+    if (bounds.highest >= faces_.pointCount() || bounds.pageCount() > std::min(kMostPages, owners_.size() / 64))
+        bounds = exactBounds(points, corners);
+    if (bounds.lowest <= bounds.highest && bounds.highest < faces_.pointCount() && bounds.pageCount() <= kMostPages) {
         Chunk& chunk = chunks_[chunkOf(begin)];
-        chunk.lowestPage = lowest >> kPageBits;
-        chunk.highestPage = highest >> kPageBits;
+        chunk.lowestPage = bounds.lowest >> kPageBits;
+        chunk.highestPage = bounds.highest >> kPageBits;
         for (std::size_t page = chunk.lowestPage; page <= chunk.highestPage; ++page)
             lower(owners_[page], static_cast<unsigned char>(part));
     } else {

@@ -61,6 +61,10 @@ private:
         bool isOwn = false;
     };
 
+    struct Bounds;
+    static Bounds looseBounds(unsigned int const* points, Geometry::IndexRange corners) noexcept;
+    static Bounds exactBounds(unsigned int const* points, Geometry::IndexRange corners) noexcept;
+
     static std::size_t chunkOf(std::uint64_t face) noexcept { return face / kChunkFaces; }
     void meet(std::size_t part, std::uint64_t begin, std::uint64_t end);
     [[nodiscard]] bool ownsAll(std::size_t part, std::uint64_t begin, std::uint64_t end) const noexcept;
