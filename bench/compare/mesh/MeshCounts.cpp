@@ -1,6 +1,7 @@
 #include <veldrin/algorithms/HalfEdgeDataStructure.h>
 #include <veldrin/algorithms/MeshInvariants.h>
 #include <veldrin/geometry/GeoProperties.h>
+#include <veldrin/geometry/Prototypes.h>
 #include <veldrin/io/ObjectStream.h>
 #include <veldrin/object/Properties.h>
 
@@ -10,6 +11,7 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <string>
 #include <vector>
 
 // mesh_counts FILE.zon ...
@@ -77,38 +79,50 @@ Counts countTheirs(Surface const& surface)
     return counts;
 }
 
+void list(char const* what, std::vector<std::string> const& names)
+{
+    std::printf("%zu %s%s", names.size(), what, names.empty() ? "\n" : ":\n");
+    for (auto const& name : names)
+        std::printf("    %s\n", name.c_str());
+}
+
 } // namespace
 
 int main(int argc, char** argv)
 {
     int equal = 0;
     int different = 0;
-    std::vector<char const*> refused;
+    std::vector<std::string> refused;
+    std::vector<std::string> clouds;
     for (int i = 1; i < argc; ++i) {
         Nexil::Array<Nexil::Ptr<Object>> objects;
-        if (!IO::deserialize(argv[i], objects, {}, nullptr) || objects.size() != 1) {
+        if (!IO::deserialize(argv[i], objects, {}, nullptr)) {
             std::fprintf(stderr, "mesh_counts: cannot read %s\n", argv[i]);
             return EXIT_FAILURE;
         }
-        Surface surface;
-        if (!build(*objects[0], surface)) {
-            refused.push_back(argv[i]);
-            continue;
-        }
-        Counts const ours = countOurs(*objects[0]);
-        Counts const theirs = countTheirs(surface);
-        if (ours == theirs) {
-            ++equal;
-            continue;
-        }
-        ++different;
-        std::printf("%s: Euler characteristic %lld, components %lld, boundary edges %lld; CGAL: %lld, %lld, %lld\n",
-                    argv[i], ours.euler, ours.components, ours.boundaryEdges, theirs.euler, theirs.components,
+        for (std::size_t k = 0; k < objects.size(); ++k) {
+            std::string const name = objects.size() == 1 ? argv[i] : argv[i] + (" object " + std::to_string(k));
+            if (!Object::isA(*objects[k], *Geometry::getMeshPrototype())) {
+                clouds.push_back(name);
+                continue;
+            }
+            Surface surface;
+            if (!build(*objects[k], surface)) {
+                refused.push_back(name);
+                continue;
+            }
+            Counts const ours = countOurs(*objects[k]);
+            Counts const theirs = countTheirs(surface);
+            ++(ours == theirs ? equal : different);
+            if (ours != theirs)
+                std::printf(
+                    "%s: Euler characteristic %lld, components %lld, boundary edges %lld; CGAL: %lld, %lld, %lld\n",
+                    name.c_str(), ours.euler, ours.components, ours.boundaryEdges, theirs.euler, theirs.components,
                     theirs.boundaryEdges);
+        }
     }
-    std::printf("%d meshes with the same counts as CGAL, %d with others, %zu that CGAL does not take:\n", equal,
-                different, refused.size());
-    for (char const* const path : refused)
-        std::printf("%s\n", path);
+    std::printf("%d meshes with the same counts as CGAL, %d with others\n", equal, different);
+    list("that CGAL does not take", refused);
+    list("that are no mesh", clouds);
     return different == 0 ? EXIT_SUCCESS : EXIT_FAILURE;
 }

@@ -56,7 +56,10 @@ namespace {
 
     /// How far normals of one element may lie apart: sums in another order differ in the last places, and an area that is
     /// taken from positions as they are, not from their differences, is some percent off for faces as small as these.
-    constexpr float toleranceOf(Kernel kernel) { return kernel == Kernel::AreaNormals ? 2e-3f : 2e-4f; }
+    constexpr float toleranceOf(Kernel kernel)
+    {
+        return kernel == Kernel::AreaNormals ? 2e-3f : 2e-4f;
+    }
 
     struct Kept {
         std::vector<Point> normals;
@@ -79,6 +82,8 @@ namespace {
                 Point const& b = other.normals[i];
                 worst = std::max({worst, std::fabs(a.x - b.x), std::fabs(a.y - b.y), std::fabs(a.z - b.z)});
             }
+            if (worst > toleranceOf(kernel))
+                std::fprintf(stderr, "[%s: %.2g apart] ", nameOf(kernel), static_cast<double>(worst));
             return worst <= toleranceOf(kernel);
         }
     };
