@@ -328,13 +328,19 @@ TEST(FaceVertexAdjacency, FansBooksAndGiantPolygonsAreNoHarderThanAGrid)
     ASSERT_TRUE(found.build(*support::meshOn(kMany + 2, book)));
     EXPECT_EQ(found.edges[0], (FaceEdge{1, 0})) << "the lowest that runs the other way";
     EXPECT_EQ(found.edges[3], (FaceEdge{0, 0}));
-    std::vector<unsigned int> polygon(1000000);
+    std::vector<unsigned int> polygon(support::kGiant);
     std::iota(polygon.begin(), polygon.end(), 0u);
-    ASSERT_TRUE(found.build(*support::meshOn(1000000, {polygon})));
-    EXPECT_EQ(found.edges[999999].face, kInvalidIndex);
-    Normals normals;
-    computeMeshVertexNormals(*support::meshOn(1000000, {polygon}), true, true, normals);
-    EXPECT_EQ(normals.size(), 1000000u);
+    auto const giant = support::meshOn(support::kGiant, {polygon});
+    ASSERT_TRUE(found.build(*giant));
+    EXPECT_EQ(found.edges[support::kGiant - 1].face, kInvalidIndex);
+    Normals faceNormal;
+    computeMeshFaceNormals(*giant, faceNormal);
+    for (bool const byAngle : {false, true}) {
+        Normals normals;
+        computeMeshVertexNormals(*giant, byAngle, true, normals);
+        EXPECT_EQ(normals.size(), support::kGiant);
+        EXPECT_EQ(normals[support::kGiant / 2], faceNormal[0]);
+    }
 }
 
 /// Groups by flood over the face-vertices of each point, in the order of their first face-vertex.

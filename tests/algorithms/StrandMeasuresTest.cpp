@@ -1,3 +1,4 @@
+#include <algorithms/EdgeOracle.h>
 #include <support/Geometry.h>
 
 #include <veldrin/algorithms/StrandMeasures.h>
@@ -6,6 +7,7 @@
 
 #include <cmath>
 #include <cstring>
+#include <numeric>
 #include <random>
 
 namespace {
@@ -127,6 +129,34 @@ TEST(StrandMeasures, FallingOffsetsNeitherOverlapNorLeaveTheArrays)
     Nexil::Array<float3> tangents;
     ASSERT_TRUE(computeStrandTangents(*object, tangents, nullptr));
     EXPECT_EQ(tangents[3], (float3{0, 1, 0}));
+}
+
+TEST(StrandMeasures, OneGiantStrandAndAMillionOfOnePointAreNoHarderThanOthers)
+{
+    Nexil::Array<float> lengths;
+    Nexil::Array<float> segments;
+    Nexil::Array<float> ratios;
+    Nexil::Array<float3> tangents;
+    unsigned int const many = support::kGiant;
+    std::vector<float3> points(many);
+    for (unsigned int i = 0; i < many; ++i)
+        points[i] = {static_cast<float>(i % 2), 0, 0};
+    auto const giant = strands(points, {0, many});
+    ASSERT_TRUE(computeStrandLength(*giant, lengths, segments, nullptr));
+    EXPECT_EQ(lengths[0], static_cast<float>(many - 1));
+    ASSERT_TRUE(computeStrandRatio(*giant, ratios, nullptr));
+    EXPECT_EQ(ratios[many - 1], 1);
+    ASSERT_TRUE(computeStrandTangents(*giant, tangents, nullptr));
+    EXPECT_EQ(tangents[many - 1], (float3{1, 0, 0}));
+
+    points.resize(1000000);
+    std::vector<unsigned int> offsets(points.size() + 1);
+    std::iota(offsets.begin(), offsets.end(), 0u);
+    auto const dots = strands(points, offsets);
+    ASSERT_TRUE(computeStrandLength(*dots, lengths, segments, nullptr));
+    EXPECT_EQ(lengths[999999], 0);
+    ASSERT_TRUE(computeStrandTangents(*dots, tangents, nullptr));
+    EXPECT_EQ(tangents[999999], (float3{0, 1, 0}));
 }
 
 } // namespace
