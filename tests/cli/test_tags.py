@@ -81,6 +81,9 @@ class Tags(tool.ToolTest):
             self.assertIn(message, lines[0])
             self.assertEqual(lines[1:], ["    " + arguments[-1].replace("\n", "?"), "    " + " " * column + "^"])
         self.assertEqual(self.names(), ["plane.zon"])
+        # A complement looks like an option.
+        self.assertIn("stands behind '--'", self.zon("tag", "plane.zon", "-*", code=2).stderr)
+        self.assertIn("0 of 9 selected", self.zon("tag", "plane.zon", "--", "-*").stdout)
 
     def test_a_stored_selection_is_a_tag(self):
         self.assertEqual(self.ask("--where", "x > 0", "--store", "right"), ("point_component", [[2, 2], [5, 5], [8, 8]],

@@ -56,7 +56,11 @@ int main(int argumentCount, char** arguments)
     try {
         app.parse(argumentCount, arguments);
     } catch (CLI::ParseError const& wrongUsage) {
-        return app.exit(wrongUsage) == 0 ? kDone : kFailure;
+        if (app.exit(wrongUsage) == 0)
+            return kDone;
+        if (dynamic_cast<CLI::ExtrasError const*>(&wrongUsage))
+            std::fputs("What begins with '-' and is no option stands behind '--'.\n", stderr);
+        return kFailure;
     }
     return runSubcommand(run);
 }
