@@ -1,4 +1,5 @@
 #include "Meshes.h"
+#include "support/PeakMemory.h"
 
 #include <benchmark/benchmark.h>
 
@@ -132,6 +133,11 @@ void zonRead(benchmark::State& state)
         benchmark::DoNotOptimize(out.data());
     }
     finish(state, path);
+    bench::PeakMemory const peak;
+    Nexil::Array<Nexil::Ptr<Veldrin::Object>> out;
+    Veldrin::IO::deserialize(path.c_str(), out, {}, nullptr);
+    state.counters["peak of file and result"] =
+        peak.bytes() / (static_cast<double>(mesh().byteSize()) + state.counters["file MB"].value * 1e6);
 }
 
 void plainWrite(benchmark::State& state)

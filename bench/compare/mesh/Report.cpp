@@ -50,9 +50,13 @@ namespace {
         return 0;
     }
 
-    constexpr unsigned int kRounds = 7;
+    /// Rounds end after so many, or so much time.
+    constexpr unsigned int kMostRounds = 7;
+    constexpr unsigned int kLeastRounds = 3;
+    constexpr double kSecondsOfRounds = 4;
     /// Peers take many times as long, and noise is small against that.
     constexpr unsigned int kPeerRounds = 2;
+    constexpr double kSecondsOfPeer = 1;
 
     /// How far normals of one element may lie apart: sums in another order differ in the last places, and an area that is
     /// taken from positions as they are, not from their differences, is some percent off for faces as small as these.
@@ -112,15 +116,20 @@ std::vector<Row> measure(PlainMesh const& mesh, std::string const& only)
         std::size_t const half = bytesOf(mesh, kernel) / 2;
         std::vector<char> source(half, 1);
         std::vector<char> target(half, 2);
+        double spent = 0;
         auto const best = [&](double& least, auto const& run) {
-            double const time = secondsOf(run) * 1e9 / static_cast<double>(mesh.faceCount());
+            double const seconds = secondsOf(run);
+            spent += seconds;
+            double const time = seconds * 1e9 / static_cast<double>(mesh.faceCount());
             bool const isLess = time < least;
             least = std::min(least, time);
             return isLess;
         };
         flat->run(kernel, 1);
         Kept const expected(flat->result(kernel));
-        for (unsigned int round = 0; round < kRounds; ++round) {
+        for (unsigned int round = 0; round < kMostRounds; ++round) {
+            if (round >= kLeastRounds && spent > kSecondsOfRounds)
+                break;
             best(row.copy, [&] { std::memcpy(target.data(), source.data(), half); });
             best(row.flat, [&] { flat->run(kernel, 1); });
             for (unsigned int const threadCount : {1u, 2u}) {
@@ -129,7 +138,7 @@ std::vector<Row> measure(PlainMesh const& mesh, std::string const& only)
                     row.isEqual = row.isEqual && expected.agrees(kernel, ours->result(kernel));
             }
             for (auto const& peer : peers) {
-                if (round >= kPeerRounds || !peer->has(kernel))
+                if (round >= kPeerRounds || !peer->has(kernel) || (round > 0 && spent > kSecondsOfPeer))
                     continue;
                 if (best(row.peer, [&] { peer->run(kernel, 1); }))
                     row.peerName = peer->name();
