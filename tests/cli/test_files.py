@@ -1,10 +1,12 @@
 """How the tool treats files, terminals and wrong usage."""
 import os
 import pty
+import random
 import resource
 import signal
 import stat
 import subprocess
+import time
 
 import tool
 
@@ -93,6 +95,36 @@ class Output(tool.ToolTest):
             self.assertIn(f"{target}: cannot be written: File too large", result.stderr)
         self.assertEqual(self.names(), before)
         self.assertEqual((self.folder / "old.zon").read_text() + (self.folder / "old.obj").read_text(), "oldold")
+
+    def test_a_killed_import_leaves_the_old_file_or_the_new_one(self):
+        for name, subdivisions in (("old", 100), ("new", 120)):
+            self.zon("make", "plane", f"{name}.zon", "--subdivisions", str(subdivisions))
+            self.zon("export", f"{name}.zon", f"{name}.obj")
+        wholes = []
+        start = time.monotonic()
+        for name in ("old", "new"):
+            self.zon("import", f"{name}.obj", "target.zon", "--level", "0")
+            wholes.append((self.folder / "target.zon").read_bytes())
+        duration = (time.monotonic() - start) / 2
+        # Kills go by a generator of its own, so that a failure can be had again.
+        moments = random.Random(6)
+        found = [0, 0]
+        for kill in range(200):
+            program = subprocess.Popen([tool.ZON, "import", ["old", "new"][kill % 2] + ".obj", "target.zon",
+                                        "--level", "0"], cwd=self.folder,
+                                       stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
+            # The end, where the file is put in its place, is the place to hit.
+            time.sleep(duration * (moments.random() if kill % 4 else moments.uniform(0.8, 1.05)))
+            program.kill()
+            program.wait()
+            found[wholes.index((self.folder / "target.zon").read_bytes())] += 1
+            left = [name for name in self.names() if name.endswith(".tmp")]
+            self.assertLessEqual(len(left), 1)
+        self.assertGreater(min(found), 0, "no import came to its end")
+        # What the last one may have left goes with the next.
+        self.write(".zon-1-0.tmp", "left by a killed program")
+        self.zon("import", "new.obj", "target.zon")
+        self.assertEqual(self.names(), ["new.obj", "new.zon", "old.obj", "old.zon", "target.zon"])
 
     def test_a_full_disk(self):
         self.assertIn("/dev/full: cannot be written: No space left",

@@ -92,6 +92,11 @@ class Import(tool.ToolTest):
         self.assertEqual([each["name"] for each in self.json("info", "out.zon")["objects"]], ["front side", "back"])
         self.assertEqual(self.dumped("out.zon", "face_vertex_uv_index", "indices"), "0, 1, 4294967295")
 
+    def test_a_lone_carriage_return_begins_no_statement(self):
+        self.imported("names.obj", "v 0 0 0\nv 1 0 0\nv 0 1 0\ng side\rf 1 1 1\nf 1 2 3\r\n")
+        self.assertEqual([(each["name"], each["components"][2]["count"])
+                          for each in self.json("info", "out.zon")["objects"]], [("side f 1 1 1", 1)])
+
     def test_groups_make_objects_only_where_there_is_no_object(self):
         faces = "v 0 0 0\nv 1 0 0\nv 0 1 0\n{}f 1 2 3\n{}f 3 2 1\n{}f 1 3 2\n"
         self.assertEqual(self.imported("g.obj", faces.format("g a\n", "g b\n", "g a\n")), "")

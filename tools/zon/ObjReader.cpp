@@ -80,6 +80,8 @@ namespace {
                 }
                 if (auto const comment = statement_.find('#'); comment != std::string::npos)
                     statement_.erase(comment);
+                // To the parser it would end the line, and what follows would be a statement that nobody else saw.
+                std::ranges::replace(statement_, '\r', ' ');
                 arguments_ = statement_;
                 keyword_ = takeWord(arguments_);
                 if (!keyword_.empty())

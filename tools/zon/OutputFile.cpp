@@ -6,6 +6,7 @@
 #include <fmt/format.h>
 
 #include <fcntl.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -45,6 +46,33 @@ namespace {
         pendingPath[0] = '\0';
     }
 
+    fs::path folderOf(fs::path const& path)
+    {
+        return path.has_parent_path() ? path.parent_path() : fs::path(".");
+    }
+
+    bool isTemporaryName(std::string const& name)
+    {
+        return name.starts_with(".zon-") && name.ends_with(".tmp");
+    }
+
+    /// Takes away what killed programs left in a folder: temporary files that nobody holds locked any more.
+    void removeAbandoned(fs::path const& folder)
+    {
+        std::error_code error;
+        fs::directory_iterator entry(folder, error);
+        for (fs::directory_iterator const end; !error && entry != end; entry.increment(error)) {
+            if (!isTemporaryName(entry->path().filename().native()))
+                continue;
+            int const file = open(entry->path().c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC);
+            if (file < 0)
+                continue;
+            if (flock(file, LOCK_EX | LOCK_NB) == 0)
+                unlink(entry->path().c_str());
+            close(file);
+        }
+    }
+
     unsigned int modeOfNewFiles()
     {
         mode_t const mask = umask(0);
@@ -77,8 +105,9 @@ OutputFile::OutputFile(std::string const& target) : target_(target), finalPath_(
     } else if (errno != ENOENT) {
         fail(errno);
     }
+    removeAbandoned(folderOf(finalPath_));
     openUnnamed(mode);
-    if (descriptor_ < 0)
+    while (descriptor_ < 0)
         openNamed(mode);
 }
 
@@ -99,8 +128,7 @@ void OutputFile::fail(int errorNumber) const
 
 void OutputFile::openUnnamed(unsigned int mode)
 {
-    auto const folder = finalPath_.has_parent_path() ? finalPath_.parent_path() : fs::path(".");
-    descriptor_ = open(folder.c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0600);
+    descriptor_ = open(folderOf(finalPath_).c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0600);
     if (descriptor_ < 0) {
         // Old kernels take the flag for an attempt to write to a folder.
         if (errno != EOPNOTSUPP && errno != EISDIR && errno != EINVAL)
@@ -108,6 +136,7 @@ void OutputFile::openUnnamed(unsigned int mode)
         return;
     }
     fchmod(descriptor_, static_cast<mode_t>(mode));
+    flock(descriptor_, LOCK_EX);
     writePath_ = fmt::format("/proc/self/fd/{}", descriptor_);
     if (access(writePath_.c_str(), F_OK) != 0) {
         close(descriptor_);
@@ -121,6 +150,13 @@ void OutputFile::openNamed(unsigned int mode)
     descriptor_ = open(path.c_str(), O_CREAT | O_EXCL | O_RDWR | O_CLOEXEC, 0600);
     if (descriptor_ < 0)
         fail(errno);
+    // Another program may have come upon the file before it was locked, and taken it for an abandoned one.
+    struct stat status {};
+    if (flock(descriptor_, LOCK_EX) == 0 && fstat(descriptor_, &status) == 0 && status.st_nlink == 0) {
+        close(descriptor_);
+        descriptor_ = -1;
+        return;
+    }
     temporary_ = path;
     removeOnSignals(temporary_);
     fchmod(descriptor_, static_cast<mode_t>(mode));
@@ -156,8 +192,7 @@ void OutputFile::commit()
     temporary_.clear();
     keepOnSignals();
     // The renaming itself reaches the disk with the folder; file systems that cannot flush folders are let be.
-    auto const folder = finalPath_.has_parent_path() ? finalPath_.parent_path() : fs::path(".");
-    if (int const opened = open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC); opened >= 0) {
+    if (int const opened = open(folderOf(finalPath_).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC); opened >= 0) {
         fsync(opened);
         close(opened);
     }

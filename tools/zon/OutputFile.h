@@ -13,7 +13,8 @@ namespace Zon {
 ///
 /// The bytes go to a file without a name in the target's folder, so that a crash or a full disk leaves the old file and
 /// nothing else. `commit` flushes them to the disk, then puts them in the target's place. Where the file system has no
-/// such files, a named one stands in, which goes away with this object and on the usual signals.
+/// such files, a named one stands in, which goes away with this object and on the usual signals. Named ones are locked, so
+/// that those which a killed program left are known, and taken away by the next one that writes to the folder.
 /// A target that is no ordinary file (a pipe, /dev/null) is written as it is.
 /// Errors: Failure with the target's name and the system's reason.
 class OutputFile {
@@ -33,6 +34,7 @@ public:
 private:
     [[noreturn]] void fail(int errorNumber) const;
     void openUnnamed(unsigned int mode);
+    /// Opens nothing when somebody took the file away again at once.
     void openNamed(unsigned int mode);
     [[nodiscard]] std::filesystem::path freshName() const;
 

@@ -68,7 +68,7 @@ namespace {
         }
     }
 
-    bool readObjects(std::streambuf& buffer, std::uint64_t position, std::uint64_t end, Objects& out,
+    bool readObjects(std::streambuf& buffer, std::uint64_t position, std::uint64_t end, Objects& objects,
                      Nexil::RuntimeServices const* services)
     {
         Object header;
@@ -79,16 +79,13 @@ namespace {
             return false;
         ByteSource source(buffer, headerSource.position(), end, ByteSource::ReadAhead::Window);
         Geometry::Internal::ProxyRebuilder proxies;
-        Objects objects = version <= 4 ? readSequentialStream(source, header, version)
-                                       : readEntryStream(source, header, version >= kCurrentVersion, &proxies);
+        objects = version <= 4 ? readSequentialStream(source, header, version)
+                               : readEntryStream(source, header, version >= kCurrentVersion, &proxies);
         warnOfDamaged(proxies, services);
-        out.reserve(out.size() + objects.size());
-        for (auto& object : objects)
-            out.push_back(std::move(object));
         return true;
     }
 
-    bool readStream(std::istream& stream, Objects& out, Nexil::RuntimeServices const* services)
+    bool readStream(std::istream& stream, Objects& objects, Nexil::RuntimeServices const* services)
     {
         std::streambuf* const buffer = stream.rdbuf();
         if (!buffer)
@@ -99,14 +96,26 @@ namespace {
         if (end < position || end < 0) {
             std::vector<char> const bytes = readAll(*buffer);
             InputMemoryBuf memory(bytes.data(), bytes.size());
-            return readObjects(memory, 0, bytes.size(), out, services);
+            return readObjects(memory, 0, bytes.size(), objects, services);
         }
         if (buffer->pubseekpos(std::streampos(position), std::ios_base::in) != std::streampos(position))
             throwTruncated();
-        bool const isRead =
-            readObjects(*buffer, static_cast<std::uint64_t>(position), static_cast<std::uint64_t>(end), out, services);
+        bool const isRead = readObjects(*buffer, static_cast<std::uint64_t>(position), static_cast<std::uint64_t>(end),
+                                        objects, services);
         buffer->pubseekpos(std::streampos(end), std::ios_base::in);
         return isRead;
+    }
+
+    /// Reads a stream whole before the first object is appended: also the last step, leaving the stream, may fail.
+    bool appendObjects(std::istream& stream, Objects& out, Nexil::RuntimeServices const* services)
+    {
+        Objects objects;
+        if (!readStream(stream, objects, services))
+            return false;
+        out.reserve(out.size() + objects.size());
+        for (auto& object : objects)
+            out.push_back(std::move(object));
+        return true;
     }
 
     bool readHeaderOnly(std::istream& stream, Object& header)
@@ -170,13 +179,13 @@ bool deserialize(Nexil::InputStream& stream, Objects& out, DeserializationOption
                  Nexil::RuntimeServices const* services)
 {
     return runReported(services, "Cannot read from stream",
-                       [&] { return readStream(stream.standardStream(), out, services); });
+                       [&] { return appendObjects(stream.standardStream(), out, services); });
 }
 
 bool deserialize(Nexil::String const& path, Objects& out, DeserializationOptions const&,
                  Nexil::RuntimeServices const* services)
 {
-    return withInputFile(path, services, [&](std::istream& file) { return readStream(file, out, services); });
+    return withInputFile(path, services, [&](std::istream& file) { return appendObjects(file, out, services); });
 }
 
 bool deserializeHeader(Nexil::InputStream& stream, Object& header, Nexil::RuntimeServices const* services)

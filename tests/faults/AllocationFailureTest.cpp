@@ -1,0 +1,75 @@
+#include "FailingMemory.h"
+#include "Operations.h"
+
+#include <support/Streams.h>
+
+#include <gtest/gtest.h>
+#include <tbb/global_control.h>
+
+#include <cstdio>
+#include <fstream>
+#include <new>
+
+namespace {
+
+using support::Operation;
+using support::Sample;
+
+class AllocationFailure : public ::testing::TestWithParam<std::size_t> {};
+
+TEST_P(AllocationFailure, AtAnyMomentLeavesEverythingAsItWas)
+{
+    // One thread, so that the numbers of allocations are the same at each run.
+    tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, 1);
+    Operation const& operation = support::operations()[GetParam()];
+    Sample sample;
+    sample.path = ::testing::TempDir() + "allocation_failure_" + std::to_string(GetParam()) + ".zon";
+    std::ofstream(sample.path, std::ios::binary) << sample.stream;
+    auto const before = sample.description();
+    // Also makes what is made once.
+    auto const expected = operation.run(sample);
+    ASSERT_NE(expected, "") << operation.name;
+
+    std::uint64_t number = 0;
+    for (bool isOver = false; !isOver;) {
+        ++number;
+        std::string result;
+        std::string fault;
+        std::int64_t held = 0;
+        {
+            support::FailingAllocation const failing(number);
+            {
+                std::string found;
+                try {
+                    found = operation.run(sample);
+                } catch (std::bad_alloc const&) {
+                    found.clear();
+                } catch (std::exception const& other) {
+                    fault = other.what();
+                }
+                isOver = !failing.hasFailed();
+                if (isOver)
+                    result.swap(found);
+            }
+            held = failing.blocksHeld();
+        }
+        if (isOver)
+            EXPECT_EQ(result, expected) << operation.name;
+        else
+            EXPECT_LE(held, fault.empty() ? 0 : 8) << operation.name << ", allocation " << number << " leaks";
+        EXPECT_EQ(fault, "") << operation.name << ", allocation " << number;
+        ASSERT_FALSE(::testing::Test::HasFailure());
+    }
+    EXPECT_GT(number, 4u) << operation.name << ": hardly anything was allocated";
+    EXPECT_EQ(sample.description(), before) << operation.name;
+    std::remove(sample.path.c_str());
+}
+
+INSTANTIATE_TEST_SUITE_P(All, AllocationFailure, ::testing::Range<std::size_t>(0, support::operations().size()),
+                         [](auto const& parameter) {
+                             std::string name = support::operations()[parameter.param].name;
+                             std::erase(name, ' ');
+                             return name;
+                         });
+
+} // namespace

@@ -1,0 +1,27 @@
+#pragma once
+
+#include <cstdint>
+
+/// Memory that runs out at a chosen moment.
+namespace support {
+
+/// While it lives, the allocation of this thread with that number, from 1 on, fails, and all others succeed.
+///
+/// What counts are the allocations of our libraries, of this program and of the standard library on behalf of them; the
+/// task runtime and the compressor keep theirs. Under a sanitizer, which has memory functions of its own, only
+/// `operator new` counts.
+class FailingAllocation {
+public:
+    explicit FailingAllocation(std::uint64_t number) noexcept;
+    FailingAllocation(FailingAllocation const&) = delete;
+    FailingAllocation& operator=(FailingAllocation const&) = delete;
+    ~FailingAllocation();
+
+    /// Whether it was reached.
+    [[nodiscard]] bool hasFailed() const noexcept;
+    /// Blocks taken less blocks given back by this thread since the beginning. Always 0 under a sanitizer, which looks for
+    /// leaks itself.
+    [[nodiscard]] std::int64_t blocksHeld() const noexcept;
+};
+
+} // namespace support

@@ -1,0 +1,41 @@
+#pragma once
+
+#include <nexil/Ptr.h>
+#include <veldrin/object/Object.h>
+#include <vld/Object.h>
+
+#include <functional>
+#include <string>
+#include <vector>
+
+/// Every exported function as something that can be run again and again on geometry that must not change.
+namespace support {
+
+/// What the operations read.
+struct Sample {
+    Sample();
+
+    /// A small mesh with selections of all its components and values shared out by a range.
+    Nexil::Ptr<Veldrin::Object> mesh;
+    Nexil::Ptr<Veldrin::Object> strands;
+    /// Level sets of a small ball as geometry, in both configurations.
+    Nexil::Ptr<Veldrin::Object> smallVolume;
+    Nexil::Ptr<Veldrin::Object> wideVolume;
+    /// All of them as a stream, and as a file.
+    std::string stream;
+    std::string path;
+
+    /// Everything that can be seen of it.
+    [[nodiscard]] std::string description() const;
+};
+
+struct Operation {
+    char const* name;
+    /// Runs it and tells the result: the same at each run. Whatever it allocates it gives back. "" where the function says
+    /// that it failed. Outputs that are left neither as before nor empty, when it throws, are told by std::logic_error.
+    std::function<std::string(Sample const&)> run;
+};
+
+[[nodiscard]] std::vector<Operation> const& operations();
+
+} // namespace support
