@@ -1,6 +1,7 @@
 #include <veldrin/algorithms/HalfEdgeDataStructure.h>
 
 #include <nexil/parallel/Scan.h>
+#include <veldrin/algorithms/internal/FaceBlocks.h>
 #include <veldrin/algorithms/internal/FaceCorners.h>
 #include <veldrin/algorithms/internal/MeshFaces.h>
 #include <veldrin/geometry/Prototypes.h>
@@ -8,9 +9,7 @@
 #include <algorithm>
 #include <vector>
 
-// The table is a counting sort of all edge uses by owner: count per point, running sum, put in place. It is made in as many
-// blocks of faces as there are threads, each with counts of its own: a block writes behind the blocks before it, so uses of
-// one point stand in face order whatever the number of blocks, and nothing is shared that would have to be locked.
+// The table is a counting sort of all edge uses by owner, in blocks of faces: count per point, running sum, put in place.
 //
 // A use is one face's run along one edge, in 32 bits: the distance from its owner to the other point, and in the lowest bit
 // whether the face runs against it, from the other point to the owner. Distances are taken on a circle of 2^32 - 1 points,
@@ -24,13 +23,9 @@ namespace {
     using Edge = HalfEdgeDataStructure::Edge;
 
     namespace grain {
-        constexpr std::uint64_t kFaces = 65536;
         constexpr std::size_t kPoints = 16384;
     } // namespace grain
 
-    /// Below this many face-vertices blocks cost more than they win.
-    constexpr std::uint64_t kParallelFaceVertices = 32768;
-    constexpr std::uint64_t kMaxBlocks = 16;
     /// Groups up to this size stay in face order and are searched from end to end; larger ones are sorted.
     constexpr std::uint64_t kSmallGroup = 24;
     constexpr unsigned int kHalfCircle = 0x7FFFFFFFu;
@@ -68,12 +63,8 @@ namespace {
         return from << 32 | to;
     }
 
-    /// What one block of faces needs while the table is built.
-    struct Block {
-        std::uint64_t firstFace = 0;
-        std::uint64_t endFace = 0;
-        /// Per point: first the uses it owns in this block, then where the next of them goes.
-        Nexil::Array<unsigned int> cursors;
+    /// What the first walk over a block of faces finds out for the second.
+    struct Findings {
         /// Faces with a repeated or invalid corner, or fewer than three, in increasing order.
         std::vector<unsigned int> irregularFaces;
         std::vector<std::uint64_t> folds;
@@ -89,38 +80,38 @@ namespace {
         {
         }
 
-        /// Calls visit(Use) for each, and remembers what is odd about the block's faces.
+        /// Calls visit(Use) for each, and remembers what is odd about the faces.
         template <class Visit>
-        void first(Block& block, Visit const& visit) const
+        void first(FaceBlocks const& blocks, std::size_t block, Findings& found, Visit const& visit) const
         {
-            chunks(block, [&](std::uint64_t begin, std::uint64_t end) {
+            blocks.forEachChunk(block, [&](std::uint64_t begin, std::uint64_t end) {
                 for (std::uint64_t face = begin; face < end; ++face) {
                     IndexRange const range = ranges_[face];
-                    if (isRegularFace(points_, range, pointCount_, block.scratch)) [[likely]] {
+                    if (isRegularFace(points_, range, pointCount_, found.scratch)) [[likely]] {
                         visitRegular(range, visit);
                     } else {
-                        block.irregularFaces.push_back(static_cast<unsigned int>(face));
-                        visitIrregular(range, block.scratch, visit,
-                                       [&](std::uint64_t key) { block.folds.push_back(key); });
+                        found.irregularFaces.push_back(static_cast<unsigned int>(face));
+                        visitIrregular(range, found.scratch, visit,
+                                       [&](std::uint64_t key) { found.folds.push_back(key); });
                     }
                 }
             });
         }
 
         template <class Visit>
-        void again(Block& block, Visit const& visit) const
+        void again(FaceBlocks const& blocks, std::size_t block, Findings& found, Visit const& visit) const
         {
             std::size_t nextIrregular = 0;
-            chunks(block, [&](std::uint64_t begin, std::uint64_t end) {
+            blocks.forEachChunk(block, [&](std::uint64_t begin, std::uint64_t end) {
                 while (begin < end) {
                     bool const hasIrregular =
-                        nextIrregular < block.irregularFaces.size() && block.irregularFaces[nextIrregular] < end;
-                    std::uint64_t const stop = hasIrregular ? block.irregularFaces[nextIrregular] : end;
+                        nextIrregular < found.irregularFaces.size() && found.irregularFaces[nextIrregular] < end;
+                    std::uint64_t const stop = hasIrregular ? found.irregularFaces[nextIrregular] : end;
                     for (std::uint64_t face = begin; face < stop; ++face)
                         visitRegular(ranges_[face], visit);
                     begin = stop;
                     if (hasIrregular) {
-                        visitIrregular(ranges_[begin++], block.scratch, visit, [](std::uint64_t) {});
+                        visitIrregular(ranges_[begin++], found.scratch, visit, [](std::uint64_t) {});
                         ++nextIrregular;
                     }
                 }
@@ -128,15 +119,6 @@ namespace {
         }
 
     private:
-        template <class Visit>
-        void chunks(Block const& block, Visit const& visit) const
-        {
-            for (std::uint64_t begin = block.firstFace; begin < block.endFace; begin += grain::kFaces) {
-                Nexil::Internal::throwIfJobCancelled();
-                visit(begin, std::min(block.endFace, begin + grain::kFaces));
-            }
-        }
-
         template <class Visit>
         void visitRegular(IndexRange range, Visit const& visit) const
         {
@@ -175,97 +157,36 @@ namespace {
         std::uint64_t pointCount_;
     };
 
-    template <class Ranges>
-    std::uint64_t firstFaceFrom(std::uint64_t corner, std::uint64_t faceCount, Ranges const& ranges)
-    {
-        std::uint64_t low = 0;
-        for (std::uint64_t high = faceCount; low < high;) {
-            std::uint64_t const middle = low + (high - low) / 2;
-            if (ranges[middle].begin < corner)
-                low = middle + 1;
-            else
-                high = middle;
-        }
-        return low;
-    }
-
-    /// Blocks of whole faces with about as many corners each; no more than their counts may take of memory.
-    template <class Ranges>
-    std::vector<Block> makeBlocks(MeshFaces const& faces, Ranges const& ranges)
-    {
-        std::uint64_t const corners = faces.cornerCount();
-        std::uint64_t blockCount = 1;
-        if (corners >= kParallelFaceVertices) {
-            std::uint64_t const affordable = 5 * corners / std::max<std::uint64_t>(1, faces.pointCount());
-            blockCount =
-                std::clamp<std::uint64_t>(std::min<std::uint64_t>(affordable, parallel::threadCount()), 1, kMaxBlocks);
-        }
-        std::vector<Block> blocks(blockCount);
-        for (std::uint64_t b = 1; b < blockCount; ++b)
-            blocks[b].firstFace = blocks[b - 1].endFace =
-                firstFaceFrom(corners * b / blockCount, faces.faceCount(), ranges);
-        blocks.back().endFace = faces.faceCount();
-        return blocks;
-    }
-
-    template <class Visit>
-    void forEachBlock(std::vector<Block>& blocks, Visit const& visit)
-    {
-        parallel::forRange(blocks.size(), 1, [&](std::size_t begin, std::size_t end) {
-            for (std::size_t b = begin; b < end; ++b)
-                visit(blocks[b]);
-        });
-    }
-
-    /// Turns counts per block and point into the places where each block's uses of each point begin.
-    void countsToCursors(std::vector<Block>& blocks, std::uint64_t pointCount, Nexil::Array<unsigned int>& uses)
-    {
-        std::vector<unsigned int*> cursors;
-        for (Block& block : blocks)
-            cursors.push_back(block.cursors.data());
-        parallel::scanInOrder(
-            pointCount, grain::kPoints, std::uint64_t(0),
-            [&](std::size_t begin, std::size_t end) {
-                std::uint64_t sum = 0;
-                for (unsigned int const* const counts : cursors)
-                    for (std::size_t p = begin; p < end; ++p)
-                        sum += counts[p];
-                return sum;
-            },
-            [&](std::uint64_t total) { Nexil::Internal::resizeUninitialized(uses, total); },
-            [&](std::size_t begin, std::size_t end, std::uint64_t before) {
-                auto at = static_cast<unsigned int>(before);
-                for (std::size_t p = begin; p < end; ++p)
-                    for (unsigned int* const counts : cursors)
-                        at += std::exchange(counts[p], at);
-            });
-    }
-
     /// Groups all uses by owner. groupEnds: per point, one past its group.
     template <class Ranges>
     void groupUses(MeshFaces const& faces, Ranges const& ranges, Nexil::Array<unsigned int>& uses,
                    Nexil::Array<unsigned int>& groupEnds, Nexil::Array<std::uint64_t>& folds)
     {
         UseWalk<Ranges> const walk(faces, ranges);
-        auto blocks = makeBlocks(faces, ranges);
-        forEachBlock(blocks, [&](Block& block) {
-            block.cursors.resize(faces.pointCount());
-            walk.first(block, [counts = block.cursors.data()](Use use) { ++counts[use.owner]; });
+        FaceBlocks blocks(faces);
+        std::vector<Findings> found(blocks.size());
+        blocks.forEach([&](std::size_t block) {
+            blocks.counts(block).resize(faces.pointCount());
+            walk.first(blocks, block, found[block],
+                       [counts = blocks.counts(block).data()](Use use) { ++counts[use.owner]; });
         });
-        countsToCursors(blocks, faces.pointCount(), uses);
-        forEachBlock(blocks, [&](Block& block) {
-            walk.again(block, [cursors = block.cursors.data(), target = uses.data()](Use use) {
-                target[cursors[use.owner]++] = use.code;
-            });
+        blocks.countsToPlaces(
+            faces.pointCount(), [&](std::uint64_t total) { Nexil::Internal::resizeUninitialized(uses, total); },
+            [](std::size_t, unsigned int) {});
+        blocks.forEach([&](std::size_t block) {
+            walk.again(blocks, block, found[block],
+                       [places = blocks.counts(block).data(), target = uses.data()](Use use) {
+                           target[places[use.owner]++] = use.code;
+                       });
         });
-        // Behind its last use the last block's cursor stands at the end of the group.
-        groupEnds = std::move(blocks.back().cursors);
+        // Behind its last use the last block's place is the end of the group.
+        groupEnds = std::move(blocks.counts(blocks.size() - 1));
         std::uint64_t foldCount = 0;
-        for (Block const& block : blocks)
-            foldCount += block.folds.size();
+        for (Findings const& each : found)
+            foldCount += each.folds.size();
         folds.reserve(foldCount);
-        for (Block const& block : blocks)
-            for (std::uint64_t const key : block.folds)
+        for (Findings const& each : found)
+            for (std::uint64_t const key : each.folds)
                 folds.push_back(key);
         sortMany(folds.begin(), folds.end());
     }
