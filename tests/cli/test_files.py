@@ -46,6 +46,9 @@ class Usage(tool.ToolTest):
             self.assertNotEqual(result.stderr, "", command)
         self.assertEqual(self.names(), [])
 
+    def test_version_is_one_line(self):
+        self.assertRegex(self.zon("--version").stdout, r"^zon \d+\.\d+\.\d+\n$")
+
     def test_unreadable_files_name_themselves_and_the_reason(self):
         self.write("text.zon", "no zon at all")
         self.write("mesh.xyz", "0 0 0")

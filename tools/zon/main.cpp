@@ -36,6 +36,7 @@ int main(int argumentCount, char** arguments)
 {
     CLI::App app("Reads, writes and compares zon files: geometry objects in a compressed, checked stream.", "zon");
     app.require_subcommand(1);
+    app.set_version_flag("--version", "zon " ZON_VERSION);
     app.footer("Exit codes: 0 done; 1 differences, a damaged file, an invalid object, faults of a mesh, or names that "
                "resolve to nothing; 2 wrong usage, or a file that cannot be read or written.\n'zon SUBCOMMAND --help' "
                "tells more.");
