@@ -9,7 +9,12 @@
 
 #if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
 #    define HAS_OWN_MEMORY_FUNCTIONS 0
-#else
+#elif defined(__has_feature)
+#    if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer)
+#        define HAS_OWN_MEMORY_FUNCTIONS 0
+#    endif
+#endif
+#if !defined(HAS_OWN_MEMORY_FUNCTIONS)
 #    define HAS_OWN_MEMORY_FUNCTIONS 1
 #endif
 
