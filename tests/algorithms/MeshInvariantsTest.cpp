@@ -78,7 +78,7 @@ Polygons twice(unsigned int pointCount, unsigned int shared, Polygons faces)
 TEST(MeshInvariants, KnownSurfacesHaveTheirKnownNumbers)
 {
     Polygons const cube{{0, 1, 3, 2}, {4, 6, 7, 5}, {0, 4, 5, 1}, {2, 3, 7, 6}, {0, 2, 6, 4}, {1, 5, 7, 3}};
-    // Six triangles on six points: every two points share an edge, ten triangles close it (the half icosahedron).
+    // Ten triangles on six points, every two of which share an edge: half an icosahedron.
     Polygons const projectivePlane{{0, 1, 2}, {0, 2, 3}, {0, 3, 4}, {0, 4, 5}, {0, 5, 1},
                                    {1, 2, 4}, {2, 3, 5}, {3, 4, 1}, {4, 5, 2}, {5, 1, 3}};
     struct Case {

@@ -181,6 +181,77 @@ TEST(MeshNormals, AgreeWithSumsInDoubleInEveryVariantAndAreTheSameBitsOnAllThrea
         }
 }
 
+/// Sums in single precision over the faces in their order, each normal times the face's area when asked for.
+Normals summedInFaceOrder(std::vector<float3> const& points, Polygons const& faces, bool byArea)
+{
+    auto const unitOf = [](float3 const& v) {
+        float const length = std::sqrt(v.x * v.x + v.y * v.y + v.z * v.z);
+        float const scale = 1 / length;
+        return length > 1.1754944e-38f ? float3{v.x * scale, v.y * scale, v.z * scale} : float3{0, 1, 0};
+    };
+    Normals sums;
+    sums.resize(points.size());
+    for (auto const& face : faces) {
+        auto const at = [&](std::size_t k) { return points[face[k % face.size()]]; };
+        if (face.size() < 3 || *std::max_element(face.begin(), face.end()) >= points.size())
+            continue;
+        float3 fan{};
+        float3 loop{};
+        for (std::size_t k = 2; k < face.size(); ++k)
+            fan = fan + cross(at(k - 1) - at(0), at(k) - at(0));
+        for (std::size_t k = 0; k < face.size(); ++k)
+            loop = loop + cross(at(k), at(k + 1));
+        float const area = 0.5f * std::sqrt(loop.x * loop.x + loop.y * loop.y + loop.z * loop.z);
+        for (unsigned int const p : face)
+            sums[p] = sums[p] + (byArea ? unitOf(fan) * area : unitOf(fan));
+    }
+    for (float3& sum : sums)
+        sum = unitOf(sum);
+    return sums;
+}
+
+/// Leaves what is no number in the memory that is handed out next.
+void soilFreeMemory(std::size_t floatCount)
+{
+    std::vector<std::vector<float>> const soil(4, std::vector<float>(floatCount, std::nanf("")));
+}
+
+TEST(MeshNormals, OfMessyMeshesAreTheBitsOfALoopOverTheFacesOnAllThreads)
+{
+    // Degenerate faces, repeated corners and points that are not there, among neighbours with near numbers and far ones.
+    unsigned int const pointCount = kParallelMeshVertexNormalsThreshold + 5;
+    for (unsigned int const spread : {40u, pointCount}) {
+        auto faces = support::randomFaces(spread, 20000, 0, spread);
+        for (std::size_t f = 0; f < faces.size(); ++f)
+            for (unsigned int& corner : faces[f])
+                if (corner < spread)
+                    corner =
+                        static_cast<unsigned int>((corner + f * (pointCount - spread) / faces.size()) % pointCount);
+                else
+                    corner += pointCount;
+        std::mt19937 random(spread);
+        std::vector<float3> points(pointCount);
+        for (float3& p : points)
+            p = {float(random() % 1000) / 7, float(random() % 1000) / 7, float(random() % 1000) / 7};
+        auto const object = support::mesh(points, faces);
+        for (int variant = 0; variant < 4; ++variant) {
+            Normals expected;
+            if (variant < 2)
+                expected = summedInFaceOrder(points, faces, variant == 1);
+            support::onThreadCounts([&] {
+                soilFreeMemory(4 * faces.size());
+                Normals normals;
+                computeMeshVertexNormals(*object, variant >= 2, variant % 2 == 1, normals);
+                if (expected.empty())
+                    expected = normals;
+                ASSERT_EQ(normals.size(), expected.size());
+                EXPECT_EQ(std::memcmp(normals.data(), expected.data(), expected.size() * sizeof(float3)), 0)
+                    << "variant " << variant << ", spread " << spread;
+            });
+        }
+    }
+}
+
 TEST(MeshNormals, AnglesAreExactToAFewUnitsInTheLastPlace)
 {
     // Two triangles at right angles share one point: the normal there tells their angles' ratio.

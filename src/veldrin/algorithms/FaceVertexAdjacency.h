@@ -31,7 +31,8 @@ namespace Veldrin::GeometryAlgorithms {
 ///
 /// False, and all outputs untouched, when "face_offset" or "face_vertex" is missing or shorter than the counts ask for,
 /// when offsets fall or do not begin at 0, or when a face-vertex names a point beyond "point_component".
-/// Errors: std::bad_alloc; std::runtime_error when the job is cancelled. Either leaves the outputs as they were.
+/// Errors: std::runtime_error when the job is cancelled leaves the outputs as they were, and so does std::bad_alloc but
+/// where one of them had room for its result already: then it may hold unfinished values.
 /// Cost: linear in face-vertices and points, n log n in the face-vertices at one point, parallel. Storage that the outputs
 /// already have is used again.
 /// Temporary memory: for each thread 4 bytes a point, but never more than 20 bytes a face-vertex in all; 32 bytes for each

@@ -15,10 +15,10 @@ namespace Veldrin::GeometryAlgorithms {
 
 /// Puts the face-vertices of each point into groups that are bordered by the mesh's hard edges.
 ///
-/// An edge is hard when no face lies across it, or one that has another face across from it, as only where the mesh is not
-/// manifold or not consistently oriented; when the faces' normals along it differ; and, where these are not all known, when the angle between the unit
-/// normals of the two faces is not less than `maxAngle`. Every other edge is smooth. Two face-vertices of a point are in
-/// one group when smooth edges at the point lead from one to the other.
+/// An edge is hard when no face lies across it; when the edge found across from it faces another one, as only where the
+/// mesh is not manifold or not consistently oriented; when the normals on its two sides differ; and, where these are not
+/// all known, when the angle between the unit normals of the two faces is not less than `maxAngle`. Every other edge is
+/// smooth. Two face-vertices of a point are in one group when smooth edges at the point lead from one to the other.
 ///
 /// normalIndices: per face-vertex, the normal that it has already; `kInvalidIndex`, or an entry that is missing, is not
 ///                known. The normals along an edge are those of its two face-vertices on either side.

@@ -111,7 +111,7 @@ namespace {
         {
         }
 
-        /// One loop over the faces. Takes no memory but that of one block, and so cannot fail half-way for want of it.
+        /// One loop over the faces. Takes no memory but that of one block.
         void addSerially()
         {
             std::fill_n(sums_, faces_.pointCount(), Math::float3{});
@@ -187,14 +187,23 @@ namespace {
             Nexil::parallel::forRange(faces_.faceCount(), grain::kFaces, [&](std::size_t begin, std::size_t end) {
                 // Faces that the loop below leaves out add zero, which changes no sum.
                 std::fill(normals.data() + begin, normals.data() + end, Math::float3{});
+                Geometry::IndexRange rest = faces_.corners(begin, end);
+                auto const skipTo = [&](std::uint64_t corner) {
+                    std::fill(angles.data() + rest.begin, angles.data() + corner, 0.0f);
+                };
                 Worker worker(positions_, faces_.points());
                 worker.forEachFace(ranges_, begin, end,
                                    [&](std::uint64_t f, Math::float3 const& normal, std::size_t angle) {
                                        normals[f] = normal;
-                                       if constexpr (isAngleWeighted)
+                                       if constexpr (isAngleWeighted) {
+                                           skipTo(ranges_[f].begin);
+                                           rest.begin = ranges_[f].end;
                                            for (std::uint64_t i = ranges_[f].begin; i < ranges_[f].end; ++i)
                                                angles[i] = worker.angles()[angle++];
+                                       }
                                    });
+                if constexpr (isAngleWeighted)
+                    skipTo(rest.end);
             });
             Nexil::parallel::forRange(stripeCount, 1, [&](std::size_t firstStripe, std::size_t endStripe) {
                 std::uint64_t const pointCount = faces_.pointCount();

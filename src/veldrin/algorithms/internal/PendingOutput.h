@@ -12,7 +12,8 @@ namespace Veldrin::GeometryAlgorithms {
 ///
 /// That is the caller's own array when it has room and nothing can stop the work half-way, so that a repeated call touches
 /// no fresh memory, which would cost more than most kernels here; otherwise an array aside, and a cancelled job leaves the
-/// caller's as it was. Whatever else may fail, temporary memory above all, is made before this.
+/// caller's as it was. Temporary memory is made before this where it can be; where it runs out later, what was written in
+/// place stays unfinished, and the public headers say so.
 template <class T>
 class PendingOutput {
 public:
