@@ -41,5 +41,6 @@ void addNormals(CLI::App& app, Run& run);
 void addDiagnose(CLI::App& app, Run& run);
 void addStrands(CLI::App& app, Run& run);
 void addValidate(CLI::App& app, Run& run);
+void addVolume(CLI::App& app, Run& run);
 
 } // namespace Zon

@@ -1,8 +1,10 @@
 #include "Command.h"
 #include "Compare.h"
 #include "Console.h"
+#include "FileEnding.h"
 #include "MeshArrays.h"
 #include "OutputFile.h"
+#include "VdbFile.h"
 
 #include <veldrin/geometry/GeoProperties.h>
 #include <veldrin/geometry/Prototypes.h>
@@ -15,8 +17,10 @@
 #include <cerrno>
 #include <cmath>
 #include <cstdio>
+#include <filesystem>
 #include <limits>
 #include <memory>
+#include <system_error>
 
 namespace Zon {
 
@@ -162,9 +166,37 @@ namespace {
         file.commit();
     }
 
-    ExitCode runExport(Options const& options)
+    ExitCode report(Options const& options, char const* noun, std::uint64_t count,
+                    std::vector<std::string> const& losses, std::uint64_t bytes)
     {
-        checkIsOtherFile(options.input, options.output);
+        for (auto const& loss : losses)
+            warn(fmt::format("not kept: {}", loss));
+        if (options.wantsJson) {
+            Json const json{{"input", options.input},
+                            {"output", options.output},
+                            {std::string(noun) + "s", count},
+                            {"not_kept", losses},
+                            {"bytes", bytes}};
+            fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
+        } else {
+            fmt::print("{}: {}, {}\n", options.output, counted(count, noun), byteText(bytes));
+        }
+        return kDone;
+    }
+
+    ExitCode exportVolumes(Options const& options)
+    {
+        auto const objects = readZon(options.input);
+        auto const written = writeVdb(objects, options.output);
+        if (written.gridCount == 0)
+            throw Failure(fmt::format("{}: there is no volume with values in it", options.input));
+        std::error_code isNoFile; // a pipe or a device has no size
+        auto const size = std::filesystem::file_size(options.output, isNoFile);
+        return report(options, "grid", written.gridCount, written.leftOut, isNoFile ? 0 : size);
+    }
+
+    ExitCode exportMeshes(Options const& options)
+    {
         auto const objects = readZon(options.input);
         std::vector<MeshArrays> parts;
         std::vector<std::string> losses;
@@ -185,21 +217,15 @@ namespace {
         }
         if (parts.empty())
             throw Failure(fmt::format("{}: there is no mesh and no point cloud in it", options.input));
-        for (auto const& loss : losses)
-            warn(fmt::format("not kept: {}", loss));
         auto const text = writeObj(parts);
         writeText(text, options.output);
-        if (options.wantsJson) {
-            Json const json{{"input", options.input},
-                            {"output", options.output},
-                            {"objects", parts.size()},
-                            {"not_kept", losses},
-                            {"bytes", text.size()}};
-            fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
-        } else {
-            fmt::print("{}: {}, {}\n", options.output, counted(parts.size(), "object"), byteText(text.size()));
-        }
-        return kDone;
+        return report(options, "object", parts.size(), losses, text.size());
+    }
+
+    ExitCode runExport(Options const& options)
+    {
+        checkIsOtherFile(options.input, options.output);
+        return fileEnding(options.output) == ".vdb" ? exportVolumes(options) : exportMeshes(options);
     }
 
 } // namespace
@@ -207,9 +233,10 @@ namespace {
 void addExport(CLI::App& app, Run& run)
 {
     auto const options = std::make_shared<Options>();
-    auto* const command = app.add_subcommand("export", "Turns a zon file into an OBJ file");
+    auto* const command =
+        app.add_subcommand("export", "Turns a zon file into an OBJ file, or its volumes into a VDB file");
     command->add_option("in", options->input, "zon file")->required();
-    command->add_option("out", options->output, "OBJ file to write")->required();
+    command->add_option("out", options->output, "File to write: .vdb for volumes, else OBJ")->required();
     command->add_flag("--json", options->wantsJson, "Report as JSON on stdout");
     command->callback([options, &run] { run = [options] { return runExport(*options); }; });
 }

@@ -1,16 +1,20 @@
 #include "Command.h"
 #include "Console.h"
+#include "FileEnding.h"
+#include "GeometryKind.h"
 #include "MeshArrays.h"
 #include "OutputFile.h"
 #include "TextInput.h"
+#include "VdbFile.h"
 #include "ZonFile.h"
+
+#include <veldrin/geometry/GeoProperties.h>
+#include <veldrin/object/Properties.h>
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
 #include <nlohmann/json.hpp>
 
-#include <algorithm>
-#include <cctype>
 #include <filesystem>
 #include <memory>
 #include <system_error>
@@ -19,6 +23,7 @@ namespace Zon {
 
 namespace {
 
+    using namespace Veldrin;
     using Json = nlohmann::ordered_json;
 
     struct Options {
@@ -28,11 +33,17 @@ namespace {
         bool wantsJson = false;
     };
 
+    /// What came of a file.
+    struct Imported {
+        Objects objects;
+        std::vector<std::string> leftOut;
+        std::string report; ///< a line per object
+        Json parts = Json::array();
+    };
+
     MeshFile readMeshFile(std::string const& path)
     {
-        auto extension = std::filesystem::path(path).extension().string();
-        std::transform(extension.begin(), extension.end(), extension.begin(),
-                       [](unsigned char c) { return c < 128 ? static_cast<char>(std::tolower(c)) : '?'; });
+        auto const extension = fileEnding(path);
         using Read = MeshFile (*)(std::string const&, std::string_view);
         Read const read = extension == ".obj"   ? &readObj
                           : extension == ".off" ? &readOff
@@ -40,41 +51,66 @@ namespace {
                           : extension == ".stl" ? &readStl
                                                 : nullptr;
         if (!read)
-            throw Failure(fmt::format("{}: meshes are read from .obj, .off, .ply and .stl, not from {}", path,
-                                      extension.empty() ? "a name without ending" : inQuotes(extension)));
+            throw Failure(
+                fmt::format("{}: meshes are read from .obj, .off, .ply and .stl, volumes from .vdb, but not from {}",
+                            path, extension.empty() ? "a name without ending" : inQuotes(extension)));
         auto const bytes = readWholeFile(path);
         return read(path, bytes);
     }
 
-    ExitCode runImport(Options const& options)
+    Imported importMeshes(std::string const& path)
     {
-        checkIsOtherFile(options.input, options.output);
-        auto file = readMeshFile(options.input);
-        for (auto const& text : file.leftOut)
-            warn(fmt::format("{}: not kept: {}", options.input, text));
-        Json parts = Json::array();
-        std::string report;
-        Objects objects;
+        auto file = readMeshFile(path);
+        Imported result;
+        result.leftOut = std::move(file.leftOut);
         for (auto& part : file.parts) {
             bool const isMesh = part.faceCount() > 0;
-            report += fmt::format("  {}{}: {}{}\n", isMesh ? "mesh" : "point cloud",
-                                  part.name ? " " + inQuotes(*part.name) : "", counted(part.positions.size(), "point"),
-                                  isMesh ? ", " + counted(part.faceCount(), "face") : "");
+            result.report += fmt::format(
+                "  {}{}: {}{}\n", isMesh ? "mesh" : "point cloud", part.name ? " " + inQuotes(*part.name) : "",
+                counted(part.positions.size(), "point"), isMesh ? ", " + counted(part.faceCount(), "face") : "");
             Json entry{{"kind", isMesh ? "mesh" : "point cloud"},
                        {"name", part.name ? Json(*part.name) : Json()},
                        {"points", part.positions.size()},
                        {"faces", part.faceCount()},
                        {"corners", part.corners.size()}};
-            parts.push_back(std::move(entry));
-            objects.push_back(makeObject(std::move(part)));
+            result.parts.push_back(std::move(entry));
+            result.objects.push_back(makeObject(std::move(part)));
         }
+        return result;
+    }
+
+    Imported importVolumes(std::string const& path)
+    {
+        auto file = readVdb(path);
+        Imported result;
+        result.leftOut = std::move(file.leftOut);
+        for (auto const& object : file.objects) {
+            auto const kind = std::string(nameOf(kindOf(*object)));
+            auto const name = std::string(getPropertyAs<Nexil::String>(*object, "name").view());
+            auto const elements = Geometry::getElementCount(*object, Geometry::sVoxelComp);
+            result.report += fmt::format("  {}{}: {}\n", kind, name.empty() ? "" : " " + inQuotes(name),
+                                         counted(elements, "element"));
+            result.parts.push_back(
+                {{"kind", kind}, {"name", name.empty() ? Json() : Json(name)}, {"elements", elements}});
+        }
+        result.objects = std::move(file.objects);
+        return result;
+    }
+
+    ExitCode runImport(Options const& options)
+    {
+        checkIsOtherFile(options.input, options.output);
+        auto const [objects, leftOut, report, parts] =
+            fileEnding(options.input) == ".vdb" ? importVolumes(options.input) : importMeshes(options.input);
+        for (auto const& text : leftOut)
+            warn(fmt::format("{}: not kept: {}", options.input, text));
         writeZon(objects, options.output, options.level);
         std::error_code isNoFile; // a pipe or a device has no size
         auto const size = std::filesystem::file_size(options.output, isNoFile);
         std::uint64_t const bytes = isNoFile ? 0 : size;
         if (options.wantsJson) {
             Json const json{{"input", options.input}, {"output", options.output}, {"level", options.level},
-                            {"objects", parts},       {"not_kept", file.leftOut}, {"bytes", bytes}};
+                            {"objects", parts},       {"not_kept", leftOut},      {"bytes", bytes}};
             fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
         } else {
             fmt::print("{}: {}, {}\n{}", options.output, counted(objects.size(), "object"), byteText(bytes), report);
@@ -87,8 +123,8 @@ namespace {
 void addImport(CLI::App& app, Run& run)
 {
     auto const options = std::make_shared<Options>();
-    auto* const command = app.add_subcommand("import", "Turns a mesh file into a zon file");
-    command->add_option("mesh", options->input, "File to read: .obj, .off, .ply or .stl")->required();
+    auto* const command = app.add_subcommand("import", "Turns a mesh file or a volume file into a zon file");
+    command->add_option("file", options->input, "File to read: .obj, .off, .ply, .stl or .vdb")->required();
     command->add_option("out", options->output, "zon file to write")->required();
     command->add_option("--level", options->level, "Compression: 0 none, 1 quickest to 9 smallest")
         ->check(CLI::Range(0, 9))

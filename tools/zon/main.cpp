@@ -54,6 +54,7 @@ int main(int argumentCount, char** arguments)
     addDiagnose(app, run);
     addStrands(app, run);
     addValidate(app, run);
+    addVolume(app, run);
     try {
         app.parse(argumentCount, arguments);
     } catch (CLI::ParseError const& wrongUsage) {

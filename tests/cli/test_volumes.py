@@ -1,0 +1,187 @@
+"""Volumes from and to VDB files, what is told of them, and level sets of meshes and points."""
+import math
+import pathlib
+import random
+import struct
+import sys
+import unittest
+
+import tool
+
+sys.path.append(str(pathlib.Path(__file__).resolve().parents[1] / "zon_reader"))
+import make_streams as zon  # noqa: E402
+
+try:
+    import pyopenvdb as vdb
+except ImportError:
+    vdb = None
+
+needs_vdb = unittest.skipUnless(vdb, "python3-openvdb is not there")
+FAR = 1 << 30
+
+
+def active_values(grid):
+    """Every active voxel with its value, tiles taken apart."""
+    values = {}
+    for each in grid.iterOnValues():
+        for x in range(each.min[0], each.max[0] + 1):
+            for y in range(each.min[1], each.max[1] + 1):
+                for z in range(each.min[2], each.max[2] + 1):
+                    values[x, y, z] = each.value
+    return values
+
+
+def scattered(grid, value):
+    """A grid with voxels all over space, active tiles, and states that do not follow from the values."""
+    draw = random.Random(5)
+    accessor = grid.getAccessor()
+    for centre in ((0, 0, 0), (-FAR, FAR, -FAR), (FAR, -FAR, 77)):
+        for _ in range(300):
+            accessor.setValueOn(tuple(c + draw.randrange(-20, 20) for c in centre), value(draw))
+    grid.fill((-16, -40, 8), (15, -9, 23), value(draw), active=True)
+    grid.fill((64, 64, 64), (71, 71, 71), value(draw), active=False)
+    accessor.setValueOn((3, 3, 300), grid.background)
+    accessor.setValueOff((4, 3, 300), value(draw))
+    return grid
+
+
+class Volumes(tool.ToolTest):
+    def setUp(self):
+        super().setUp()
+        if "built without OpenVDB" in self.zon("import", "none.vdb", "none.zon", code=2).stderr:
+            self.skipTest("the program was built without OpenVDB")
+
+    def write_grids(self, name, *grids):
+        vdb.write(str(self.folder / name), grids=list(grids))
+
+    def read_grids(self, name):
+        return {grid.name: grid for grid in vdb.readAll(str(self.folder / name))[0]}
+
+    @needs_vdb
+    def test_grids_come_back_with_the_same_active_values(self):
+        grids = [scattered(vdb.FloatGrid(0.25), lambda draw: draw.randrange(1, 99) / 8),
+                 scattered(vdb.Vec3SGrid((0.0, 0.0, 1.0)), lambda draw: (draw.randrange(9) / 2, 1.0, -2.5)),
+                 scattered(vdb.BoolGrid(False), lambda draw: draw.random() < 0.5)]
+        for grid, name in zip(grids, ("heat", "wind", "component")):
+            grid.name = name
+        grids[1].transform = vdb.createLinearTransform(0.1)
+        grids[1].transform.translate((1.5, -2.25, 1e-3))
+        self.write_grids("a.vdb", *grids)
+        imported = self.zon("import", "a.vdb", "a.zon")
+        self.assertIn("grid 'wind': its translation, but as vdb_transform", imported.stderr)
+        self.zon("verify", "a.zon")
+        self.zon("export", "a.zon", "b.vdb")
+        back = self.read_grids("b.vdb")
+        self.assertEqual(set(back), {"heat", "wind", "component"})
+        for grid in grids:
+            same = back[grid.name]
+            self.assertEqual(active_values(same), active_values(grid), grid.name)
+            self.assertEqual((same.background, same.gridClass), (grid.background, grid.gridClass))
+            self.assertEqual(same.getConstAccessor().getValue((66, 66, 66)),
+                             grid.getConstAccessor().getValue((66, 66, 66)), "values that are not active stay, too")
+            for voxel in ((0, 0, 0), (7, -3, 1000)):
+                self.assertEqual(same.transform.indexToWorld(voxel), grid.transform.indexToWorld(voxel), grid.name)
+
+    @needs_vdb
+    def test_classes_become_the_channels_of_their_kind(self):
+        sphere = vdb.createLevelSetSphere(radius=10, center=(2, 0, 0), voxelSize=0.5)
+        sphere.name = "ball"
+        fog = vdb.FloatGrid()
+        fog.fill((0, 0, 0), (4, 9, 19), 0.5)
+        fog.name, fog.gridClass = "smoke", "fog volume"
+        self.write_grids("a.vdb", sphere, fog)
+        self.zon("import", "a.vdb", "a.zon")
+        kinds = [(kind, set(properties)) for kind, properties, _ in self.objects("a.zon")]
+        # No channel of states: they follow from the values.
+        self.assertEqual(kinds, [
+            ("level set", {"voxel_tile_tree", "voxel_signed_distance", "name", "vdb_transform"}),
+            ("fog volume", {"voxel_tile_tree", "voxel_fog_density", "name", "vdb_transform"})])
+        ball, smoke = self.json("volume", "bounds", "a.zon")["objects"]
+        for low, high, centre in zip(ball["min"], ball["max"], (2, 0, 0)):
+            self.assertLess(abs(low - centre + 10), 1.01)
+            self.assertLess(abs(high - centre - 10), 1.01)
+        self.assertEqual(smoke, {"min": [0, 0, 0], "max": [5, 10, 20]})
+        self.assertEqual(self.zon("validate", "a.zon").stdout.count("valid"), 2)
+
+    @needs_vdb
+    def test_what_a_volume_does_not_hold_is_refused_by_name(self):
+        good, stretched, huge = vdb.FloatGrid(), vdb.FloatGrid(), vdb.FloatGrid()
+        good.fill((0, 0, 0), (0, 0, 0), 1.0)
+        good.name, stretched.name, huge.name = "good", "stretched", "huge"
+        stretched.transform = vdb.createLinearTransform([[1, 0, 0, 0], [0, 2, 0, 0], [0, 0, 1, 0], [0, 0, 0, 1]])
+        huge.fill((0, 0, 0), (8191, 8191, 8191), 1.0)
+        self.write_grids("a.vdb", good, stretched, huge)
+        said = self.zon("import", "a.vdb", "a.zon").stderr
+        self.assertIn("grid 'stretched': its transform is not one positive scale and a translation", said)
+        self.assertIn("grid 'huge': it has more voxels than a volume holds", said)
+        self.assertEqual(len(self.objects("a.zon")), 1)
+        self.write_grids("b.vdb", stretched)
+        self.assertIn("there is no grid in it that a zon file holds", self.zon("import", "b.vdb", "b.zon", code=2).stderr)
+        self.write("cut.vdb", (self.folder / "a.vdb").read_bytes()[:500])
+        self.assertIn("cut.vdb", self.zon("import", "cut.vdb", "cut.zon", code=2).stderr)
+        self.assertNotIn("cut.zon", self.names())
+
+    def test_channels_of_all_types_and_both_configurations_are_written(self):
+        def channel(name, code, memory, default):
+            data = zon.blob(memory, len(memory) // 208, 0)
+            return name, zon.channel(name, "voxel_tile_tree", zon.SMALL, code, data, default)
+
+        volume = zon.small_volume()
+        numbers = [i % 7 for i in range(208)]
+        parts = [*volume.items(),
+                 channel("ints", 6, struct.pack("<208i", *numbers), zon.pack(0)),
+                 channel("doubles", 9, struct.pack("<208d", *numbers), zon.pack(0.0)),
+                 channel("pairs", 20, struct.pack("<416f", *numbers, *numbers),
+                         zon.seq(zon.pack(1), zon.seq(zon.pack(bytes(8)))))]
+        self.write("a.zon", zon.stream([zon.frame(362, zon.obj(*parts)), zon.frame(362, zon.full_volume(0))]))
+        said = self.zon("export", "a.zon", "a.vdb").stderr
+        self.assertIn("object 0: pairs: array<Math::float2>", said)
+        self.assertIn("object 1: points: points", said)
+        self.assertIn("object 1: other", said)
+        self.zon("import", "a.vdb", "b.zon")
+        expected = sorted(str(n) for n in numbers[:192] if n)
+        for number, name in ((1, "voxel_ints"), (2, "voxel_doubles")):
+            values = [v for v in self.dumped("b.zon", name, "data").split(", ") if v not in ("0", "0.0")]
+            # Cells hold the last 16 of the 208; those without a leaf tile stand for 64 voxels each.
+            self.assertGreaterEqual(len(values), len(expected), name)
+        # What was written once is written the same again.
+        self.zon("export", "b.zon", "b.vdb")
+        self.zon("import", "b.vdb", "c.zon")
+        self.assertEqual(self.zon("diff", "b.zon", "c.zon").stdout.strip(), "equal")
+
+    def test_meshes_become_level_sets_with_the_same_box(self):
+        self.zon("make", "cube", "cube.zon", "--size", "2")
+        self.zon("volume", "from-mesh", "cube.zon", "solid.zon", "--voxel-size", "0.125")
+        (box,) = self.json("volume", "bounds", "solid.zon")["objects"]
+        for low, high in zip(box["min"], box["max"]):
+            self.assertLessEqual(abs(low + 1), 0.125)
+            self.assertLessEqual(abs(high - 1), 0.125)
+        (kind, _, _), = self.objects("solid.zon")
+        self.assertEqual(kind, "level set")
+        (volume,) = self.json("volume", "info", "solid.zon")["objects"]
+        self.assertTrue(volume["containers"][0]["consistent"])
+        self.zon("make", "plane", "plane.zon")
+        said = self.zon("volume", "from-mesh", "plane.zon", "open.zon", "--voxel-size", "0.1").stderr
+        self.assertIn("object 0: its surface is not closed: 4 boundary edges", said)
+        self.zon("volume", "from-mesh", "solid.zon", "x.zon", "--voxel-size", "0.1", code=2)
+        for size in ("0", "-1", "nan", "inf", "x"):
+            self.zon("volume", "from-mesh", "cube.zon", "x.zon", f"--voxel-size={size}", code=2)
+        self.assertNotIn("x.zon", self.names())
+
+
+class VolumesOfPoints(tool.ToolTest):
+    def test_points_become_spheres(self):
+        self.write("two.obj", "v 0 0 0\nv 5 0 0\n")
+        self.zon("import", "two.obj", "two.zon")
+        self.zon("volume", "from-points", "two.zon", "balls.zon", "--radius", "1", "--voxel-size", "0.1")
+        (box,) = self.json("volume", "bounds", "balls.zon")["objects"]
+        for found, wanted in zip(box["min"] + box["max"], (-1, -1, -1, 6, 1, 1)):
+            self.assertTrue(math.isclose(found, wanted, abs_tol=0.1001), box)
+        self.assertEqual(self.json("volume", "bounds", "two.zon")["objects"], [{"min": [0, 0, 0], "max": [5, 0, 0]}])
+        said = self.zon("volume", "info", "two.zon").stdout
+        self.assertEqual(said, "object 0: no volume\n")
+        self.zon("volume", "from-points", "two.zon", "x.zon", "--radius", "1e9", "--voxel-size", "1e-9", code=2)
+
+
+if __name__ == "__main__":
+    tool.main()

@@ -1,0 +1,297 @@
+#include "Command.h"
+#include "Console.h"
+#include "GeoValues.h"
+#include "ValueRows.h"
+#include "VdbFile.h"
+#include "VolumeParts.h"
+#include "Working.h"
+#include "ZonFile.h"
+
+#include <veldrin/algorithms/MeshInvariants.h>
+#include <veldrin/geometry/Prototypes.h>
+#include <veldrin/math/BBox.h>
+#include <veldrin/volume/VolumeBounds.h>
+#include <vld/BuildFromPoints.h>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+#include <cmath>
+#include <memory>
+
+namespace Zon {
+
+namespace {
+
+    using namespace Veldrin;
+    using namespace VLD::TileTree3D;
+    using Json = nlohmann::ordered_json;
+    using Box = Math::bbox<Math::float3, float>;
+
+    struct ReportOptions {
+        std::string input;
+        bool wantsJson = false;
+    };
+
+    struct MakeOptions {
+        std::string input;
+        std::string output;
+        int level = 9;
+        float voxelSize = 0;
+        float radius = 0;
+        float halfBand = 3;
+    };
+
+    // ------------------------------------------------------------------------------------------------- reports
+
+    template <class Traits>
+    Json describe(VLD::Object const& volume, Container<Traits> const& container)
+    {
+        VoxelTopology<Traits> const& topology = *container.topology();
+        auto const parameters = Traits::parameters();
+        Json channels = Json::array();
+        std::uint64_t channelBytes = 0;
+        for (auto const& channel : channelsOf(volume, container)) {
+            auto const bytes = decodedBytes(channel->data());
+            channelBytes += bytes;
+            channels.push_back({{"name", channel->name().view()},
+                                {"type", typeName(channel->defaultValue())},
+                                {"elements", channel->elementCount()},
+                                {"bytes", bytes}});
+        }
+        return {{"name", container.name().view()},
+                {"topology", container.topologyName().view()},
+                {"tile_width", parameters.tileWidth},
+                {"data_width", parameters.dataWidth},
+                {"voxel_size", container.voxelSize()},
+                {"leaf_tiles", topology.leafCount()},
+                {"inner_tiles", topology.innerCount()},
+                {"voxels", topology.voxelCount()},
+                {"elements", topology.elementCount()},
+                {"tile_bytes", topology.byteSize()},
+                {"channel_bytes", channelBytes},
+                {"consistent", container.checkConsistency(false)},
+                {"channels", channels}};
+    }
+
+    Json describe(Object const& object)
+    {
+        auto const volume = Geometry::shallow_copy_object_to_vld_volume(object);
+        Json containers = Json::array();
+        if (volume)
+            forEachContainer(*volume,
+                             [&](auto const& container) { containers.push_back(describe(*volume, container)); });
+        return {{"is_volume", !containers.empty()}, {"containers", containers}};
+    }
+
+    void print(Json const& container)
+    {
+        auto const text = [&](char const* key) { return printable(container[key].get<std::string>()); };
+        auto const number = [&](char const* key) { return container[key].get<std::uint64_t>(); };
+        fmt::print("    {} over {}: tiles of {} x {} voxels along each axis, voxel size {}\n", text("name"),
+                   text("topology"), number("tile_width"), number("data_width"), container["voxel_size"].get<float>());
+        fmt::print("        {} with {} in all, {}, {}\n", counted(number("leaf_tiles"), "leaf tile"),
+                   counted(number("voxels"), "voxel"), counted(number("inner_tiles"), "inner tile"),
+                   container["consistent"].get<bool>() ? "consistent" : "NOT consistent");
+        fmt::print("        {} for tiles, {} for values\n", byteText(number("tile_bytes")),
+                   byteText(number("channel_bytes")));
+        for (auto const& channel : container["channels"])
+            fmt::print("        channel {}: {}, {}\n", printable(channel["name"].get<std::string>()),
+                       channel["type"].get<std::string>(),
+                       counted(channel["elements"].get<std::uint64_t>(), "element"));
+    }
+
+    ExitCode runInfo(ReportOptions const& options)
+    {
+        auto const objects = readZon(options.input);
+        Json list = Json::array();
+        for (auto const& object : objects)
+            list.push_back(object ? describe(*object) : Json{{"is_volume", false}, {"containers", Json::array()}});
+        if (options.wantsJson) {
+            Json const json{{"file", options.input}, {"objects", list}};
+            fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
+            return kDone;
+        }
+        for (std::size_t i = 0; i < list.size(); ++i) {
+            fmt::print("object {}: {}\n", i, list[i]["is_volume"].get<bool>() ? "volume" : "no volume");
+            for (auto const& container : list[i]["containers"])
+                print(container);
+        }
+        return kDone;
+    }
+
+    /// The box around the content of a volume, or around the points of anything else.
+    Box boundsOf(Object const& object)
+    {
+        Box box;
+        GeometryAlgorithms::getVolumeBounds(object, box);
+        if (box.isEmpty())
+            if (auto const points = dataOf<Math::float3>(object, Geometry::sPointPosition))
+                for (auto const& point : *points)
+                    box.extend(point);
+        return box;
+    }
+
+    ExitCode runBounds(ReportOptions const& options)
+    {
+        auto const objects = readZon(options.input);
+        Json list = Json::array();
+        for (std::uint64_t i = 0; i < objects.size(); ++i) {
+            Box const box = objects[i] ? boundsOf(*objects[i]) : Box();
+            if (options.wantsJson) {
+                auto const corner = [](Math::float3 const& c) { return Json{c.x, c.y, c.z}; };
+                list.push_back(box.isEmpty() ? Json{{"min", nullptr}, {"max", nullptr}}
+                                             : Json{{"min", corner(box.min)}, {"max", corner(box.max)}});
+            } else if (box.isEmpty()) {
+                fmt::print("object {}: nothing in it\n", i);
+            } else {
+                auto const size = box.max - box.min;
+                fmt::print("object {}: {} {} {} to {} {} {}, size {} {} {}\n", i, box.min.x, box.min.y, box.min.z,
+                           box.max.x, box.max.y, box.max.z, size.x, size.y, size.z);
+            }
+        }
+        if (options.wantsJson) {
+            Json const json{{"file", options.input}, {"objects", list}};
+            fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
+        }
+        return kDone;
+    }
+
+    // ------------------------------------------------------------------------------------------------- makers
+
+    /// The faces of a mesh as fans of triangles; throws Failure for what is no mesh of sound indices.
+    Nexil::Array<unsigned int> trianglesOf(Object const& mesh, std::string const& place)
+    {
+        auto const corners = dataOf<unsigned int>(mesh, Geometry::sFaceVertex);
+        auto const offsets = dataOf<unsigned int>(mesh, Geometry::sFaceOffset);
+        auto const positions = dataOf<Math::float3>(mesh, Geometry::sPointPosition);
+        if (!corners || !offsets || !positions || offsets->size() < 2)
+            throw Failure(place + "there is no mesh with faces");
+        Nexil::Array<unsigned int> triangles;
+        triangles.reserve(corners->size() * 3);
+        for (std::uint64_t face = 0; face + 1 < offsets->size(); ++face) {
+            if ((*offsets)[face] > (*offsets)[face + 1] || (*offsets)[face + 1] > corners->size())
+                throw Failure(place + "the corners of its faces do not fit together");
+            for (std::uint64_t i = (*offsets)[face] + 2ull; i < (*offsets)[face + 1]; ++i)
+                for (std::uint64_t const corner : {std::uint64_t((*offsets)[face]), i - 1, i}) {
+                    if ((*corners)[corner] >= positions->size())
+                        throw Failure(place + "a face has a corner at no point");
+                    triangles.push_back((*corners)[corner]);
+                }
+        }
+        for (auto const& p : *positions)
+            if (!std::isfinite(p.x) || !std::isfinite(p.y) || !std::isfinite(p.z))
+                throw Failure(place + "a position is no finite number");
+        return triangles;
+    }
+
+    Nexil::Ptr<Object> fromMesh(Object const& mesh, std::string const& place, MakeOptions const& options)
+    {
+        auto const triangles = trianglesOf(mesh, place);
+        std::uint64_t openEdges = 0;
+        Geometry::Mesh::HalfEdgeDataStructure const edges(mesh);
+        edges.forEachEdge(0, edges.pointCount(), [&](Geometry::Mesh::HalfEdgeDataStructure::Edge const& edge) {
+            openEdges += edge.isBoundary() ? 1 : 0;
+        });
+        if (openEdges != 0)
+            warn(fmt::format("{}its surface is not closed: {}; where a hole is wider than a voxel there is no inside",
+                             place, counted(openEdges, "boundary edge")));
+        return levelSetOfMesh(*dataOf<Math::float3>(mesh, Geometry::sPointPosition), triangles, options.voxelSize,
+                              options.halfBand);
+    }
+
+    Nexil::Ptr<Object> fromPoints(Object const& cloud, std::string const& place, MakeOptions const& options)
+    {
+        auto const positions = dataOf<Math::float3>(cloud, Geometry::sPointPosition);
+        if (!positions || positions->empty())
+            throw Failure(place + "there are no points");
+        GridDescription const description{.channelName = Geometry::sVoxelSignedDistance,
+                                          .voxelSize = options.voxelSize};
+        auto const grid = buildLevelSetFromPoints<SmallTiles>(description, *positions, {options.radius},
+                                                              options.halfBand * options.voxelSize);
+        auto volume = VLD::createObject();
+        if (!grid.addTo(*volume))
+            throw Failure(place + "the spheres have more voxels than a volume holds");
+        return Geometry::move_vld_volume_to_object(*volume);
+    }
+
+    /// Turns every object of a file into a volume; its "name" stays.
+    template <class Make>
+    ExitCode runMake(MakeOptions const& options, Make const& make)
+    {
+        auto objects = readZon(options.input);
+        {
+            Working const working("making volumes");
+            editEach(objects, [&](std::uint64_t number, Nexil::Ptr<Object>& object) {
+                auto const name = getPropertyAs<Nexil::String>(*object, "name");
+                Nexil::MutablePtr<Object> made(
+                    make(*object, fmt::format("{}: object {}: ", options.input, number), options));
+                if (!name.empty())
+                    setProperty(*made, "name", name);
+                object = std::move(made);
+            });
+        }
+        writeZon(objects, options.output, options.level);
+        return kDone;
+    }
+
+    // ------------------------------------------------------------------------------------------------- options
+
+    template <class RunReport>
+    void addReport(CLI::App& volume, Run& run, char const* name, char const* description, RunReport const& runReport)
+    {
+        auto const options = std::make_shared<ReportOptions>();
+        auto* const command = volume.add_subcommand(name, description);
+        command->add_option("file", options->input, "zon file")->required();
+        command->add_flag("--json", options->wantsJson, "Report as JSON on stdout");
+        command->callback([options, runReport, &run] { run = [options, runReport] { return runReport(*options); }; });
+    }
+
+    std::string checkPositive(std::string const& text)
+    {
+        float value = 0;
+        return CLI::detail::lexical_cast(text, value) && std::isfinite(value) && value > 0
+                   ? ""
+                   : text + " is no finite number above 0";
+    }
+
+    template <class Make>
+    void addMaker(CLI::App& volume, Run& run, char const* name, char const* description, bool hasRadius,
+                  Make const& make)
+    {
+        auto const options = std::make_shared<MakeOptions>();
+        auto* const command = volume.add_subcommand(name, description);
+        command->add_option("in", options->input, "zon file; each of its objects becomes a volume")->required();
+        command->add_option("out", options->output, "zon file to write")->required();
+        command->add_option("--voxel-size", options->voxelSize, "Edge length of a voxel")
+            ->required()
+            ->check(checkPositive);
+        if (hasRadius)
+            command->add_option("--radius", options->radius, "Radius of the sphere around each point")
+                ->required()
+                ->check(checkPositive);
+        command->add_option("--band", options->halfBand, "Voxels to each side of the surface that have a distance")
+            ->check(checkPositive)
+            ->capture_default_str();
+        command->add_option("--level", options->level, "Compression: 0 none, 1 quickest to 9 smallest")
+            ->check(CLI::Range(0, 9))
+            ->capture_default_str();
+        command->callback([options, make, &run] { run = [options, make] { return runMake(*options, make); }; });
+    }
+
+} // namespace
+
+void addVolume(CLI::App& app, Run& run)
+{
+    auto* const volume = app.add_subcommand("volume", "Measures sparse volumes, and makes level sets");
+    volume->require_subcommand(1);
+    addReport(*volume, run, "info", "Tells of the tiles and channels of volumes", runInfo);
+    addReport(*volume, run, "bounds", "Tells the box around what is in volumes, and around the points of other objects",
+              runBounds);
+    addMaker(*volume, run, "from-mesh", "Level sets of closed meshes", false, fromMesh);
+    addMaker(*volume, run, "from-points", "Level sets of spheres around points", true, fromPoints);
+}
+
+} // namespace Zon
