@@ -13,7 +13,7 @@
 
 #include <cstring>
 
-// The volume library by itself, in both configurations, on 1 and 2 threads: `threads` says how many. The copy of the bytes
+// The volume library by itself, in both configurations, on 1 and 2 threads: the first number says how many. The copy of the bytes
 // of a channel is the limit of what looks at all of them.
 namespace {
 
@@ -180,19 +180,13 @@ void convertBothWays(benchmark::State& state)
     }
 }
 
-#define BOTH_CONFIGURATIONS(name)                                                            \
-    BENCHMARK_TEMPLATE(name, SmallTiles)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime(); \
-    BENCHMARK_TEMPLATE(name, WideTiles)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime()
+#define BOTH_CONFIGURATIONS(name)                                        \
+    BENCHMARK_TEMPLATE(name, SmallTiles)->Arg(1)->Arg(2)->UseRealTime(); \
+    BENCHMARK_TEMPLATE(name, WideTiles)->Arg(1)->Arg(2)->UseRealTime()
 
 BOTH_CONFIGURATIONS(buildSphere);
-BENCHMARK_TEMPLATE(buildFromVoxelList, SmallTiles)
-    ->ArgNames({"threads", "shuffled"})
-    ->ArgsProduct({{1, 2}, {0, 1}})
-    ->UseRealTime();
-BENCHMARK_TEMPLATE(buildFromVoxelList, WideTiles)
-    ->ArgNames({"threads", "shuffled"})
-    ->ArgsProduct({{1, 2}, {0, 1}})
-    ->UseRealTime();
+BENCHMARK_TEMPLATE(buildFromVoxelList, SmallTiles)->ArgsProduct({{1, 2}, {0, 1}})->UseRealTime();
+BENCHMARK_TEMPLATE(buildFromVoxelList, WideTiles)->ArgsProduct({{1, 2}, {0, 1}})->UseRealTime();
 BOTH_CONFIGURATIONS(buildFromDenseBox);
 BOTH_CONFIGURATIONS(rasterisePoints);
 BENCHMARK_TEMPLATE(visitEveryVoxel, SmallTiles);
@@ -201,7 +195,7 @@ BENCHMARK_TEMPLATE(readAtRandom, SmallTiles);
 BENCHMARK_TEMPLATE(readAtRandom, WideTiles);
 BOTH_CONFIGURATIONS(boundsOfContent);
 BOTH_CONFIGURATIONS(boundsOfContentAtTheEnd);
-BENCHMARK_TEMPLATE(convertBothWays, SmallTiles)->ArgName("radius")->Arg(5)->Arg(125);
-BENCHMARK_TEMPLATE(convertBothWays, WideTiles)->ArgName("radius")->Arg(5)->Arg(125);
+BENCHMARK_TEMPLATE(convertBothWays, SmallTiles)->Arg(5)->Arg(125);
+BENCHMARK_TEMPLATE(convertBothWays, WideTiles)->Arg(5)->Arg(125);
 
 } // namespace

@@ -80,7 +80,8 @@ class Volumes(tool.ToolTest):
             self.assertEqual(same.getConstAccessor().getValue((66, 66, 66)),
                              grid.getConstAccessor().getValue((66, 66, 66)), "values that are not active stay, too")
             for voxel in ((0, 0, 0), (7, -3, 1000)):
-                self.assertEqual(same.transform.indexToWorld(voxel), grid.transform.indexToWorld(voxel), grid.name)
+                for got, wanted in zip(same.transform.indexToWorld(voxel), grid.transform.indexToWorld(voxel)):
+                    self.assertAlmostEqual(got, wanted, places=10, msg=grid.name)
 
     @needs_vdb
     def test_classes_become_the_channels_of_their_kind(self):

@@ -159,7 +159,7 @@ namespace {
     {
         if (!transform.isLinear())
             return std::nullopt;
-        // From the map itself: the numbers of its matrix are rounded once more.
+        // Of the map itself, as its matrix is the product of several in some maps.
         auto const origin = transform.indexToWorld(openvdb::Vec3d(0));
         Placement const placement{{origin.x(), origin.y(), origin.z()}, transform.voxelSize().x()};
         auto const size = static_cast<float>(placement.voxelSize);
@@ -177,7 +177,7 @@ namespace {
     openvdb::math::Transform::Ptr transformOf(Placement const& placement)
     {
         auto const& t = placement.translation;
-        // Made whole, as moving a transform rounds its scale.
+        // A scale, and behind it a translation: x * voxelSize + t.
         openvdb::math::MapBase::Ptr const map =
             std::make_shared<openvdb::math::UniformScaleTranslateMap>(placement.voxelSize, openvdb::Vec3d(t));
         return std::make_shared<openvdb::math::Transform>(map);

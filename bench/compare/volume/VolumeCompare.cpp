@@ -1,6 +1,8 @@
 #include <vld/Spheres.h>
 
+#include <veldrin/io/ObjectStream.h>
 #include <veldrin/volume/VolumeBounds.h>
+#include <veldrin/volume/VolumeConversion.h>
 #include <vld/Accessor.h>
 #include <vld/BuildFromValues.h>
 
@@ -9,7 +11,16 @@
 
 #include <benchmark/benchmark.h>
 
+#include <blosc.h>
 #include <tbb/global_control.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <memory>
+#include <string>
+#include <thread>
+#include <vector>
 
 // A level set of a sphere of radius 125 with three voxels of band to each side: made, measured, visited and read, by our tile
 // trees and by the peer's trees, each on 1 and 2 threads where it is parallel. `held` is the number of voxels a side keeps
@@ -188,6 +199,161 @@ void readPeer(benchmark::State& state)
     }
 }
 
+std::string filePath(char const* name)
+{
+    char const* const folder = std::getenv("TMPDIR");
+    return std::string(folder ? folder : "/tmp") + "/veldrin_compare_" + name;
+}
+
+/// Of the file, in the page cache.
+void countFile(benchmark::State& state, std::string const& path)
+{
+    state.counters["file MB"] = static_cast<double>(std::filesystem::file_size(path)) / 1e6;
+    std::filesystem::remove(path);
+}
+
+using Objects = Nexil::Array<Nexil::Ptr<Veldrin::Object>>;
+
+template <class Traits>
+Objects sphereAsGeometry()
+{
+    auto volume = VLD::createObject();
+    bench::sphere<Traits>(kRadius).addTo(*volume);
+    return {Nexil::Ptr<Veldrin::Object>(Veldrin::Geometry::move_vld_volume_to_object(*volume))};
+}
+
+// The compressors of both sides start threads of their own: `taskset -c 0` measures what one core does.
+
+template <class Traits>
+void saveOurs(benchmark::State& state)
+{
+    auto const path = filePath("volume.zon");
+    auto const objects = sphereAsGeometry<Traits>();
+    Veldrin::IO::SerializationOptions options;
+    options.compressionLevel = static_cast<int>(state.range(0));
+    for (auto _ : state)
+        if (!Veldrin::IO::serialize(objects, path.c_str(), options, nullptr))
+            state.SkipWithError("not written");
+    countFile(state, path);
+}
+
+void savePeer(benchmark::State& state)
+{
+    auto const path = filePath("volume.vdb");
+    openvdb::GridPtrVec const grids{peerSphere()};
+    for (auto _ : state) {
+        openvdb::io::File file(path);
+        file.setCompression(openvdb::io::COMPRESS_BLOSC | openvdb::io::COMPRESS_ACTIVE_MASK);
+        file.write(grids);
+        file.close();
+    }
+    countFile(state, path);
+}
+
+template <class Traits>
+void loadOurs(benchmark::State& state)
+{
+    auto const path = filePath("volume.zon");
+    Veldrin::IO::SerializationOptions options;
+    options.compressionLevel = static_cast<int>(state.range(0));
+    Veldrin::IO::serialize(sphereAsGeometry<Traits>(), path.c_str(), options, nullptr);
+    for (auto _ : state) {
+        Objects objects;
+        if (!Veldrin::IO::deserialize(path.c_str(), objects, {}, nullptr) ||
+            !Veldrin::Geometry::shallow_copy_object_to_vld_volume(*objects[0]))
+            state.SkipWithError("not read");
+    }
+    countFile(state, path);
+}
+
+void loadPeer(benchmark::State& state)
+{
+    auto const path = filePath("volume.vdb");
+    {
+        openvdb::io::File file(path);
+        file.setCompression(openvdb::io::COMPRESS_BLOSC | openvdb::io::COMPRESS_ACTIVE_MASK);
+        file.write(openvdb::GridPtrVec{peerSphere()});
+    }
+    for (auto _ : state) {
+        openvdb::io::File file(path);
+        file.open(false);
+        benchmark::DoNotOptimize(file.getGrids());
+    }
+    countFile(state, path);
+}
+
+/// An array of a volume as bytes.
+struct Part {
+    void const* bytes;
+    std::size_t size;
+    std::size_t elementSize;
+};
+
+template <class Traits>
+std::vector<Part> partsOf(Grid<Traits> const& grid)
+{
+    auto part = [](auto const& array) { return Part{array.data(), array.size() * sizeof(array[0]), sizeof(array[0])}; };
+    return {part(grid.topology->leafOrigins()), part(grid.topology->leafParents()), part(grid.topology->innerOrigins()),
+            part(grid.topology->innerChildren()), part(*grid.channel->template values<float>())};
+}
+
+std::vector<char> compressed(Part const& part, int level)
+{
+    std::vector<char> target(part.size + BLOSC_MAX_OVERHEAD);
+    int const size = blosc_compress_ctx(level, BLOSC_SHUFFLE, part.elementSize, part.size, part.bytes, target.data(),
+                                        target.size(), "lz4", 0, static_cast<int>(std::thread::hardware_concurrency()));
+    target.resize(static_cast<std::size_t>(size));
+    return target;
+}
+
+/// The compressor alone on the same arrays, each result written plainly: the limit of our saving.
+template <class Traits>
+void saveBare(benchmark::State& state)
+{
+    auto const path = filePath("volume.blosc");
+    auto const grid = bench::sphere<Traits>(kRadius);
+    for (auto _ : state) {
+        std::ofstream file(path, std::ios::binary);
+        for (Part const& part : partsOf(grid)) {
+            auto const bytes = compressed(part, static_cast<int>(state.range(0)));
+            file.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+        }
+    }
+    countFile(state, path);
+}
+
+/// Plain reads, each decompressed into fresh memory: the limit of our loading.
+template <class Traits>
+void loadBare(benchmark::State& state)
+{
+    auto const path = filePath("volume.blosc");
+    auto const grid = bench::sphere<Traits>(kRadius);
+    auto const parts = partsOf(grid);
+    std::vector<std::size_t> sizes;
+    {
+        std::ofstream file(path, std::ios::binary);
+        for (Part const& part : parts) {
+            auto const bytes = compressed(part, static_cast<int>(state.range(0)));
+            sizes.push_back(bytes.size());
+            file.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+        }
+    }
+    for (auto _ : state) {
+        std::ifstream file(path, std::ios::binary);
+        std::vector<std::unique_ptr<char[]>> targets;
+        for (std::size_t i = 0; i < parts.size(); ++i) {
+            std::unique_ptr<char[]> const packed(new char[sizes[i]]);
+            file.read(packed.get(), static_cast<std::streamsize>(sizes[i]));
+            targets.emplace_back(new char[parts[i].size]);
+            if (blosc_decompress_ctx(packed.get(), targets.back().get(), parts[i].size,
+                                     static_cast<int>(std::thread::hardware_concurrency())) < 0)
+                state.SkipWithError("not decompressed");
+        }
+        benchmark::DoNotOptimize(targets.data());
+    }
+    countFile(state, path);
+}
+
 /// Both sides hold the same distances, or nothing here compares anything.
 bool isSameSphere()
 {
@@ -218,6 +384,16 @@ VELDRIN_SIDES(bounds);
 BENCHMARK(visitPeer);
 BENCHMARK_TEMPLATE(visitOurs, SmallTiles);
 BENCHMARK_TEMPLATE(visitOurs, WideTiles);
+#define VELDRIN_FILES(name)                                                                \
+    BENCHMARK_TEMPLATE(name, SmallTiles)->ArgName("level")->Arg(1)->Arg(9)->UseRealTime(); \
+    BENCHMARK_TEMPLATE(name, WideTiles)->ArgName("level")->Arg(1)->Arg(9)->UseRealTime()
+
+BENCHMARK(savePeer)->UseRealTime();
+VELDRIN_FILES(saveOurs);
+VELDRIN_FILES(saveBare);
+BENCHMARK(loadPeer)->UseRealTime();
+VELDRIN_FILES(loadOurs);
+VELDRIN_FILES(loadBare);
 BENCHMARK(readPeer);
 BENCHMARK_TEMPLATE(readOurs, SmallTiles);
 BENCHMARK_TEMPLATE(readOurs, WideTiles);
