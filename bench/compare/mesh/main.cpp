@@ -4,19 +4,24 @@
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
+#include <limits>
 #include <utility>
 
-// mesh_compare [SCAN.zon [KERNEL]]
+// mesh_compare [SCAN.zon [KERNEL [MOST]]]
 //
 // Measures our mesh algorithms beside CGAL, OpenMesh, meshoptimizer, plain loops and a copy of the same bytes, all in one
-// run, and prints tables for docs/performance.md. KERNEL: only those whose names contain it. Exit code 1 when results differ.
+// run, and prints tables for docs/performance.md. KERNEL: only those whose names contain it; MOST: only meshes of up to so
+// many faces. Exit code 1 when results differ.
 int main(int argc, char** argv)
 {
     using namespace compare;
     char const* const only = argc > 2 ? argv[2] : "";
+    auto const mostFaces = argc > 3 ? std::strtoul(argv[3], nullptr, 10) : std::numeric_limits<unsigned long>::max();
     bool isEqual = true;
     auto const compareOrders = [&](char const* name, std::uint32_t rows, std::uint32_t columns,
                                    std::uint32_t faceSize) {
+        if (std::size_t(rows) * columns * (faceSize == 3 ? 2 : 1) > mostFaces)
+            return;
         std::vector<Row> table;
         auto const natural = torus(rows, columns, faceSize);
         for (Order const order : {Order::Natural, Order::PointsPermuted, Order::Shuffled})
@@ -29,7 +34,7 @@ int main(int argc, char** argv)
     compareOrders("4 million triangles", 2000, 1000, 3);
     compareOrders("4 million quads", 2000, 2000, 4);
     compareOrders("100 thousand triangles", 250, 200, 3);
-    if (argc > 1) {
+    if (argc > 1 && *argv[1]) {
         auto const scan = readScan(argv[1]);
         if (scan.offsets.size() < 2) {
             std::fprintf(stderr, "mesh_compare: no triangles in %s\n", argv[1]);
