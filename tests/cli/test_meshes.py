@@ -2,6 +2,7 @@
 import math
 
 import tool
+import zon_files
 
 # Two quads that meet in a ridge along z at 90 degrees, as a roof.
 ROOF = "OFF 6 2 0\n-1 0 0\n-1 0 1\n0 1 0\n0 1 1\n1 0 0\n1 0 1\n4 0 1 3 2\n4 2 3 5 4\n"
@@ -116,6 +117,18 @@ class Diagnose(tool.ToolTest):
         self.assertEqual(self.json("diagnose", "cloud.zon")["objects"], [{"is_mesh": False}])
         self.assertEqual(self.zon("diagnose", "cloud.zon").stdout, "object 0: no mesh\n")
 
+    def test_a_mesh_that_cannot_be_measured_is_not_called_clean(self):
+        square = [(0, 0, 0), (1, 0, 0), (1, 1, 0), (0, 1, 0)]
+        for counts in ((5, 4, 1), (4, 4, 2)):
+            broken = zon_files.mesh(square, [0, 1, 2, 3], [0, 4], counts=counts)
+            whole = zon_files.mesh(square, [0, 1, 2, 3], [0, 4])
+            self.write("broken.zon", zon_files.stream([zon_files.obj(broken), zon_files.obj(whole)]))
+            first, second = self.json("diagnose", "broken.zon", code=1)["objects"]
+            self.assertEqual(first, {"is_mesh": True, "is_broken": True})
+            self.assertEqual((second["is_broken"], second["edges"]), (False, 4))
+            self.assertIn("broken: arrays are too short", self.zon("diagnose", "broken.zon", code=1).stdout)
+            self.assertIn("object 0: positions or topology are broken", self.zon("normals", "broken.zon").stderr)
+
 
 class Strands(tool.ToolTest):
     def test_lengths_and_totals(self):
@@ -141,6 +154,11 @@ class Strands(tool.ToolTest):
         self.zon("make", "strands", "dots.zon", "none.zon", "--points", "0", code=2)
         self.write("cloud.off", "OFF 1 0 0\n0 0 0\n")
         self.zon("import", "cloud.off", "cloud.zon")
+        broken = {"point_component": zon_files.component(3), "strand_component": zon_files.component(1),
+                  "point_position": zon_files.points([(0, 0, 0)] * 2),
+                  "strand_offset": zon_files.indices([0, 3], "strand_component")}
+        self.write("broken.zon", zon_files.stream([zon_files.obj(broken)]))
+        self.assertEqual(self.json("strands", "broken.zon", code=1)["objects"], [{"is_strands": True, "is_broken": True}])
         self.assertIn("no points with normals", self.zon("make", "strands", "cloud.zon", "none.zon", code=2).stderr)
 
 

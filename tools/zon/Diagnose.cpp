@@ -1,5 +1,6 @@
 #include "Command.h"
 #include "Console.h"
+#include "GeoValues.h"
 #include "MeshFindings.h"
 #include "Working.h"
 #include "ZonFile.h"
@@ -32,6 +33,8 @@ namespace {
     };
 
     struct Report {
+        /// An array is missing or shorter than the counts ask for: nothing but these is known then.
+        bool isBroken = false;
         unsigned int points = 0;
         unsigned int faces = 0;
         unsigned int faceVertices = 0;
@@ -49,6 +52,11 @@ namespace {
         report.points = Geometry::getElementCount(mesh, Geometry::sPointComp);
         report.faces = Geometry::getElementCount(mesh, Geometry::sFaceComp);
         report.faceVertices = Geometry::getElementCount(mesh, Geometry::sFaceVertexComp);
+        auto const positions = dataOf<Math::float3>(mesh, Geometry::sPointPosition);
+        report.components = Geometry::Mesh::connectedComponents(mesh);
+        report.isBroken = report.components == -1 || !positions || positions->size() < report.points;
+        if (report.isBroken)
+            return report;
         {
             HalfEdgeDataStructure const edges(mesh);
             report.edges = edges.edgeCount();
@@ -57,7 +65,6 @@ namespace {
             });
             report.eulerCharacteristic = Geometry::Mesh::eulerCharacteristic(mesh, edges);
         }
-        report.components = Geometry::Mesh::connectedComponents(mesh);
         report.bettiNumbers = Geometry::Mesh::bettiNumbers(mesh);
         report.found = Geometry::Mesh::diagnose(mesh);
         return report;
@@ -69,10 +76,16 @@ namespace {
             fmt::print("object {}: no mesh\n", number);
             return;
         }
+        if (report->isBroken) {
+            fmt::print("object {}: {}, {}\n    {}\n", number, counted(report->points, "point"),
+                       counted(report->faces, "face"),
+                       colored(stdout, Color::Red, "broken: arrays are too short for these; zon validate tells more"));
+            return;
+        }
         fmt::print("object {}: {}, {}, {}, {} of them on a border\n", number, counted(report->points, "point"),
                    counted(report->faces, "face"), counted(report->edges, "edge"), report->boundaryEdges);
         fmt::print("    Euler characteristic {}; {}\n", report->eulerCharacteristic,
-                   counted(static_cast<std::uint64_t>(std::max(report->components, 0)), "component"));
+                   counted(static_cast<std::uint64_t>(report->components), "component"));
         fmt::print("    Betti numbers {}, {}, {}\n", report->bettiNumbers.x, report->bettiNumbers.y,
                    report->bettiNumbers.z);
         for (auto const& kind : findingKinds())
@@ -86,11 +99,14 @@ namespace {
     {
         if (!report)
             return {{"is_mesh", false}};
+        if (report->isBroken)
+            return {{"is_mesh", true}, {"is_broken", true}};
         Json findings = Json::object();
         for (auto const& kind : findingKinds())
             findings[kind.key] = findingJson(kind, report->found);
         auto const& betti = report->bettiNumbers;
         return {{"is_mesh", true},
+                {"is_broken", false},
                 {"points", report->points},
                 {"faces", report->faces},
                 {"face_vertices", report->faceVertices},
@@ -123,8 +139,9 @@ namespace {
         if (options.wantsJson)
             fmt::print("{}\n", Json{{"file", options.input}, {"objects", list}}.dump(2, ' ', false,
                                                                                      Json::error_handler_t::replace));
-        bool const isClean =
-            std::ranges::all_of(reports, [](auto const& report) { return !report || report->found == Diagnostic{}; });
+        bool const isClean = std::ranges::all_of(reports, [](auto const& report) {
+            return !report || (!report->isBroken && report->found == Diagnostic{});
+        });
         return isClean ? kDone : kFindings;
     }
 

@@ -31,6 +31,8 @@ namespace {
     };
 
     struct Report {
+        /// An array is shorter than the counts ask for: nothing is known then.
+        bool isBroken = false;
         unsigned int points = 0;
         Nexil::Array<float> lengths;
         double total = 0;
@@ -40,14 +42,14 @@ namespace {
         [[nodiscard]] double mean() const { return lengths.empty() ? 0 : total / static_cast<double>(lengths.size()); }
     };
 
-    /// Nothing for what is no strands, or strands that are broken.
+    /// Nothing for what is no strands.
     std::optional<Report> measure(Object const& object)
     {
+        if (!Object::isA(object, *Geometry::getStrandPrototype()))
+            return std::nullopt;
         Report report;
         Nexil::Array<float> segments;
-        if (!Object::isA(object, *Geometry::getStrandPrototype()) ||
-            !GeometryAlgorithms::computeStrandLength(object, report.lengths, segments, nullptr))
-            return std::nullopt;
+        report.isBroken = !GeometryAlgorithms::computeStrandLength(object, report.lengths, segments, nullptr);
         report.points = Geometry::getElementCount(object, Geometry::sPointComp);
         for (float const length : report.lengths)
             report.total += length;
@@ -65,6 +67,12 @@ namespace {
             fmt::print("object {}: no strands\n", number);
             return;
         }
+        if (report->isBroken) {
+            fmt::print("object {}: {}\n", number,
+                       colored(stdout, Color::Red,
+                               "broken strands: arrays are too short for the counts; zon validate tells more"));
+            return;
+        }
         fmt::print("object {}: {}, {}\n", number, counted(report->lengths.size(), "strand"),
                    counted(report->points, "point"));
         fmt::print("    length {:.6g} in all; shortest {:.6g}, mean {:.6g}, longest {:.6g}\n", report->total,
@@ -78,9 +86,11 @@ namespace {
     {
         if (!report)
             return {{"is_strands", false}};
-        return {{"is_strands", true},           {"strands", report->lengths.size()},     {"points", report->points},
-                {"total", report->total},       {"shortest", report->shortest()},        {"mean", report->mean()},
-                {"longest", report->longest()}, {"lengths", firstLengths(*report, most)}};
+        if (report->isBroken)
+            return {{"is_strands", true}, {"is_broken", true}};
+        return {{"is_strands", true},       {"is_broken", false},           {"strands", report->lengths.size()},
+                {"points", report->points}, {"total", report->total},       {"shortest", report->shortest()},
+                {"mean", report->mean()},   {"longest", report->longest()}, {"lengths", firstLengths(*report, most)}};
     }
 
     ExitCode runStrands(Options const& options)
@@ -101,7 +111,9 @@ namespace {
         if (options.wantsJson)
             fmt::print("{}\n", Json{{"file", options.input}, {"objects", list}}.dump(2, ' ', false,
                                                                                      Json::error_handler_t::replace));
-        return kDone;
+        bool const isWhole =
+            std::ranges::none_of(reports, [](auto const& report) { return report && report->isBroken; });
+        return isWhole ? kDone : kFindings;
     }
 
 } // namespace
