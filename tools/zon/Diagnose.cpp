@@ -1,6 +1,7 @@
 #include "Command.h"
 #include "Console.h"
 #include "GeoValues.h"
+#include "JsonReport.h"
 #include "MeshFindings.h"
 #include "Working.h"
 #include "ZonFile.h"
@@ -11,7 +12,6 @@
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <memory>
@@ -25,7 +25,6 @@ namespace {
     using namespace Veldrin;
     using Geometry::Mesh::Diagnostic;
     using Geometry::Mesh::HalfEdgeDataStructure;
-    using Json = nlohmann::ordered_json;
 
     struct Options {
         std::string input;
@@ -137,8 +136,7 @@ namespace {
                 print(i, reports[i]);
         }
         if (options.wantsJson)
-            fmt::print("{}\n", Json{{"file", options.input}, {"objects", list}}.dump(2, ' ', false,
-                                                                                     Json::error_handler_t::replace));
+            printReport(Json{{"file", options.input}, {"objects", list}});
         bool const isClean = std::ranges::all_of(reports, [](auto const& report) {
             return !report || (!report->isBroken && report->found == Diagnostic{});
         });

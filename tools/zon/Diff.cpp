@@ -1,10 +1,10 @@
 #include "Command.h"
 #include "Compare.h"
 #include "Console.h"
+#include "JsonReport.h"
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <cmath>
 #include <memory>
@@ -12,8 +12,6 @@
 namespace Zon {
 
 namespace {
-
-    using Json = nlohmann::ordered_json;
 
     struct Options {
         std::string first;
@@ -46,7 +44,7 @@ namespace {
                             {"equal", differences.empty()},
                             {"complete", isComplete},
                             {"differences", list}};
-            fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
+            printReport(json);
         } else if (differences.empty()) {
             fmt::print("{}\n", colored(stdout, Color::Green, "equal"));
         } else {

@@ -2,6 +2,7 @@
 #include "Compare.h"
 #include "Console.h"
 #include "FileEnding.h"
+#include "JsonReport.h"
 #include "MeshArrays.h"
 #include "OutputFile.h"
 #include "VdbFile.h"
@@ -12,7 +13,6 @@
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <cerrno>
 #include <cmath>
@@ -27,7 +27,6 @@ namespace Zon {
 namespace {
 
     using namespace Veldrin;
-    using Json = nlohmann::ordered_json;
     using Geometry::kInvalidIndex;
 
     struct Options {
@@ -177,7 +176,7 @@ namespace {
                             {std::string(noun) + "s", count},
                             {"not_kept", losses},
                             {"bytes", bytes}};
-            fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
+            printReport(json);
         } else {
             fmt::print("{}: {}, {}\n", options.output, counted(count, noun), byteText(bytes));
         }

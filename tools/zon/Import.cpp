@@ -2,6 +2,7 @@
 #include "Console.h"
 #include "FileEnding.h"
 #include "GeometryKind.h"
+#include "JsonReport.h"
 #include "MeshArrays.h"
 #include "OutputFile.h"
 #include "TextInput.h"
@@ -13,7 +14,6 @@
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <filesystem>
 #include <memory>
@@ -24,7 +24,6 @@ namespace Zon {
 namespace {
 
     using namespace Veldrin;
-    using Json = nlohmann::ordered_json;
 
     struct Options {
         std::string input;
@@ -111,7 +110,7 @@ namespace {
         if (options.wantsJson) {
             Json const json{{"input", options.input}, {"output", options.output}, {"level", options.level},
                             {"objects", parts},       {"not_kept", leftOut},      {"bytes", bytes}};
-            fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
+            printReport(json);
         } else {
             fmt::print("{}: {}, {}\n{}", options.output, counted(objects.size(), "object"), byteText(bytes), report);
         }

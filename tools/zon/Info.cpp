@@ -1,6 +1,7 @@
 #include "Command.h"
 #include "Console.h"
 #include "GeometryKind.h"
+#include "JsonReport.h"
 #include "ValueRows.h"
 #include "ZonFile.h"
 
@@ -10,7 +11,6 @@
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <memory>
@@ -20,7 +20,6 @@ namespace Zon {
 namespace {
 
     using namespace Veldrin;
-    using Json = nlohmann::ordered_json;
     using ObjectPtr = Nexil::Ptr<Object>;
 
     struct Options {
@@ -178,7 +177,7 @@ namespace {
             list.push_back(toJson(report));
         Json const json{{"file", options.input},        {"version", header.version}, {"level", header.level},
                         {"handles", header.hasHandles}, {"bytes", header.fileSize},  {"objects", list}};
-        fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
+        printReport(json);
         return kDone;
     }
 

@@ -1,6 +1,7 @@
 #include "Command.h"
 #include "Console.h"
 #include "GeoValues.h"
+#include "JsonReport.h"
 #include "Working.h"
 #include "ZonFile.h"
 
@@ -12,7 +13,6 @@
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <memory>
 #include <numbers>
@@ -24,7 +24,6 @@ namespace Zon {
 namespace {
 
     using namespace Veldrin;
-    using Json = nlohmann::ordered_json;
     using Normals = Nexil::Array<Math::float3>;
 
     struct Options {
@@ -157,8 +156,7 @@ namespace {
                             {"elements", stored.elementCount}});
         }
         if (options.wantsJson)
-            fmt::print("{}\n", Json{{"file", options.input}, {"stored", list}}.dump(2, ' ', false,
-                                                                                    Json::error_handler_t::replace));
+            printReport(Json{{"file", options.input}, {"stored", list}});
         return all.empty() ? kFindings : kDone;
     }
 

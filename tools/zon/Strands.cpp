@@ -1,5 +1,6 @@
 #include "Command.h"
 #include "Console.h"
+#include "JsonReport.h"
 #include "Working.h"
 #include "ZonFile.h"
 
@@ -10,7 +11,6 @@
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
 #include <fmt/ranges.h>
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <memory>
@@ -22,7 +22,6 @@ namespace Zon {
 namespace {
 
     using namespace Veldrin;
-    using Json = nlohmann::ordered_json;
 
     struct Options {
         std::string input;
@@ -109,8 +108,7 @@ namespace {
                 print(i, reports[i], options.mostLengths);
         }
         if (options.wantsJson)
-            fmt::print("{}\n", Json{{"file", options.input}, {"objects", list}}.dump(2, ' ', false,
-                                                                                     Json::error_handler_t::replace));
+            printReport(Json{{"file", options.input}, {"objects", list}});
         bool const isWhole =
             std::ranges::none_of(reports, [](auto const& report) { return report && report->isBroken; });
         return isWhole ? kDone : kFindings;

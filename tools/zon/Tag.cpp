@@ -1,5 +1,6 @@
 #include "Command.h"
 #include "Console.h"
+#include "JsonReport.h"
 #include "PositionRule.h"
 #include "TagTable.h"
 #include "ZonFile.h"
@@ -12,7 +13,6 @@
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <map>
@@ -26,7 +26,6 @@ namespace Zon {
 namespace {
 
     using namespace Veldrin;
-    using Json = nlohmann::ordered_json;
     using MaskPtr = Nexil::Ptr<Nexil::Array<bool>>;
 
     /// More words that resolve to nothing are counted only.
@@ -308,8 +307,7 @@ namespace {
                 print(i, selection, options.wantsIndices);
         }
         if (options.wantsJson)
-            fmt::print("{}\n", Json{{"file", options.input}, {"objects", list}}.dump(2, ' ', false,
-                                                                                     Json::error_handler_t::replace));
+            printReport(Json{{"file", options.input}, {"objects", list}});
         return isRefused || (options.tag && !isStored) ? kFindings : kDone;
     }
 

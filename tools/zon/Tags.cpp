@@ -1,11 +1,11 @@
 #include "Command.h"
 #include "Console.h"
+#include "JsonReport.h"
 #include "TagTable.h"
 #include "ZonFile.h"
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <memory>
@@ -13,8 +13,6 @@
 namespace Zon {
 
 namespace {
-
-    using Json = nlohmann::ordered_json;
 
     struct Options {
         std::string input;
@@ -68,8 +66,7 @@ namespace {
                 printTable(i, tags);
         }
         if (options.wantsJson)
-            fmt::print("{}\n", Json{{"file", options.input}, {"objects", list}}.dump(2, ' ', false,
-                                                                                     Json::error_handler_t::replace));
+            printReport(Json{{"file", options.input}, {"objects", list}});
         return kDone;
     }
 

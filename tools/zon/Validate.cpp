@@ -1,6 +1,7 @@
 #include "Command.h"
 #include "Console.h"
 #include "GeometryKind.h"
+#include "JsonReport.h"
 #include "MeshFindings.h"
 #include "Working.h"
 #include "ZonFile.h"
@@ -13,7 +14,6 @@
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <array>
@@ -29,7 +29,6 @@ namespace {
     using namespace Veldrin;
     using Geometry::GeoValidator;
     using Geometry::Mesh::Diagnostic;
-    using Json = nlohmann::ordered_json;
     using ObjectPtr = Nexil::Ptr<Object>;
 
     struct Options {
@@ -215,8 +214,7 @@ namespace {
             files.push_back({{"file", file}, {"objects", std::move(objects)}});
         }
         if (options.wantsJson)
-            fmt::print("{}\n",
-                       Json{{"valid", areValid}, {"files", files}}.dump(2, ' ', false, Json::error_handler_t::replace));
+            printReport(Json{{"valid", areValid}, {"files", files}});
         return areValid && !(options.isStrict && hasNotes) ? kDone : kFindings;
     }
 

@@ -1,5 +1,6 @@
 #include "Command.h"
 #include "Console.h"
+#include "JsonReport.h"
 #include "ValueRows.h"
 #include "ZonFile.h"
 
@@ -7,7 +8,6 @@
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <memory>
@@ -15,8 +15,6 @@
 namespace Zon {
 
 namespace {
-
-    using Json = nlohmann::ordered_json;
 
     using Veldrin::IO::StreamEntry;
 
@@ -107,7 +105,7 @@ namespace {
                         {"entries", entries},
                         {"table_fault", textOrNull(report.tableFault)},
                         {"read_fault", textOrNull(report.readFault)}};
-        fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
+        printReport(json);
     }
 
     ExitCode runVerify(Options const& options)

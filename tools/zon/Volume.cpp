@@ -1,6 +1,7 @@
 #include "Command.h"
 #include "Console.h"
 #include "GeoValues.h"
+#include "JsonReport.h"
 #include "ValueRows.h"
 #include "VdbFile.h"
 #include "VolumeParts.h"
@@ -15,7 +16,6 @@
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <cmath>
@@ -27,7 +27,6 @@ namespace {
 
     using namespace Veldrin;
     using namespace VLD::TileTree3D;
-    using Json = nlohmann::ordered_json;
     using Box = Math::bbox<Math::float3, float>;
 
     struct ReportOptions {
@@ -111,7 +110,7 @@ namespace {
             list.push_back(object ? describe(*object) : Json{{"is_volume", false}, {"containers", Json::array()}});
         if (options.wantsJson) {
             Json const json{{"file", options.input}, {"objects", list}};
-            fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
+            printReport(json);
             return kDone;
         }
         for (std::size_t i = 0; i < list.size(); ++i) {
@@ -154,7 +153,7 @@ namespace {
         }
         if (options.wantsJson) {
             Json const json{{"file", options.input}, {"objects", list}};
-            fmt::print("{}\n", json.dump(2, ' ', false, Json::error_handler_t::replace));
+            printReport(json);
         }
         return kDone;
     }
