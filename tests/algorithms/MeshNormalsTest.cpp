@@ -410,7 +410,8 @@ TEST(FaceVertexAdjacency, FansBooksAndGiantPolygonsAreNoHarderThanAGrid)
         Normals normals;
         computeMeshVertexNormals(*giant, byAngle, true, normals);
         EXPECT_EQ(normals.size(), support::kGiant);
-        EXPECT_EQ(normals[support::kGiant / 2], faceNormal[0]);
+        // Scaling to length 1 a second time may change the last bit.
+        expectNear(normals[support::kGiant / 2], {faceNormal[0].x, faceNormal[0].y, faceNormal[0].z}, 1e-6);
     }
 }
 
