@@ -156,26 +156,29 @@ bool const areRegistered = [] {
             auto const maskFor = [&each, isPainted] {
                 return maskOf(Geometry::getElementCount(each.object(), each.from), isPainted ? 1000 : 1);
             };
-            benchmark::RegisterBenchmark((name + "/loop").c_str(), [&each, maskFor](benchmark::State& state) {
-                Mask const mask = maskFor();
-                for ([[maybe_unused]] auto _ : state) {
-                    Mask result;
-                    result.resize(Geometry::getElementCount(each.object(), each.to));
-                    each.loop(each.object(), mask, result);
-                    benchmark::DoNotOptimize(result.data());
-                }
-                state.SetItemsProcessed(state.iterations() * kElements);
-            })->UseRealTime()->Unit(benchmark::kMillisecond);
+            benchmark::RegisterBenchmark((name + "/loop").c_str(),
+                                         [&each, maskFor](benchmark::State& state) {
+                                             Mask const mask = maskFor();
+                                             for ([[maybe_unused]] auto _ : state) {
+                                                 Mask result;
+                                                 result.resize(Geometry::getElementCount(each.object(), each.to));
+                                                 each.loop(each.object(), mask, result);
+                                                 benchmark::DoNotOptimize(result.data());
+                                             }
+                                             state.SetItemsProcessed(state.iterations() * kElements);
+                                         })
+                ->UseRealTime()
+                ->Unit(benchmark::kMillisecond);
             for (std::size_t const threadCount : {1, 2})
-                benchmark::RegisterBenchmark(
-                    (name + "/" + std::to_string(threadCount)).c_str(),
-                    [&each, maskFor, threadCount](benchmark::State& state) {
-                        Mask const mask = maskFor();
-                        tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, threadCount);
-                        for ([[maybe_unused]] auto _ : state)
-                            benchmark::DoNotOptimize(each.convert(each.object(), mask).get());
-                        state.SetItemsProcessed(state.iterations() * kElements);
-                    })
+                benchmark::RegisterBenchmark((name + "/" + std::to_string(threadCount)).c_str(),
+                                             [&each, maskFor, threadCount](benchmark::State& state) {
+                                                 Mask const mask = maskFor();
+                                                 tbb::global_control const limit(
+                                                     tbb::global_control::max_allowed_parallelism, threadCount);
+                                                 for ([[maybe_unused]] auto _ : state)
+                                                     benchmark::DoNotOptimize(each.convert(each.object(), mask).get());
+                                                 state.SetItemsProcessed(state.iterations() * kElements);
+                                             })
                     ->UseRealTime()
                     ->Unit(benchmark::kMillisecond);
         }

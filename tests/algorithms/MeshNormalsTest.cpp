@@ -216,40 +216,54 @@ void soilFreeMemory(std::size_t floatCount)
     std::vector<std::vector<float>> const soil(4, std::vector<float>(floatCount, std::nanf("")));
 }
 
+/// Random faces whose corners lie within `spread` points of each other, all along the points of a mesh.
+Polygons facesAlong(unsigned int pointCount, unsigned int spread, unsigned int faceSize)
+{
+    auto faces = support::randomFaces(spread, 20000, faceSize, spread);
+    for (std::size_t f = 0; f < faces.size(); ++f)
+        for (unsigned int& corner : faces[f])
+            if (corner < spread)
+                corner = static_cast<unsigned int>((corner + f * (pointCount - spread) / faces.size()) % pointCount);
+            else
+                corner += pointCount;
+    return faces;
+}
+
+void expectBitsOfALoopOverTheFaces(unsigned int pointCount, unsigned int spread, unsigned int faceSize)
+{
+    auto faces = facesAlong(pointCount, spread, faceSize);
+    std::mt19937 random(spread);
+    std::vector<float3> points(pointCount);
+    for (float3& p : points)
+        p = {float(random() % 1000) / 7, float(random() % 1000) / 7, float(random() % 1000) / 7};
+    auto const object = support::mesh(points, faces);
+    faces.push_back({0, 1});
+    auto const ofMixedFaces = support::mesh(points, faces);
+    for (int variant = 0; variant < 4; ++variant) {
+        Normals expected;
+        if (variant < 2)
+            expected = summedInFaceOrder(points, faces, variant == 1);
+        else
+            computeMeshVertexNormals(*ofMixedFaces, true, variant == 3, expected);
+        support::onThreadCounts([&] {
+            soilFreeMemory(4 * faces.size());
+            Normals normals;
+            computeMeshVertexNormals(*object, variant >= 2, variant % 2 == 1, normals);
+            ASSERT_EQ(normals.size(), expected.size());
+            EXPECT_EQ(std::memcmp(normals.data(), expected.data(), expected.size() * sizeof(float3)), 0)
+                << "variant " << variant << ", spread " << spread << " of " << pointCount;
+        });
+    }
+}
+
 TEST(MeshNormals, OfMessyMeshesAreTheBitsOfALoopOverTheFacesOnAllThreads)
 {
-    // Degenerate faces, repeated corners and points that are not there, among neighbours with near numbers and far ones.
-    unsigned int const pointCount = kParallelMeshVertexNormalsThreshold + 5;
-    for (unsigned int const spread : {40u, pointCount}) {
-        auto faces = support::randomFaces(spread, 20000, 0, spread);
-        for (std::size_t f = 0; f < faces.size(); ++f)
-            for (unsigned int& corner : faces[f])
-                if (corner < spread)
-                    corner =
-                        static_cast<unsigned int>((corner + f * (pointCount - spread) / faces.size()) % pointCount);
-                else
-                    corner += pointCount;
-        std::mt19937 random(spread);
-        std::vector<float3> points(pointCount);
-        for (float3& p : points)
-            p = {float(random() % 1000) / 7, float(random() % 1000) / 7, float(random() % 1000) / 7};
-        auto const object = support::mesh(points, faces);
-        for (int variant = 0; variant < 4; ++variant) {
-            Normals expected;
-            if (variant < 2)
-                expected = summedInFaceOrder(points, faces, variant == 1);
-            support::onThreadCounts([&] {
-                soilFreeMemory(4 * faces.size());
-                Normals normals;
-                computeMeshVertexNormals(*object, variant >= 2, variant % 2 == 1, normals);
-                if (expected.empty())
-                    expected = normals;
-                ASSERT_EQ(normals.size(), expected.size());
-                EXPECT_EQ(std::memcmp(normals.data(), expected.data(), expected.size() * sizeof(float3)), 0)
-                    << "variant " << variant << ", spread " << spread;
-            });
-        }
-    }
+    // Degenerate faces, repeated corners and points that are not there; sums that fit a cache and sums that do not, among
+    // neighbours with near numbers and far ones.
+    for (unsigned int const pointCount : {16389u, 131077u})
+        for (unsigned int const spread : {40u, pointCount})
+            for (unsigned int const faceSize : {0u, 3u, 4u})
+                expectBitsOfALoopOverTheFaces(pointCount, spread, faceSize);
 }
 
 TEST(MeshNormals, AnglesAreExactToAFewUnitsInTheLastPlace)

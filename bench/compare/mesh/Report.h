@@ -21,7 +21,7 @@ struct Row {
 
 /// Measures the kernels whose names contain `only` on a mesh: all sides in turn, several times over, and the least time of
 /// each counts.
-[[nodiscard]] std::vector<Row> measure(PlainMesh const& mesh, std::string const& only);
+[[nodiscard]] std::vector<Row> measure(PlainMesh const& mesh, std::string const& only, bool withPeers);
 
 /// The rows of one mesh as a table in Markdown.
 void print(std::string const& meshName, std::vector<Row> const& rows);

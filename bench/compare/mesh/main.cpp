@@ -7,16 +7,17 @@
 #include <limits>
 #include <utility>
 
-// mesh_compare [SCAN.zon [KERNEL [MOST]]]
+// mesh_compare [SCAN.zon [KERNEL [MOST [alone]]]]
 //
 // Measures our mesh algorithms beside CGAL, OpenMesh, meshoptimizer, plain loops and a copy of the same bytes, all in one
 // run, and prints tables for docs/performance.md. KERNEL: only those whose names contain it; MOST: only meshes of up to so
-// many faces. Exit code 1 when results differ.
+// many faces; alone: without the peers, which take most of the time. Exit code 1 when results differ.
 int main(int argc, char** argv)
 {
     using namespace compare;
     char const* const only = argc > 2 ? argv[2] : "";
     auto const mostFaces = argc > 3 ? std::strtoul(argv[3], nullptr, 10) : std::numeric_limits<unsigned long>::max();
+    bool const withPeers = argc <= 4;
     bool isEqual = true;
     auto const compareOrders = [&](char const* name, std::uint32_t rows, std::uint32_t columns,
                                    std::uint32_t faceSize) {
@@ -25,7 +26,7 @@ int main(int argc, char** argv)
         std::vector<Row> table;
         auto const natural = torus(rows, columns, faceSize);
         for (Order const order : {Order::Natural, Order::PointsPermuted, Order::Shuffled})
-            for (Row& row : measure(reordered(natural, order), only))
+            for (Row& row : measure(reordered(natural, order), only, withPeers))
                 table.push_back(std::move(row));
         std::stable_sort(table.begin(), table.end(), [](Row const& a, Row const& b) { return a.kernel < b.kernel; });
         print(name, table);
@@ -40,7 +41,7 @@ int main(int argc, char** argv)
             std::fprintf(stderr, "mesh_compare: no triangles in %s\n", argv[1]);
             return EXIT_FAILURE;
         }
-        auto const table = measure(scan, only);
+        auto const table = measure(scan, only, withPeers);
         print("A scan of " + std::to_string(scan.faceCount()) + " triangles", table);
         isEqual = isEqual && std::all_of(table.begin(), table.end(), [](Row const& row) { return row.isEqual; });
     }

@@ -23,9 +23,9 @@ void computeMeshFaceNormals(Object const& mesh, Nexil::Array<Math::float3>& norm
     Positions const positions{positionArray->data(), faces.pointCount()};
     unsigned int const* const points = faces.points();
     PendingOutput<Math::float3> output(normals, faces.faceCount());
-    faces.withRanges([&, out = output.data()](auto const& ranges) {
+    faces.withRanges([&, out = output.data()]<class Ranges>(Ranges const& ranges) {
         Nexil::parallel::forRange(faces.faceCount(), grain::kFaces, [&](std::size_t begin, std::size_t end) {
-            FaceNormalBlock<false> block;
+            FaceNormalBlock<false, Ranges> block;
             for (std::size_t next = begin; begin < end; begin = next) {
                 next = std::min(begin + block.kSize, end);
                 block.compute(positions, points, ranges, begin, next);

@@ -40,11 +40,12 @@ VELDRIN_API void computeMeshFaceNormals(Object const& mesh, Nexil::Array<Math::f
 ///                Angles are within 4 units in the last place of the arc cosine of the same cosine.
 /// areaWeighted:  weights by area.
 /// normals: resized to the element count of "point_component"; storage that it already has is used again.
-/// Cost: one pass over the corners; parallel from `kParallelMeshVertexNormalsThreshold` points on, then two where neighbours
-/// have near numbers, as in most meshes, otherwise three and one more by each thread.
+/// Cost: one pass over the corners; parallel from `kParallelMeshVertexNormalsThreshold` points on. On a mesh too large for the
+/// caches whose neighbours have near numbers, as most have, each thread then adds for its own part of the points; elsewhere
+/// one adds what the others compute, or each of more than four goes over all corners for its own points.
 /// Temporary memory: for each thread 20 bytes a corner of 64 faces when weighted by angle, otherwise none. On more than one
-/// thread besides 1 byte for 32 points and 12 bytes for 1024 faces, and where neighbours have far numbers 12 bytes a face
-/// and, when weighted by angle, 4 bytes a corner.
+/// thread besides 1 byte for 32 points and 12 bytes for 1024 faces, or, where threads do not add for their own parts, 12
+/// bytes a face and 4 bytes a corner when weighted by angle: for 32768 faces, or for all with more than four threads.
 VELDRIN_API void computeMeshVertexNormals(Object const& mesh, bool angleWeighted, bool areaWeighted,
                                           Nexil::Array<Math::float3>& normals);
 

@@ -126,4 +126,30 @@ void arcCosines(float* values, std::size_t count) noexcept
     }
 }
 
+template <unsigned int N>
+void cornerAngles(CornerBlock<N> const& corners, float (&angles)[N][kBlockSize]) noexcept
+{
+    // Edge k leads from corner k to the next.
+    CornerBlock<N> edges;
+    for (unsigned int k = 0; k < N; ++k) {
+        unsigned int const next = k + 1 == N ? 0 : k + 1;
+        for (std::size_t i = 0; i < kBlockSize; ++i) {
+            edges.x[k][i] = corners.x[next][i] - corners.x[k][i];
+            edges.y[k][i] = corners.y[next][i] - corners.y[k][i];
+            edges.z[k][i] = corners.z[next][i] - corners.z[k][i];
+        }
+        unitsOrSelf(edges.x[k], edges.y[k], edges.z[k], kBlockSize);
+    }
+    for (unsigned int k = 0; k < N; ++k) {
+        unsigned int const previous = k == 0 ? N - 1 : k - 1;
+        for (std::size_t i = 0; i < kBlockSize; ++i)
+            angles[k][i] = -(edges.x[previous][i] * edges.x[k][i] + edges.y[previous][i] * edges.y[k][i] +
+                             edges.z[previous][i] * edges.z[k][i]);
+        arcCosines(angles[k], kBlockSize);
+    }
+}
+
+template void cornerAngles(CornerBlock<3> const&, float (&)[3][kBlockSize]) noexcept;
+template void cornerAngles(CornerBlock<4> const&, float (&)[4][kBlockSize]) noexcept;
+
 } // namespace Veldrin::GeometryAlgorithms

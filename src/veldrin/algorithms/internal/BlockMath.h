@@ -27,6 +27,11 @@ void fanVectors(CornerBlock<N> const& corners, float* x, float* y, float* z) noe
 template <unsigned int N>
 void newellVectors(CornerBlock<N> const& corners, float* x, float* y, float* z) noexcept;
 
+/// Angle at corner k of face i, in radians, to angles[k][i]. An edge not longer than the smallest normal float counts as it
+/// is, not as a unit vector.
+template <unsigned int N>
+void cornerAngles(CornerBlock<N> const& corners, float (&angles)[N][kBlockSize]) noexcept;
+
 /// Scales each vector to length 1; one not longer than the smallest normal float becomes (0, 1, 0).
 void unitsOrFallback(float* x, float* y, float* z, std::size_t count) noexcept;
 

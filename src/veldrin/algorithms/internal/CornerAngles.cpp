@@ -1,17 +1,18 @@
 #include <veldrin/algorithms/internal/CornerAngles.h>
 
-#include <veldrin/algorithms/internal/BlockMath.h>
+#include <algorithm>
 
 namespace Veldrin::GeometryAlgorithms {
 
-void CornerAngles::grow(std::size_t count)
+void CornerAngles<Geometry::OffsetRanges>::grow(std::size_t count)
 {
     for (auto* array : {&x_, &y_, &z_, &angles_})
         array->resize(std::max(count, array->size()));
     previous_.resize(std::max(count, previous_.size()));
 }
 
-void CornerAngles::addFace(Positions const& positions, unsigned int const* points, std::uint64_t n)
+void CornerAngles<Geometry::OffsetRanges>::addFace(Positions const& positions, unsigned int const* points,
+                                                   std::uint64_t n)
 {
     if (count_ + n > angles_.size())
         grow(count_ + n);
@@ -29,7 +30,7 @@ void CornerAngles::addFace(Positions const& positions, unsigned int const* point
     count_ += n;
 }
 
-void CornerAngles::compute() noexcept
+void CornerAngles<Geometry::OffsetRanges>::computeAdded() noexcept
 {
     float const* const x = x_.data();
     float const* const y = y_.data();
