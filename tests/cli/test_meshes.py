@@ -9,11 +9,6 @@ ROOF = "OFF 6 2 0\n-1 0 0\n-1 0 1\n0 1 0\n0 1 1\n1 0 0\n1 0 1\n4 0 1 3 2\n4 2 3 
 
 
 class Normals(tool.ToolTest):
-    def vectors(self, name, prop):
-        text = self.dumped(name, prop, "data")
-        return [tuple(float(number.rstrip("f")) for number in vector.strip("{} ").split(","))
-                for vector in text.split("},")]
-
     def assert_vectors(self, found, expected):
         self.assertEqual(len(found), len(expected))
         for vector, right in zip(found, expected):
@@ -71,8 +66,7 @@ class Normals(tool.ToolTest):
         for arguments in (["--point", "--face"], ["--face", "--angle"], ["--face", "--crease", "3"],
                           ["--point", "--crease", "3"], ["--crease", "181"], ["--crease", "-1"], ["--crease", "nan"]):
             self.zon("normals", "roof.zon", *arguments, code=2)
-        self.write("cloud.off", "OFF 1 0 0\n0 0 0\n")
-        self.zon("import", "cloud.off", "cloud.zon")
+        self.import_cloud()
         result = self.zon("normals", "cloud.zon", "-o", "none.zon", code=1)
         self.assertIn("object 0: is no mesh", result.stderr)
         self.assertEqual((self.folder / "roof.zon").read_bytes(), before)
@@ -112,8 +106,7 @@ class Diagnose(tool.ToolTest):
         self.assertEqual(self.findings("flat.zon", 1)[1], {"zero_area_faces": (1, [0]), "degenerate_faces": (1, [1])})
 
     def test_what_is_no_mesh_has_no_faults(self):
-        self.write("cloud.off", "OFF 1 0 0\n0 0 0\n")
-        self.zon("import", "cloud.off", "cloud.zon")
+        self.import_cloud()
         self.assertEqual(self.json("diagnose", "cloud.zon")["objects"], [{"is_mesh": False}])
         self.assertEqual(self.zon("diagnose", "cloud.zon").stdout, "object 0: no mesh\n")
 
@@ -122,7 +115,7 @@ class Diagnose(tool.ToolTest):
         for counts in ((5, 4, 1), (4, 4, 2)):
             broken = zon_files.mesh(square, [0, 1, 2, 3], [0, 4], counts=counts)
             whole = zon_files.mesh(square, [0, 1, 2, 3], [0, 4])
-            self.write("broken.zon", zon_files.stream([zon_files.obj(broken), zon_files.obj(whole)]))
+            self.write("broken.zon", zon_files.stream([broken, whole]))
             first, second = self.json("diagnose", "broken.zon", code=1)["objects"]
             self.assertEqual(first, {"is_mesh": True, "is_broken": True})
             self.assertEqual((second["is_broken"], second["edges"]), (False, 4))
@@ -140,10 +133,9 @@ class Strands(tool.ToolTest):
         for length in (*one["lengths"], one["shortest"], one["mean"], one["longest"]):
             self.assertAlmostEqual(length, 3, places=5)
         # The strands stand on the corners and leave along the diagonals: their ends form a cube around the first.
-        ends = self.dumped("hair.zon", "point_position", "data").split("},")[3::4]
-        for end in ends:
-            for number in end.strip("{} ").split(","):
-                self.assertAlmostEqual(abs(float(number.rstrip("f"))), 0.5 + math.sqrt(3), places=4)
+        for end in self.vectors("hair.zon", "point_position")[3::4]:
+            for number in end:
+                self.assertAlmostEqual(abs(number), 0.5 + math.sqrt(3), places=4)
 
     def test_single_points_and_what_is_no_strands(self):
         self.zon("make", "cube", "cube.zon")
@@ -152,12 +144,11 @@ class Strands(tool.ToolTest):
         self.assertEqual((one["total"], one["lengths"]), (0, [0] * 8))
         self.assertEqual(self.zon("strands", "cube.zon").stdout, "object 0: no strands\n")
         self.zon("make", "strands", "dots.zon", "none.zon", "--points", "0", code=2)
-        self.write("cloud.off", "OFF 1 0 0\n0 0 0\n")
-        self.zon("import", "cloud.off", "cloud.zon")
+        self.import_cloud()
         broken = {"point_component": zon_files.component(3), "strand_component": zon_files.component(1),
                   "point_position": zon_files.points([(0, 0, 0)] * 2),
                   "strand_offset": zon_files.indices([0, 3], "strand_component")}
-        self.write("broken.zon", zon_files.stream([zon_files.obj(broken)]))
+        self.write("broken.zon", zon_files.stream([broken]))
         self.assertEqual(self.json("strands", "broken.zon", code=1)["objects"], [{"is_strands": True, "is_broken": True}])
         self.assertIn("no points with normals", self.zon("make", "strands", "cloud.zon", "none.zon", code=2).stderr)
 

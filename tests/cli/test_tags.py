@@ -1,7 +1,6 @@
 """zon tags and zon tag: what they select, store, refuse and warn about."""
-import struct
-
 import tool
+from zon_files import array, component, obj, part, stream, text
 
 # Four quads of a 2 x 2 square in the plane y = 0, and points by row.
 PLANE = ["make", "plane", "plane.zon", "--size", "2", "--subdivisions", "2"]
@@ -9,29 +8,11 @@ PLANE = ["make", "plane", "plane.zon", "--size", "2", "--subdivisions", "2"]
 
 
 
-def packed(value):
-    """A MessagePack item: of a list, a text, bytes, a number or a truth value."""
-    if isinstance(value, bool):
-        return b"\xc3" if value else b"\xc2"
-    if isinstance(value, int):
-        return b"\xce" + struct.pack(">I", value)
-    if isinstance(value, bytes):
-        return b"\xc4" + bytes([len(value)]) + value
-    if isinstance(value, str):
-        return b"\xd9" + bytes([len(value.encode())]) + value.encode()
-    return b"\xdc" + struct.pack(">H", len(value)) + b"".join(map(packed, value))
-
-
 def file_of_tags(tags):
-    """A zon file of version 5, which has no hashes: one object of 3 points, tags by (name, component, flags)."""
-    properties = ["point_component", [362, ["count", [2, 3]]]]
-    for name, component, flags in tags:
-        properties += [name, [362, ["data", [130, [0, [len(flags), [flags]]]], "target", [11, component]]]]
-    head = packed(["file_identifier", [2, 6611198], "file_version", [2, 5], "compression_level", [6, 0],
-                   "serialize_handles", [10, False]])
-    item = packed([362, properties])
-    position = len(head) + 9
-    return head + b"\xcf" + struct.pack(">Q", position + len(item)) + item + packed(position) + packed(1)
+    """A zon file of one object of 3 points, tags by (name, component, flags)."""
+    return stream([{"point_component": component(3),
+                    **{name: part(obj({"data": array("?", flags), "target": text(target)}))
+                       for name, target, flags in tags}}])
 
 
 class Tags(tool.ToolTest):
@@ -44,16 +25,12 @@ class Tags(tool.ToolTest):
         one, = self.json("tag", "plane.zon", "--indices", *arguments, code=code)["objects"]
         return one["component"], one["ranges"], one["stored"]
 
-    def positions(self):
-        text = self.dumped("plane.zon", "point_position", "data")
-        return [[float(number.rstrip("f")) for number in point.strip("{} ").split(",")] for point in text.split("},")]
-
     def selected_points(self, rule):
         ranges = self.ask("--where", rule)[1]
         return [i for first, last in ranges for i in range(first, last + 1)]
 
     def test_rules_over_positions(self):
-        points = self.positions()
+        points = self.vectors("plane.zon", "point_position")
         self.assertEqual(len(points), 9)
         for rule, holds in (("x > 0", lambda x, y, z: x > 0), ("x>=0", lambda x, y, z: x >= 0),
                             (" z<0\t", lambda x, y, z: z < 0), ("z <= -1", lambda x, y, z: z <= -1),

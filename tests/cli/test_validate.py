@@ -1,14 +1,14 @@
 """zon validate: what it judges, how it reports, how it ends."""
 import tool
 import zon_files
-from zon_files import component, indices, mesh, obj, points, shapes, text
+from zon_files import NULL, component, data, frame, indices, mesh, obj, part, points, text
 
 TRIANGLE = [(0, 0, 0), (1, 0, 0), (0, 1, 0)]
 
 
 class Validate(tool.ToolTest):
     def store(self, name, *objects):
-        return self.write(name, zon_files.stream([obj(each) for each in objects]))
+        return self.write(name, zon_files.stream(objects))
 
     def judged(self, *arguments, code=0):
         """Path, kind and messages of each object."""
@@ -21,8 +21,7 @@ class Validate(tool.ToolTest):
         for shape in ("cube", "plane", "sphere"):
             self.zon("make", shape, f"{shape}.zon")
         self.zon("make", "strands", "cube.zon", "hair.zon")
-        self.write("cloud.off", "OFF 1 0 0\n0 0 0\n")
-        self.zon("import", "cloud.off", "cloud.zon")
+        self.import_cloud()
         self.assertEqual(self.judged("cube.zon", "plane.zon", "sphere.zon", "hair.zon", "cloud.zon", "--strict"),
                          [("0", kind, []) for kind in ("mesh", "mesh", "mesh", "strands", "point cloud")])
         self.assertEqual(self.zon("validate", "cube.zon").stdout, "cube.zon: object 0: mesh: valid\n")
@@ -46,7 +45,8 @@ class Validate(tool.ToolTest):
         broken = mesh(TRIANGLE, [0, 1, 2], [0, 3])
         broken["face_offset"] = points(TRIANGLE, "face_component")
         instances = {"point_component": component(2),
-                     "instance_shape": shapes([obj(mesh(TRIANGLE, [0, 1, 2], [0, 3])), obj(broken)])}
+                     "instance_shape": data(frame(363, [1, [obj(mesh(TRIANGLE, [0, 1, 2], [0, 3])), obj(broken)]]),
+                                            "point_component", part(NULL))}
         strands = {"point_component": component(2), "strand_component": component(1),
                    "point_position": points(TRIANGLE[:2]), "strand_offset": indices([0, 3], "strand_component")}
         self.store("mixed.zon", {"note": text("no geometry")}, instances, strands, {"point_position": component(1)},

@@ -1,9 +1,14 @@
 """Writes zon files of objects that no honest program makes: version 5, which has no checksums, uncompressed."""
+import itertools
 import struct
+
+# What an array of numbers is, by its form in struct: the type, and how many numbers make an element.
+ARRAYS = {"I": (122, 1), "f": (128, 1), "3f": (151, 3), "?": (130, 1)}
+NULL = b"\xc0"
 
 
 def pack(value):
-    """A MessagePack item. Bytes are taken as packed already."""
+    """A MessagePack item of a truth value, a natural number, a text or a list. Bytes are taken as packed already."""
     if isinstance(value, bytes):
         return value
     if isinstance(value, bool):
@@ -24,14 +29,6 @@ def obj(properties):
     return pack([item for pair in properties.items() for item in pair])
 
 
-def array(form, values):
-    """An array of numbers by its form in struct, as one chunk."""
-    memory = struct.pack(f"<{len(values)}{form}", *values)
-    width = 3 if form == "f" else 1
-    chunk = b"\xc6" + struct.pack(">I", len(memory)) + memory
-    return frame({"I": 122, "f": 151}[form], [0, [len(values) // width, [chunk] if memory else []]])
-
-
 def part(payload):
     return frame(362, payload)
 
@@ -40,7 +37,15 @@ def text(value):
     return frame(11, value)
 
 
-NO_NAMES = frame(131, [1, []])
+def blob(memory):
+    return b"\xc6" + struct.pack(">I", len(memory)) + memory
+
+
+def array(form, values):
+    """An array of numbers as one chunk."""
+    code, width = ARRAYS[form]
+    memory = struct.pack(f"<{len(values)}{form[-1]}", *values)
+    return frame(code, [0, [len(values) // width, [blob(memory)] if memory else []]])
 
 
 def component(count):
@@ -48,7 +53,7 @@ def component(count):
 
 
 def data(values, target, default):
-    return part(obj({"data": values, "target": text(target), "depends_on": NO_NAMES, "default": default,
+    return part(obj({"data": values, "target": text(target), "depends_on": frame(131, [1, []]), "default": default,
                      "interpolation_mode": frame(360, 1)}))
 
 
@@ -56,14 +61,8 @@ def indices(values, target):
     return data(array("I", values), target, frame(2, 0xFFFFFFFF))
 
 
-def shapes(payloads):
-    return data(frame(363, [1, payloads]), "point_component", part(b"\xc0"))
-
-
 def points(values, target="point_component"):
-    """float3 values."""
-    zero = b"\xc6" + struct.pack(">I", 12) + bytes(12)
-    return data(array("f", [x for each in values for x in each]), target, frame(31, [1, [zero]]))
+    return data(array("3f", [x for each in values for x in each]), target, frame(31, [1, [blob(bytes(12))]]))
 
 
 def mesh(positions, corners, offsets, counts=None, **more):
@@ -74,12 +73,11 @@ def mesh(positions, corners, offsets, counts=None, **more):
             "face_offset": indices(offsets, "face_component"), **more}
 
 
-def stream(payloads):
+def stream(top, shared=()):
+    """A file of objects, each a dict of name to frame. Frame (362, i) refers to object i, those on top counted first."""
     head = obj({"file_identifier": frame(2, 6611198), "file_version": frame(2, 5),
                 "compression_level": frame(6, 0), "serialize_handles": frame(10, False)})
-    items, table, position = b"", b"", len(head) + 9
-    for payload in payloads:
-        item = part(payload)
-        table += pack(position + len(items)) + pack(1)
-        items += item
-    return head + pack(position + len(items)) + items + table
+    items = [part(obj(each)) for each in (*shared, *top)]
+    *starts, end = itertools.accumulate(map(len, items), initial=len(head) + 9)
+    entries = [(start, 1) for start in starts[len(shared):]] + [(start, 0) for start in starts[:len(shared)]]
+    return head + pack(end) + b"".join(items) + b"".join(pack(number) for entry in entries for number in entry)

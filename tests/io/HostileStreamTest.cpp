@@ -1,3 +1,4 @@
+#include <support/Geometry.h>
 #include <support/StreamDescription.h>
 #include <support/Streams.h>
 #include <volume/Samples.h>
@@ -9,8 +10,8 @@
 
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <filesystem>
+#include <random>
 #include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -49,40 +50,24 @@ std::vector<std::string> sweptStreams()
     return streams;
 }
 
-/// A refusal says why in one message, or nothing when the version reads as 0.
-void expectRefusedOrEqual(std::string const& bytes, std::string const& original, std::string const& what)
-{
-    auto const result = support::read(bytes);
-    if (result.isRead)
-        EXPECT_EQ(support::describeObjects(result.objects), original) << what;
-    else
-        EXPECT_LE(result.errors.size(), 1u) << what;
-    EXPECT_TRUE(result.isRead || result.objects.empty()) << what;
-    EXPECT_TRUE(!result.isRead || result.errors.empty()) << what;
-}
-
-TEST(HostileStream, NoBeginningOfAStreamIsReadAsSomethingElse)
+TEST(HostileStream, NoBeginningAndNoFlippedByteIsReadAsSomethingElse)
 {
     for (std::string const& stream : sweptStreams()) {
         std::string const original = support::describeObjects(support::read(stream).objects);
-        for (std::size_t size = 0; size < stream.size(); ++size) {
-            auto const result = support::read(stream.substr(0, size));
-            EXPECT_FALSE(result.isRead) << size << " of " << stream.size();
-            EXPECT_EQ(result.errors.size(), 1u) << size << " of " << stream.size();
-        }
-    }
-}
-
-TEST(HostileStream, NoFlippedByteIsReadAsSomethingElse)
-{
-    for (std::string const& stream : sweptStreams()) {
-        std::string const original = support::describeObjects(support::read(stream).objects);
-        for (std::size_t at = 0; at < stream.size(); ++at)
+        for (std::size_t at = 0; at < stream.size(); ++at) {
+            SCOPED_TRACE(std::to_string(at) + " of " + std::to_string(stream.size()));
+            auto const beginning = support::read(stream.substr(0, at));
+            EXPECT_FALSE(beginning.isRead);
+            EXPECT_EQ(beginning.errors.size(), 1u);
             for (int const flip : {0x01, 0x02, 0x04, 0x08, 0x10, 0x20, 0x40, 0x80, 0xFF}) {
                 std::string flipped = stream;
                 flipped[at] = static_cast<char>(flipped[at] ^ flip);
-                expectRefusedOrEqual(flipped, original, "byte " + std::to_string(at) + " ^ " + std::to_string(flip));
+                auto const result = support::read(flipped);
+                // A refusal says why in one message, or nothing when the version reads as 0.
+                EXPECT_LE(result.errors.size(), result.isRead ? 0u : 1u) << flip;
+                EXPECT_EQ(support::describeObjects(result.objects), result.isRead ? original : "]}\n") << flip;
             }
+        }
     }
 }
 
@@ -110,13 +95,12 @@ TEST(HostileStream, AChunkThatGrowsBetweenTwoLooksStaysWithinItsArray)
         std::size_t at_;
         int looks_;
     };
-    Nexil::Array<unsigned char> values;
-    values.resize(300000);
-    std::uint32_t state = 1;
+    std::vector<unsigned char> values(300000);
+    std::mt19937 random(1);
     for (std::size_t i = 0; i < values.size(); ++i)
-        values[i] = i % 16 < 8 ? 0 : static_cast<unsigned char>((state = state * 1664525 + 1013904223) >> 24);
+        values[i] = i % 16 < 8 ? 0 : static_cast<unsigned char>(random());
     auto object = Veldrin::createObject();
-    Veldrin::setProperty(*object, "values", Nexil::makePtr<Nexil::Array<unsigned char>>(values));
+    Veldrin::setProperty(*object, "values", support::array(values));
     std::string bytes = support::written({Nexil::Ptr<Veldrin::Object>(std::move(object))}, 1);
     // In version 5, which has no checksums, an array and its only chunk that pretend to be 65536 bytes shorter.
     bytes[bytes.find("file_version") + 14] = 5;
@@ -172,18 +156,18 @@ TEST(HostileStream, NoStreamTakesMuchMoreMemoryThanItsSize)
 {
     if (!kMeasuresMemory)
         GTEST_SKIP() << "memory is measured in builds without sanitizers";
-    std::vector<std::pair<std::string, std::string>> bombs;
-    for (auto const& entry : fs::directory_iterator(VELDRIN_TEST_CORPUS "/streams/bad"))
-        if (entry.path().extension() == ".zon" && entry.path().filename().string().find("bomb") != std::string::npos)
-            bombs.emplace_back(entry.path().filename().string(), support::fileBytes(entry.path().string()));
-    ASSERT_GT(bombs.size(), 5u);
     auto expectModest = [](std::string const& name, std::string const& bytes) {
         long const peak = peakKibibytes(bytes);
         ASSERT_GE(peak, 0) << name;
         EXPECT_LE(peak, static_cast<long>(300 * bytes.size() / 1024) + 64 * 1024) << name << " of " << bytes.size();
     };
-    for (auto const& [name, bytes] : bombs)
-        expectModest(name, bytes);
+    int bombCount = 0;
+    for (auto const& entry : fs::directory_iterator(VELDRIN_TEST_CORPUS "/streams/bad"))
+        if (std::string const name = entry.path().filename(); name.find("bomb") != std::string::npos) {
+            expectModest(name, support::fileBytes(entry.path()));
+            ++bombCount;
+        }
+    EXPECT_GT(bombCount, 5);
 
     // What expands most: a million of the smallest values, in the old form that needs no checksum.
     std::string const header = valid("v2");
@@ -195,11 +179,11 @@ TEST(HostileStream, NoStreamTakesMuchMoreMemoryThanItsSize)
             bytes += element;
         return bytes;
     };
-    std::vector<std::pair<std::string, std::string>> dense;
-    dense.emplace_back("empty objects", old(list("\xCD\x01\x6B", "\x90")));
-    dense.emplace_back("empty strings", old(list("\xCC\x83", "\xA0")));
-    dense.emplace_back("empty arrays", old(list("\xCC\xF2", std::string("\x92\x00\x90", 3))));
-    dense.emplace_back("null pointers", old(list("\xCC\xF2", "\xC0")));
+    std::vector<std::pair<std::string, std::string>> dense{
+        {"empty objects", old(list("\xCD\x01\x6B", "\x90"))},
+        {"empty strings", old(list("\xCC\x83", "\xA0"))},
+        {"empty arrays", old(list("\xCC\xF2", std::string("\x92\x00\x90", 3)))},
+        {"null pointers", old(list("\xCC\xF2", "\xC0"))}};
     std::string properties("\xDD\x00\x1E\x84\x80", 5);
     for (int i = 0; i < 1000000; ++i) {
         std::string const name = std::to_string(i);

@@ -11,6 +11,8 @@
 
 #include <xxhash.h>
 
+#include <numeric>
+
 namespace {
 
 using Veldrin::createObject;
@@ -21,7 +23,7 @@ using Floats = Nexil::Ptr<Nexil::Array<float>>;
 
 constexpr char kChunkLimit[] = "VELDRIN_MAX_SERIALIZATION_ARRAY_SIZE";
 
-ObjectPtr objectWith(char const* key, Nexil::Any value)
+Nexil::MutablePtr<Veldrin::Object> objectWith(char const* key, Nexil::Any value)
 {
     auto object = createObject();
     object->setPropertyAny(key, std::move(value));
@@ -33,14 +35,6 @@ ObjectPtr readOne(std::string const& bytes)
     auto const result = support::read(bytes);
     EXPECT_TRUE(result.isRead) << testing::PrintToString(result.errors);
     return result.objects.size() == 1 ? result.objects[0] : ObjectPtr();
-}
-
-std::size_t countOf(std::string const& bytes, std::string const& part)
-{
-    std::size_t found = 0;
-    for (auto at = bytes.find(part); at != std::string::npos; at = bytes.find(part, at + 1))
-        ++found;
-    return found;
 }
 
 TEST(StreamRoundTrip, EveryTypeAtEveryLevelAndChunkLimit)
@@ -59,11 +53,9 @@ TEST(StreamRoundTrip, EveryTypeAtEveryLevelAndChunkLimit)
 
 TEST(StreamRoundTrip, ChunksAreCutWhereTheVariableSays)
 {
-    Nexil::Array<float> values;
-    values.resize(1001);
-    for (std::uint64_t i = 0; i < values.size(); ++i)
-        values[i] = static_cast<float>(i);
-    support::Objects const objects{objectWith("values", Nexil::makePtr<Nexil::Array<float>>(values))};
+    std::vector<float> values(1001);
+    std::iota(values.begin(), values.end(), 0.0f);
+    support::Objects const objects{objectWith("values", support::array(values))};
     std::string const whole(reinterpret_cast<char const*>(values.data()), 4004);
     {
         support::EnvironmentVariable const variable(kChunkLimit, "1000");
@@ -78,22 +70,20 @@ TEST(StreamRoundTrip, ChunksAreCutWhereTheVariableSays)
         }
         EXPECT_EQ(bytes.substr(at, 6), std::string("\xC4\x04", 2) + whole.substr(4000));
     }
-    struct Case {
-        char const* text;
-        bool cutsBytes;
-    };
-    for (Case const& test : {Case{"0", true},
-                             {"-5", true},
-                             {"many", true},
-                             {"", true},
-                             {" \t1x", true},
-                             {"+1", true},
-                             {"4004", false},
-                             {"99999999999999999999999", false}}) {
-        support::EnvironmentVariable const variable(kChunkLimit, test.text);
+    // What is no number, or none above 0, means chunks of one byte.
+    for (auto const& [text, cutsBytes] :
+         std::initializer_list<std::pair<char const*, bool>>{{"0", true},
+                                                             {"-5", true},
+                                                             {"many", true},
+                                                             {"", true},
+                                                             {" \t1x", true},
+                                                             {"+1", true},
+                                                             {"4004", false},
+                                                             {"99999999999999999999999", false}}) {
+        support::EnvironmentVariable const variable(kChunkLimit, text);
         std::string const bytes = support::written(objects, 0);
-        EXPECT_EQ(bytes.find(whole) == std::string::npos, test.cutsBytes) << '"' << test.text << '"';
-        EXPECT_EQ(countOf(bytes, "\xC4\x01") > 4000, test.cutsBytes) << '"' << test.text << '"';
+        EXPECT_EQ(bytes.find(whole) == std::string::npos, cutsBytes) << '"' << text << '"';
+        EXPECT_EQ(bytes.size() > 3 * whole.size(), cutsBytes) << '"' << text << '"';
     }
 }
 
@@ -102,15 +92,12 @@ TEST(StreamRoundTrip, LongArraysComeBackThroughTheWindowAndBesideIt)
     // Sizes around the point from which on bytes go straight from the stream into the array.
     for (std::uint64_t const size : {65535u, 65536u, 65537u, 300000u})
         for (int const level : {0, 9}) {
-            Nexil::Array<unsigned char> bytes;
-            bytes.resize(size);
+            std::vector<unsigned char> bytes(size);
             for (std::uint64_t i = 0; i < size; ++i)
                 bytes[i] = static_cast<unsigned char>(i * i >> 7);
-            auto const array = Nexil::makePtr<Nexil::Array<unsigned char>>(bytes);
-            auto object = createObject();
-            setProperty(*object, "first", array);
+            auto object = objectWith("first", support::array(bytes));
             setProperty(*object, "between", 7);
-            setProperty(*object, "second", Nexil::makePtr<Nexil::Array<unsigned char>>(bytes));
+            setProperty(*object, "second", support::array(bytes));
             support::Objects const objects{ObjectPtr(std::move(object))};
             std::string stream = support::written(objects, level);
             EXPECT_EQ(support::describeObjects(support::read(stream).objects), support::describeObjects(objects));
@@ -121,8 +108,7 @@ TEST(StreamRoundTrip, LongArraysComeBackThroughTheWindowAndBesideIt)
 
 TEST(StreamRoundTrip, TwinTypesComeBackAsTheCanonicalOnes)
 {
-    auto object = createObject();
-    setProperty(*object, "u", 5ul);
+    auto object = objectWith("u", 5ul);
     setProperty(*object, "s", -5l);
     setProperty(*object, "v", Veldrin::Math::Vector<long, 2>{1, -2});
     setProperty(*object, "a", support::array<unsigned long>({1, 2}));
@@ -138,15 +124,12 @@ TEST(StreamRoundTrip, TwinTypesComeBackAsTheCanonicalOnes)
 TEST(StreamRoundTrip, SharingSurvivesAndCopyOnWriteDoesNotCopyAfterReading)
 {
     auto const data = support::array<float>({1, 2, 3});
-    auto const part = objectWith("data", data);
-    auto whole = createObject();
-    setProperty(*whole, "part", part);
+    ObjectPtr const part = objectWith("data", data);
+    auto whole = objectWith("part", part);
     setProperty(*whole, "data", data);
     setProperty(*whole, "own", support::array<float>({4}));
     ObjectPtr const first(std::move(whole));
-    support::Objects const objects{first, part, ObjectPtr(), first};
-
-    auto result = support::read(support::written(objects));
+    auto result = support::read(support::written({first, part, ObjectPtr(), first}));
     ASSERT_EQ(result.objects.size(), 4u);
     EXPECT_EQ(result.objects[0], result.objects[3]);
     EXPECT_FALSE(result.objects[2]);
@@ -163,7 +146,7 @@ TEST(StreamRoundTrip, AChainOfAHundredThousandObjectsNeedsNoStack)
 {
     ObjectPtr chain = objectWith("end", true);
     for (int i = 0; i < 100000; ++i)
-        chain = objectWith("next", chain);
+        chain = objectWith("next", std::move(chain));
     ObjectPtr back = readOne(support::written({chain}, 1));
     int length = 0;
     for (; back && back->hasProperty("next"); ++length)
@@ -174,8 +157,8 @@ TEST(StreamRoundTrip, AChainOfAHundredThousandObjectsNeedsNoStack)
 
 TEST(StreamRoundTrip, AnObjectThatHoldsItselfIsRefused)
 {
-    auto const inner = objectWith("n", 1);
-    auto const outer = objectWith("inner", inner);
+    ObjectPtr const inner = objectWith("n", 1);
+    ObjectPtr const outer = objectWith("inner", inner);
     // No public way leads to a cycle; a host with its own object classes can still hand one in.
     const_cast<Veldrin::Object&>(*inner).setPropertyAny("outer", outer);
     support::Messages messages;
@@ -205,7 +188,7 @@ TEST(StreamRoundTrip, AClassThatMakesItsPropertiesUpIsAskedOnce)
     for (int const levels : {0, 31, 32, 33, 300}) {
         ObjectPtr held = Nexil::makePtr<Inventor>(1);
         for (int i = 0; i < levels; ++i)
-            held = objectWith("next", held);
+            held = objectWith("next", std::move(held));
         ObjectPtr back = readOne(support::written({held}));
         for (int i = 0; back && i < levels + 1; ++i)
             back = getPropertyAs<ObjectPtr>(*back, "next");
@@ -224,8 +207,7 @@ TEST(StreamRoundTrip, UnknownTypesAreLeftOutWithAWarning)
     struct Secret {
         int value;
     };
-    auto object = createObject();
-    setProperty(*object, "before", 1);
+    auto object = objectWith("before", 1);
     setProperty(*object, "hidden", Secret{2});
     object->setPropertyAny("nothing", {});
     setProperty(*object, "after", 3);
@@ -237,11 +219,10 @@ TEST(StreamRoundTrip, UnknownTypesAreLeftOutWithAWarning)
     ASSERT_EQ(warnings.size(), 1u);
     EXPECT_THAT(warnings[0], testing::StartsWith("Property 'hidden' is of the unknown type: '"));
     EXPECT_THAT(warnings[0], testing::EndsWith("Secret'. it will not be serialized."));
-    EXPECT_EQ(messages.errors().size(), 0u);
+    EXPECT_EQ(messages.heard.size(), 1u);
 
     support::Messages refusal;
-    auto const mixed = Nexil::makePtr<Nexil::Array<Nexil::Any>>(Nexil::Array<Nexil::Any>{Nexil::Any(Secret{1})});
-    EXPECT_EQ(support::written({objectWith("mixed", mixed)}, 9, &refusal), "");
+    EXPECT_EQ(support::written({objectWith("mixed", support::array<Nexil::Any>({Secret{1}}))}, 9, &refusal), "");
     EXPECT_THAT(refusal.errors(), testing::ElementsAre("Unserializable type found in an Any!"));
 }
 
@@ -269,9 +250,8 @@ TEST(StreamRoundTrip, WhatCouldNotBeReadAgainIsNotWritten)
 
 TEST(StreamRoundTrip, HandlesStoreTheirAddressesAndComeBackAsObjects)
 {
-    ObjectPtr const object = objectWith("n", 1);
-    ObjectPtr first = object;
-    ObjectPtr second = object;
+    ObjectPtr first = objectWith("n", 1);
+    ObjectPtr second = first;
     ObjectPtr null;
     std::ostringstream stream;
     Nexil::OutputStream output(stream);
@@ -343,18 +323,11 @@ TEST(StreamHeader, IsReadAloneAndNothingBehindIt)
 TEST(StreamFailure, NamesThePathAndLeavesTheOutputAlone)
 {
     support::Objects const objects{objectWith("n", 1)};
-    struct Case {
-        char const* path;
-        char const* message;
-    };
-    for (Case const& test : {Case{"/no/such/folder/a.zon", "Cannot open file for writing: /no/such/folder/a.zon"},
-                             {"/dev/full", "Cannot write to file: /dev/full"}}) {
-        support::Messages messages;
-        EXPECT_FALSE(Veldrin::IO::serialize(objects, test.path, {}, &messages));
-        EXPECT_THAT(messages.errors(), testing::ElementsAre(test.message));
-        EXPECT_FALSE(Veldrin::IO::serialize(objects, test.path, {}, nullptr));
-    }
     support::Messages messages;
+    for (char const* path : {"/no/such/folder/a.zon", "/dev/full"}) {
+        EXPECT_FALSE(Veldrin::IO::serialize(objects, path, {}, &messages));
+        EXPECT_FALSE(Veldrin::IO::serialize(objects, path, {}, nullptr));
+    }
     support::Objects out{ObjectPtr()};
     Veldrin::Object header;
     EXPECT_FALSE(Veldrin::IO::deserialize("/dev", out, {}, &messages));
@@ -362,7 +335,9 @@ TEST(StreamFailure, NamesThePathAndLeavesTheOutputAlone)
     EXPECT_FALSE(Veldrin::IO::deserializeHeader("/no/such/file", header, &messages));
     EXPECT_FALSE(Veldrin::IO::deserialize("/dev/null", out, {}, &messages));
     EXPECT_THAT(messages.errors(),
-                testing::ElementsAre("Cannot read from file: /dev", "Cannot open file for reading: /no/such/file",
+                testing::ElementsAre("Cannot open file for writing: /no/such/folder/a.zon",
+                                     "Cannot write to file: /dev/full", "Cannot read from file: /dev",
+                                     "Cannot open file for reading: /no/such/file",
                                      "Cannot open file for reading: /no/such/file", "Unknown msgpack error occurred"));
     EXPECT_EQ(out.size(), 1u);
     EXPECT_TRUE(header.empty());

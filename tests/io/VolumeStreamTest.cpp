@@ -24,26 +24,11 @@ using FloatArray = Nexil::Array<float>;
 using UIntArray = Nexil::Array<unsigned int>;
 using Coordinates = Nexil::Array<Coordinate>;
 
-struct Outcome {
-    support::Objects objects;
-    std::vector<std::string> warnings;
-};
-
-Outcome readBack(std::string const& bytes)
+support::ReadResult writtenAndRead(support::Objects const& objects, int level = 1)
 {
-    Outcome outcome;
-    IO::InputMemoryBuf buffer(bytes.data(), bytes.size());
-    std::istream stream(&buffer);
-    Nexil::InputStream input(stream);
-    support::Messages messages;
-    EXPECT_TRUE(IO::deserialize(input, outcome.objects, {}, &messages)) << testing::PrintToString(messages.errors());
-    outcome.warnings = messages.texts(Nexil::RuntimeMessageCategory::Warning);
-    return outcome;
-}
-
-Outcome writtenAndRead(support::Objects const& objects, int level = 1)
-{
-    return readBack(support::written(objects, level));
+    auto result = support::read(support::written(objects, level));
+    EXPECT_TRUE(result.isRead) << testing::PrintToString(result.errors);
+    return result;
 }
 
 /// A volume of everything that a volume can hold.
@@ -273,14 +258,10 @@ TEST(VolumeStream, OnlyAWholeStreamIsWarnedAbout)
     damaged.at("voxel_component").eraseProperty("count");
     std::string bytes = support::written({geometryOf(damaged), ObjectPtr(createObject())}, 0);
     bytes[bytes.size() - 1] = static_cast<char>(bytes[bytes.size() - 1] ^ 1);
-    support::Messages messages;
-    IO::InputMemoryBuf buffer(bytes.data(), bytes.size());
-    std::istream stream(&buffer);
-    Nexil::InputStream input(stream);
-    support::Objects objects;
-    EXPECT_FALSE(IO::deserialize(input, objects, {}, &messages));
-    EXPECT_EQ(messages.heard.size(), 1u);
-    EXPECT_EQ(messages.errors().size(), 1u);
+    auto const result = support::read(bytes);
+    EXPECT_FALSE(result.isRead);
+    EXPECT_EQ(result.errors.size(), 1u);
+    EXPECT_EQ(result.warnings.size(), 0u);
 }
 
 TEST(VolumeStream, ProxiesWithoutAComponentAndOutsideOfAGeometryArePlain)

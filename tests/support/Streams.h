@@ -48,6 +48,7 @@ struct ReadResult {
     bool isRead = false;
     Objects objects;
     std::vector<std::string> errors;
+    std::vector<std::string> warnings;
 };
 
 /// What the library makes of the bytes, which it sees in a block of exactly their size.
@@ -62,6 +63,7 @@ inline ReadResult read(std::string const& bytes)
     ReadResult result;
     result.isRead = Veldrin::IO::deserialize(input, result.objects, {}, &messages);
     result.errors = messages.errors();
+    result.warnings = messages.texts(Nexil::RuntimeMessageCategory::Warning);
     return result;
 }
 
