@@ -13,7 +13,7 @@ Whatever its kind, no symbol may name a type that an internal header declares.
 Usage: export_list.py LIST LIBRARY SOURCE_ROOT [--update]
   --update writes the list anew from the library; review the difference before it is committed.
 """
-import os
+import pathlib
 import re
 import subprocess
 import sys
@@ -32,22 +32,14 @@ HEADING = """# Everything {library} exports on purpose. tests/checks/export_list
 def dynamic_symbols(library):
     """[(kind letter, demangled name)] of the library's defined dynamic symbols."""
     out = subprocess.run(["nm", "-DC", "--defined-only", library], check=True, capture_output=True, text=True).stdout
-    symbols = []
-    for line in out.splitlines():
-        match = re.match(r"^[0-9a-f]*\s+(\S)\s+(.*)$", line)
-        if match:
-            symbols.append((match.group(1), match.group(2)))
-    return symbols
+    return re.findall(r"^[0-9a-f]*\s+(\S)\s+(.*)$", out, re.MULTILINE)
 
 
 def is_ours(name):
     """Whether the symbol itself, not an argument of it, lies in one of our namespaces."""
     # Template instances are printed with their return type first: cut argument lists, then take the last word.
     plain = name
-    while True:
-        shorter = re.sub(r"<[^<>]*>|\([^()]*\)", "", plain)
-        if shorter == plain:
-            break
+    while (shorter := re.sub(r"<[^<>]*>|\([^()]*\)", "", plain)) != plain:
         plain = shorter
     words = re.split(r"operator", plain, maxsplit=1)[0].replace(" const", "").split()
     return bool(words) and words[-1].split("::")[0].strip("*&") in OUR_NAMESPACES
@@ -59,28 +51,16 @@ def exported_names(symbols):
             if kind not in "WVu" or (not OF_A_TYPE.match(name) and is_ours(name))}
 
 
-def types_declared_in(root, wanted):
-    found = set()
-    for path, _, names in os.walk(os.path.join(root, "src")):
-        folders = os.path.relpath(path, root).split(os.sep)
-        hidden = "internal" in folders or "parallel" in folders
-        if hidden != wanted:
-            continue
-        for name in names:
-            if name.endswith(".h"):
-                with open(os.path.join(path, name), encoding="utf-8") as file:
-                    found.update(DECLARED_TYPE.findall(file.read()))
-    return found
+def types_declared_in(root, hidden):
+    """Classes and enumerations of the headers that are hidden, or of those that are not."""
+    return {name for path in pathlib.Path(root, "src").rglob("*.h")
+            if hidden == bool({"internal", "parallel"} & set(path.parts))
+            for name in DECLARED_TYPE.findall(path.read_text())}
 
 
 def leaks(symbols, internal_types):
     pattern = re.compile(r"::(" + "|".join(sorted(internal_types)) + r")\b") if internal_types else None
     return sorted({name for _, name in symbols if pattern and pattern.search(name)})
-
-
-def read_list(path):
-    with open(path, encoding="utf-8") as file:
-        return {line.rstrip("\n") for line in file if line.strip() and not line.startswith("#")}
 
 
 def compare(symbols, listed, internal_types):
@@ -99,12 +79,12 @@ def main():
     listing, library, root = arguments
     symbols = dynamic_symbols(library)
     if "--update" in sys.argv:
-        with open(listing, "w", encoding="utf-8") as file:
-            file.write(HEADING.format(library=os.path.splitext(os.path.basename(listing))[0]))
-            file.writelines(name + "\n" for name in sorted(exported_names(symbols)))
+        path = pathlib.Path(listing)
+        path.write_text(HEADING.format(library=path.stem) + "".join(f"{name}\n" for name in sorted(exported_names(symbols))))
         return
+    listed = {line for line in pathlib.Path(listing).read_text().splitlines() if line and not line.startswith("#")}
     internal_types = types_declared_in(root, True) - types_declared_in(root, False)
-    complaints = compare(symbols, read_list(listing), internal_types)
+    complaints = compare(symbols, listed, internal_types)
     print("\n".join(complaints + [f"{len(symbols)} symbols, {len(complaints)} complaints"]))
     sys.exit(1 if complaints else 0)
 

@@ -24,11 +24,8 @@ ObjectPtr holding(Nexil::Any value)
 std::string written(Nexil::Any value, unsigned long long maxElements = 3)
 {
     auto const text = support::dump(*holding(std::move(value)), maxElements);
-    std::string const before = "{\n    v: ";
-    std::string const after = "\n}";
-    EXPECT_EQ(text.substr(0, before.size()), before);
-    EXPECT_EQ(text.substr(text.size() - after.size()), after);
-    return text.substr(before.size(), text.size() - before.size() - after.size());
+    EXPECT_TRUE(text.starts_with("{\n    v: ") && text.ends_with("\n}")) << text;
+    return text.substr(9, text.size() - 11);
 }
 
 enum class Unheard { Of };
@@ -36,12 +33,8 @@ enum class Unheard { Of };
 TEST(DebugDump, ValuesReadAsWritten)
 {
     using namespace Math;
-    struct Case {
-        Nexil::Any value;
-        char const* text;
-    };
     using Geometry::Common::DataInterpolationMode;
-    Case const cases[] = {
+    std::pair<Nexil::Any, char const*> const cases[] = {
         {static_cast<unsigned char>(65), "65 (unsigned char)"},
         {static_cast<signed char>(-65), "-65 (signed char)"},
         {static_cast<unsigned short>(65535), "65535 (unsigned short)"},
@@ -90,8 +83,8 @@ TEST(DebugDump, ValuesReadAsWritten)
         {Nexil::Ptr<Nexil::Array<ObjectPtr>>(),
          "[] 0 elements (array<unknown data type>) (Nexil::Ptr<Nexil::Array<Nexil::Ptr<Veldrin::Object> > >)"},
     };
-    for (Case const& c : cases)
-        EXPECT_EQ(written(c.value), c.text);
+    for (auto const& [value, text] : cases)
+        EXPECT_EQ(written(value), text);
     EXPECT_NE(written(Unheard::Of).find("(unknown data type) ("), std::string::npos);
     EXPECT_EQ(written(support::array<int>({1, 2, 3, 4, 5}), 0), "[ ... ] 5 elements (array<int>)");
     EXPECT_EQ(written(support::array<int>({1, 2}), ~0ull), "[ 1, 2 ] 2 elements (array<int>)");
@@ -100,13 +93,10 @@ TEST(DebugDump, ValuesReadAsWritten)
 TEST(DebugDump, EveryValueTypeAndItsArrayIsKnownByItsName)
 {
     unsigned int typeCount = 0;
-    auto const endsWith = [](std::string const& text, std::string const& end) {
-        return text.size() >= end.size() && text.substr(text.size() - end.size()) == end;
-    };
     Geometry::Internal::forEachValueType([&]<class T>(unsigned int code, char const* name) {
         EXPECT_EQ(code, typeCount++);
         auto const single = written(T());
-        EXPECT_TRUE(endsWith(single, std::string(" (") + name + ")")) << single;
+        EXPECT_TRUE(single.ends_with(std::string(" (") + name + ")")) << single;
         auto const value = single.substr(0, single.rfind(" (" + std::string(name)));
         EXPECT_EQ(written(support::array<T>({T(), T()})),
                   "[ " + value + ", " + value + " ] 2 elements (array<" + name + ">)");

@@ -4,62 +4,41 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
-#include <functional>
-#include <utility>
 
 namespace {
 
 using Veldrin::Geometry::Common::GeoLocation;
 
+GeoLocation located(std::vector<unsigned int> const& indices, std::vector<float> const& weights)
+{
+    GeoLocation location;
+    location.ids[5] = 7;
+    location.params[3] = 2;
+    location.indices = support::array(indices);
+    location.weights = support::array(weights);
+    return location;
+}
+
 TEST(GeoLocation, AnyDifferenceInAnyFieldMakesLocationsUnequal)
 {
-    struct Case {
-        char const* what;
-        std::function<void(GeoLocation&)> change;
-    };
-    std::vector<Case> cases{
-        {"an index",
-         [](GeoLocation& l) {
-             l.indices = support::array<unsigned int>({1, 2, 4});
-         }},
-        {"fewer indices",
-         [](GeoLocation& l) {
-             l.indices = support::array<unsigned int>({1, 2});
-         }},
-        {"no indices", [](GeoLocation& l) { l.indices = nullptr; }},
-        {"a weight",
-         [](GeoLocation& l) {
-             l.weights = support::array<float>({0.5f, 0.25f});
-         }},
-        {"more weights",
-         [](GeoLocation& l) {
-             l.weights = support::array<float>({0.5f, 0.5f, 0});
-         }},
-        {"no weights", [](GeoLocation& l) { l.weights = nullptr; }},
-        {"a weight that is no number",
-         [](GeoLocation& l) {
-             l.weights = support::array<float>({0.5f, NAN});
-         }},
-    };
-    for (int i = 0; i < 6; ++i)
-        cases.push_back({"an id", [i](GeoLocation& l) { l.ids[i] ^= 0x80000000u; }});
-    for (int i = 0; i < 4; ++i)
-        cases.push_back({"a parameter", [i](GeoLocation& l) { l.params[i] += 1; }});
-
-    auto const make = [] {
-        GeoLocation location;
-        location.ids[5] = 7;
-        location.params[3] = 2;
-        location.indices = support::array<unsigned int>({1, 2, 3});
-        location.weights = support::array<float>({0.5f, 0.5f});
-        return location;
-    };
-    EXPECT_TRUE(make() == make());
-    for (Case const& c : cases) {
-        auto changed = make();
-        c.change(changed);
-        EXPECT_TRUE(changed != make()) << c.what;
-        EXPECT_FALSE(make() == changed) << c.what;
+    std::vector<unsigned int> const indices{1, 2, 3};
+    std::vector<float> const weights{0.5f, 0.5f};
+    GeoLocation const location = located(indices, weights);
+    EXPECT_TRUE(located(indices, weights) == location);
+    std::vector<GeoLocation> others(12, location);
+    others[0].indices = nullptr;
+    others[1].weights = nullptr;
+    for (std::size_t i = 0; i < 6; ++i)
+        others[2 + i].ids[i] ^= 0x80000000u;
+    for (std::size_t i = 0; i < 4; ++i)
+        others[8 + i].params[i] += 1;
+    for (auto const& differing : {std::vector{1u, 2u, 4u}, {1u, 2u}, {1u, 2u, 3u, 4u}})
+        others.push_back(located(differing, weights));
+    for (auto const& differing : {std::vector{0.5f, 0.25f}, {0.5f}, {0.5f, 0.5f, 0.0f}, {0.5f, NAN}})
+        others.push_back(located(indices, differing));
+    for (auto const& other : others) {
+        EXPECT_TRUE(other != location) << &other - others.data();
+        EXPECT_FALSE(location == other) << &other - others.data();
     }
 }
 
@@ -67,15 +46,10 @@ TEST(GeoLocation, NaNEqualsNothingExceptWithinOneSharedArray)
 {
     GeoLocation location;
     location.weights = support::array<float>({NAN});
-    GeoLocation const sharing = location;
-    EXPECT_TRUE(sharing == location);
-    EXPECT_EQ(sharing.weights, location.weights);
-
+    EXPECT_TRUE(GeoLocation(location) == location);
     location.params[1] = NAN;
-    GeoLocation const copy = location;
-    EXPECT_FALSE(copy == location);
+    EXPECT_FALSE(GeoLocation(location) == location);
     EXPECT_FALSE(location == location);
-
     GeoLocation negativeZero;
     negativeZero.params[0] = -0.0f;
     EXPECT_TRUE(negativeZero == GeoLocation());

@@ -80,12 +80,11 @@ TEST(GeoProperties, DataIsOfItsNamesTypeAndOfAnyTypeUnderOtherNames)
 /// Whether the write is made in place or on a copy, the key stays where it was, and the other holder sees nothing.
 TEST(GeoProperties, SettersCopyOnlyWhatIsShared)
 {
-    struct Case {
+    struct {
         char const* name;
         bool (*set)(Object&);
         char const* lines;
-    };
-    Case const cases[] = {
+    } const cases[] = {
         {sFaceComp, [](Object& obj) { return setElementCount(sFaceComp, 77, obj); }, "count: 77 "},
         {"face_vertex_normal_index",
          [](Object& obj) {
@@ -96,7 +95,7 @@ TEST(GeoProperties, SettersCopyOnlyWhatIsShared)
          [](Object& obj) { return setRangeGeoPropIndices("face_vertex_normal_index", nullptr, obj); },
          "indices: [  ] 0 "},
     };
-    for (Case const& c : cases)
+    for (auto const& c : cases)
         for (bool const isShared : {false, true}) {
             auto const obj = cube();
             auto const order = support::names(obj->keys());
@@ -212,15 +211,10 @@ TEST(GeoProperties, QuestionsNeverBuildData)
 TEST(GeoProperties, ChainsEndAtComponentsCyclesAndDanglingTargets)
 {
     auto const obj = createObject();
-    for (auto const& [name, target] : {std::pair{"a", "b"},
-                                       {"b", "c"},
-                                       {"loop", "loop"},
-                                       {"x", "y"},
-                                       {"y", "z"},
-                                       {"z", "y"},
-                                       {"lost", "nowhere"},
-                                       {"fresh", ""},
-                                       {"typed", "number"}})
+    std::pair<char const*, char const*> const targets[] = {{"a", "b"},    {"b", "c"},          {"loop", "loop"},
+                                                           {"x", "y"},    {"y", "z"},          {"z", "y"},
+                                                           {"fresh", ""}, {"lost", "nowhere"}, {"typed", "number"}};
+    for (auto const& [name, target] : targets)
         setProperty(*obj, name, targeting(target));
     setProperty(*obj, "c", createObject());
     setProperty(*obj, "number", 1);
@@ -228,14 +222,15 @@ TEST(GeoProperties, ChainsEndAtComponentsCyclesAndDanglingTargets)
     setProperty(*wrong, sTarget, 1);
     setProperty(*obj, "wrong", Nexil::makePtr<Object>(*wrong));
 
-    EXPECT_THAT(chain(*obj, "a"), ElementsAre("a", "b", "c"));
-    EXPECT_THAT(chain(*obj, "c"), ElementsAre("c"));
-    EXPECT_THAT(chain(*obj, "wrong"), ElementsAre("wrong"));
-    EXPECT_THAT(chain(*obj, "loop"), ElementsAre("loop"));
-    EXPECT_THAT(chain(*obj, "x"), ElementsAre("x", "y", "z"));
-    EXPECT_THAT(chain(*obj, "lost"), ElementsAre("lost", "nowhere"));
-    EXPECT_THAT(chain(*obj, "typed"), ElementsAre("typed", "number"));
-    EXPECT_THAT(chain(*obj, "fresh"), ElementsAre("fresh", ""));
+    for (auto const& expected : std::vector<std::vector<std::string>>{{"a", "b", "c"},
+                                                                      {"c"},
+                                                                      {"wrong"},
+                                                                      {"loop"},
+                                                                      {"x", "y", "z"},
+                                                                      {"lost", "nowhere"},
+                                                                      {"typed", "number"},
+                                                                      {"fresh", ""}})
+        EXPECT_EQ(chain(*obj, expected[0].c_str()), expected);
     EXPECT_EQ(getTargetComponent(*obj, "a"), "c");
     EXPECT_EQ(getTargetComponent(*obj, "fresh"), "");
 

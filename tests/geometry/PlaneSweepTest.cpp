@@ -4,22 +4,12 @@
 
 #include <gtest/gtest.h>
 
-#include <cstring>
 #include <stdexcept>
 
 namespace {
 
 using namespace Veldrin;
 using namespace Veldrin::Geometry;
-
-template <class T>
-void expectSameBytes(std::vector<T> const& expected, Object const& geometry, char const* name)
-{
-    auto const array = support::arrayIn<T>(geometry, name);
-    ASSERT_TRUE(array);
-    ASSERT_EQ(array->size(), expected.size()) << name;
-    EXPECT_EQ(std::memcmp(array->data(), expected.data(), expected.size() * sizeof(T)), 0) << name;
-}
 
 TEST(PlaneSweep, APlaneHasTheBitsOfTheSerialLoopOnEveryThreadCount)
 {
@@ -43,9 +33,10 @@ TEST(PlaneSweep, APlaneHasTheBitsOfTheSerialLoopOnEveryThreadCount)
     support::onThreadCounts([&] {
         auto const plane = createObject();
         ASSERT_TRUE(populatePlaneMesh(size, n, *plane));
-        expectSameBytes(points, *plane, sPointPosition);
-        expectSameBytes(corners, *plane, sFaceVertex);
-        expectSameBytes(offsets, *plane, sFaceOffset);
+        // No number is -0 or NaN, so that equal ones have equal bits.
+        EXPECT_TRUE(support::valuesIn<Math::float3>(*plane, sPointPosition) == points);
+        EXPECT_TRUE(support::valuesIn<unsigned int>(*plane, sFaceVertex) == corners);
+        EXPECT_TRUE(support::valuesIn<unsigned int>(*plane, sFaceOffset) == offsets);
     });
 }
 

@@ -80,7 +80,7 @@ TEST(Primitives, ACubeHasItsTablesAndFacesOutwards)
     EXPECT_TRUE(getRangeGeoProperty(*cube, "face_vertex_normal_index"));
 }
 
-TEST(Primitives, APlaneOfOneQuadIsTheDefault)
+TEST(Primitives, APlaneIsAtLeastOneQuadAndAtMostWhatItsCountsHold)
 {
     for (unsigned int subdivisions : {0u, 1u}) {
         auto const plane = createObject();
@@ -90,16 +90,11 @@ TEST(Primitives, APlaneOfOneQuadIsTheDefault)
         EXPECT_EQ(support::facesOf(*plane), (support::Polygons{{0, 1, 3, 2}}));
         EXPECT_EQ(plane->size(), 6u);
     }
-}
-
-TEST(Primitives, APlaneTooLargeForItsCountsLeavesTheObjectUntouched)
-{
     // 32768: corners. 65535: points. 65536 and more: products that wrap around in 32 and in 64 bits.
-    for (unsigned int subdivisions : {32768u, 65535u, 65536u, 0x80000000u, 0xFFFFFFFFu}) {
-        auto const plane = createObject();
-        EXPECT_FALSE(populatePlaneMesh(1, subdivisions, *plane)) << subdivisions;
-        EXPECT_TRUE(plane->empty());
-    }
+    auto const untouched = createObject();
+    for (unsigned int subdivisions : {32768u, 65535u, 65536u, 0x80000000u, 0xFFFFFFFFu})
+        EXPECT_FALSE(populatePlaneMesh(1, subdivisions, *untouched)) << subdivisions;
+    EXPECT_TRUE(untouched->empty());
 }
 
 TEST(Primitives, ASphereIsClosedFacesOutwardsAndCarriesItsNormals)
@@ -130,17 +125,18 @@ TEST(Primitives, ASphereIsClosedFacesOutwardsAndCarriesItsNormals)
 
 TEST(Primitives, ANegativeRadiusMirrorsPointsAndNegatesNormals)
 {
-    auto const outside = support::filled([](Object& object) { populateSphereMesh(1, object); });
-    auto const inside = support::filled([](Object& object) { populateSphereMesh(-1, object); });
+    auto const sphere = [](float radius, char const* name) {
+        return support::valuesIn<float3>(*support::filled([=](Object& object) { populateSphereMesh(radius, object); }),
+                                         name);
+    };
     for (char const* name : {sPointPosition, sPointNormal}) {
-        auto const a = support::valuesIn<float3>(*outside, name);
-        auto const b = support::valuesIn<float3>(*inside, name);
-        ASSERT_EQ(a.size(), 22u);
-        for (std::size_t i = 0; i < a.size(); ++i)
-            EXPECT_EQ(a[i] * -1.0f, b[i]) << name << " " << i;
+        auto const outside = sphere(1, name);
+        auto const inside = sphere(-1, name);
+        ASSERT_EQ(outside.size(), 22u);
+        for (std::size_t i = 0; i < outside.size(); ++i)
+            EXPECT_EQ(outside[i] * -1.0f, inside[i]) << name << " " << i;
     }
-    auto const nothing = support::filled([](Object& object) { populateSphereMesh(0, object); });
-    EXPECT_EQ(support::valuesIn<float3>(*nothing, sPointNormal), support::valuesIn<float3>(*outside, sPointNormal));
+    EXPECT_EQ(sphere(0, sPointNormal), sphere(1, sPointNormal));
 }
 
 } // namespace

@@ -13,12 +13,10 @@ using namespace Veldrin::Geometry;
 
 using ObjectPtr = Nexil::Ptr<Object>;
 
-struct KindOfGeometry {
+struct {
     void (*populate)(Object&);
     ObjectPtr (*prototype)();
-};
-
-KindOfGeometry const kKinds[] = {
+} const kKinds[] = {
     {&populateVolume, &getVolumePrototype},
     {&populateInstances, &getInstancesPrototype},
     {&populateMesh, &getMeshPrototype},

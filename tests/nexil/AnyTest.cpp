@@ -45,10 +45,7 @@ int typesFoundIn(Any const& any)
 
 TEST(Any, OnlyTheExactTypeIsFound)
 {
-    struct {
-        Any value;
-        Nexil::TypeId type;
-    } const cases[] = {
+    std::pair<Any, Nexil::TypeId> const cases[] = {
         {3, Nexil::TypeId::of<int>()},
         {3u, Nexil::TypeId::of<unsigned int>()},
         {3ll, Nexil::TypeId::of<long long>()},
@@ -58,18 +55,19 @@ TEST(Any, OnlyTheExactTypeIsFound)
         {Ptr<Base>(Nexil::makePtr<Derived>()), Nexil::TypeId::of<Ptr<Base>>()},
         {Nexil::makePtr<Derived>(), Nexil::TypeId::of<Ptr<Derived>>()},
     };
-    for (auto const& row : cases) {
-        EXPECT_TRUE(row.value.type() == row.type) << Nexil::anyToTypeString(row.value);
+    for (auto const& [value, type] : cases) {
+        EXPECT_TRUE(value.type() == type) << Nexil::anyToTypeString(value);
         int const foundCount =
             typesFoundIn<int, unsigned int, long, long long, char, signed char, unsigned char, bool, float, double,
                          String, Ptr<Base>, Ptr<Derived>, Nexil::MutablePtr<Base>, Nexil::MutablePtr<Derived>, Any>(
-                row.value);
-        EXPECT_EQ(foundCount, 1) << Nexil::anyToTypeString(row.value);
+                value);
+        EXPECT_EQ(foundCount, 1) << Nexil::anyToTypeString(value);
     }
     EXPECT_EQ((typesFoundIn<int, String, Ptr<Base>>(Any())), 0);
     EXPECT_FALSE(Any().type());
     EXPECT_EQ(Nexil::anyToTypeString(Any()), "");
     EXPECT_EQ(Nexil::anyToTypeString(3u), "unsigned int");
+    EXPECT_EQ(Nexil::anyToTypeString(String()), "Nexil::String");
 }
 
 template <class T>
@@ -172,7 +170,7 @@ TEST(Any, ArraysOfEveryElementAnswerForTheirSize)
         {Nexil::makePtr<Array<float>>(std::initializer_list<float>{1, 2, 3}), true, 3},
         {Nexil::makePtr<Nested>(std::initializer_list<Ptr<Array<int>>>{nullptr, nullptr}), true, 2},
         {Ptr<Array<String>>(), true, 0},
-        {foreign::make(foreign::Kind::PointerToArray), true, 2},
+        {foreign::make(foreign::PointerToArray), true, 2},
         {Array<float>{1, 2}, false, 0},
         {Nexil::makePtr<int>(3), false, 0},
         {Any(), false, 0},
@@ -189,11 +187,10 @@ struct Local {
 
 TEST(Any, ValuesOfAnotherLibraryAreFoundByTheirType)
 {
-    using foreign::Kind;
     using PairArray = Ptr<Array<foreign::Pair<int>>>;
-    Any const small = foreign::make(Kind::Small);
-    Any const heap = foreign::make(Kind::Heap);
-    Any array = foreign::make(Kind::PointerToArray);
+    Any const small = foreign::make(foreign::Small);
+    Any const heap = foreign::make(foreign::Heap);
+    Any array = foreign::make(foreign::PointerToArray);
     ASSERT_TRUE(small.get<foreign::Pair<int>>());
     EXPECT_EQ(small.get<foreign::Pair<int>>()->second, 2);
     EXPECT_FALSE(small.get<foreign::Pair<unsigned int>>());
@@ -205,19 +202,19 @@ TEST(Any, ValuesOfAnotherLibraryAreFoundByTheirType)
     (*own)[0].first = 9;
     EXPECT_EQ((**shared.get<PairArray>())[0].first, 3);
 
-    EXPECT_TRUE(foreign::finds(Kind::Small, foreign::Pair<int>{}));
-    EXPECT_TRUE(foreign::finds(Kind::Heap, foreign::Large<double>{}));
-    EXPECT_TRUE(foreign::finds(Kind::PointerToArray, PairArray()));
-    EXPECT_FALSE(foreign::finds(Kind::Small, foreign::Pair<long>{}));
+    EXPECT_TRUE(foreign::finds(foreign::Small, foreign::Pair<int>{}));
+    EXPECT_TRUE(foreign::finds(foreign::Heap, foreign::Large<double>{}));
+    EXPECT_TRUE(foreign::finds(foreign::PointerToArray, PairArray()));
+    EXPECT_FALSE(foreign::finds(foreign::Small, foreign::Pair<long>{}));
     auto const type = Nexil::TypeId::of<foreign::Pair<int>>();
     EXPECT_TRUE(small.type() == type);
     EXPECT_EQ(std::hash<Nexil::TypeId>()(small.type()), std::hash<Nexil::TypeId>()(type));
 
     // Two types that only share a name are two types.
-    Any const local = foreign::make(Kind::Local);
-    EXPECT_TRUE(foreign::finds(Kind::Local, local));
+    Any const local = foreign::make(foreign::Hidden);
+    EXPECT_TRUE(foreign::finds(foreign::Hidden, local));
     EXPECT_FALSE(local.holds<Local>());
-    EXPECT_FALSE(foreign::finds(Kind::Local, Local{7}));
+    EXPECT_FALSE(foreign::finds(foreign::Hidden, Local{7}));
 }
 
 } // namespace

@@ -16,7 +16,7 @@ struct Large {
     T values[8];
 };
 
-enum class Kind { Small, Heap, PointerToArray, Local };
+enum Kind { Small, Heap, PointerToArray, Hidden };
 
 /// A value made inside the library.
 [[nodiscard]] __attribute__((visibility("default"))) Nexil::Any make(Kind kind);

@@ -1,8 +1,7 @@
 #include <nexil/parallel/Parallel.h>
+#include <support/Threads.h>
 
 #include <gmock/gmock.h>
-#include <tbb/global_control.h>
-#include <tbb/info.h>
 
 #include <atomic>
 #include <cmath>
@@ -15,18 +14,6 @@
 namespace {
 
 namespace parallel = Nexil::parallel;
-
-/// Calls run() under limits of 1, 2, 3 and all threads, and of more than there are processors.
-template <class Run>
-void onEveryThreadCount(Run const& run)
-{
-    auto const all = static_cast<std::size_t>(tbb::info::default_concurrency());
-    for (std::size_t const threadCount : {std::size_t(1), std::size_t(2), std::size_t(3), all, std::size_t(8)}) {
-        SCOPED_TRACE(threadCount);
-        tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, threadCount);
-        run();
-    }
-}
 
 /// Cancels the running job for as long as it lives, from the question after `count` further ones on.
 struct CancelAfter {
@@ -41,7 +28,7 @@ struct CancelAfter {
 
 TEST(Parallel, ALoopCoversEachIndexOnce)
 {
-    onEveryThreadCount([] {
+    support::onThreadCounts([] {
         for (std::size_t const grain : {std::size_t(1), std::size_t(7), std::size_t(64)})
             for (std::size_t const count : {std::size_t(0), std::size_t(1), grain - 1, grain, grain + 1, 2 * grain,
                                             2 * grain + 1, 10 * grain + 3, std::size_t(5000)}) {
@@ -71,7 +58,7 @@ std::string joinsOf(std::size_t begin, std::size_t end)
 
 TEST(Parallel, AReductionJoinsInOneOrderOnEveryThreadCount)
 {
-    onEveryThreadCount([] {
+    support::onThreadCounts([] {
         for (std::size_t const count : {0u, 1u, 9u, 10u, 11u, 21u, 1003u}) {
             auto const joins = parallel::reduceInOrder(
                 count, 10, std::string(),
@@ -103,7 +90,7 @@ TEST(Parallel, ExceptionsAndCancellationLeaveTheCall)
             count, 10, 0, [](std::size_t, std::size_t, int sum) { return sum; }, [](int a, int b) { return a + b; });
     };
     auto const isCancellation = testing::ThrowsMessage<std::runtime_error>("Job cancelled");
-    onEveryThreadCount([&] {
+    support::onThreadCounts([&] {
         for (std::size_t const count : {std::size_t(5), std::size_t(1000)}) {
             for (int const questionCount : {0, count == 5 ? 0 : 3}) {
                 CancelAfter const cancel(questionCount);
@@ -122,39 +109,32 @@ TEST(Parallel, ExceptionsAndCancellationLeaveTheCall)
     });
 }
 
-TEST(Parallel, AnInnerLoopThatFailsDoesNotCutTheOuterOneShort)
+TEST(Parallel, AFailureInsideIsPassedOnAndCutsNothingElseShort)
 {
-    onEveryThreadCount([] {
+    auto const fail = [] { throw std::invalid_argument("inside"); };
+    support::onThreadCounts([&] {
         std::vector<int> visits(300);
         parallel::forRange(visits.size(), 1, [&](std::size_t begin, std::size_t end) {
             for (std::size_t i = begin; i < end; ++i) {
-                EXPECT_THROW(
-                    parallel::forRange(50, 1, [](std::size_t, std::size_t) { throw std::invalid_argument("inside"); }),
-                    std::invalid_argument);
+                EXPECT_THROW(parallel::forRange(50, 1, [&](std::size_t, std::size_t) { fail(); }),
+                             std::invalid_argument);
                 ++visits[i];
+                EXPECT_THROW(parallel::invoke(fail, [] {}), std::invalid_argument);
+                EXPECT_THROW(parallel::invoke([] {}, fail), std::invalid_argument);
             }
         });
         EXPECT_THAT(visits, testing::Each(1));
-    });
-}
-
-TEST(Parallel, InvokeRunsBothAndPassesOnTheFailureOfEither)
-{
-    onEveryThreadCount([] {
         int first = 0;
         int second = 0;
         parallel::invoke([&] { first = 1; }, [&] { second = 2; });
         EXPECT_EQ(first + second, 3);
-        auto const fail = [] { throw std::invalid_argument("this one"); };
-        EXPECT_THROW(parallel::invoke(fail, [] {}), std::invalid_argument);
-        EXPECT_THROW(parallel::invoke([] {}, fail), std::invalid_argument);
     });
 }
 
 TEST(Parallel, SortsAsTheSerialSortDoes)
 {
     std::mt19937 random(4);
-    onEveryThreadCount([&] {
+    support::onThreadCounts([&] {
         for (std::size_t const count : {0u, 1u, 2u, 499u, 500u, 501u, 50'000u}) {
             std::vector<unsigned int> numbers(count);
             for (auto& number : numbers)

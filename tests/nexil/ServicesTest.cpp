@@ -1,7 +1,6 @@
 #include <nexil/JobCancel.h>
 #include <nexil/RuntimeMessage.h>
 #include <nexil/SeededHash.h>
-#include <nexil/TypeId.h>
 
 #include <gmock/gmock.h>
 
@@ -28,14 +27,6 @@ TEST(Services, TheHostTakesMessagesAndCancelsJobs)
                 testing::ThrowsMessage<std::runtime_error>("Job cancelled"));
     Nexil::setJobCancelHook(nullptr);
     EXPECT_FALSE(Nexil::isJobCancelled());
-}
-
-TEST(Services, TypesHaveReadableNames)
-{
-    auto const name = [](Nexil::TypeId type) { return Nexil::Internal::DebugTypeId::getTypeNameForDebugOnly(type); };
-    EXPECT_EQ(name({}), "");
-    EXPECT_EQ(name(Nexil::TypeId::of<unsigned int>()), "unsigned int");
-    EXPECT_EQ(name(Nexil::TypeId::of<Nexil::String>()), "Nexil::String");
 }
 
 TEST(Services, HashesTellNamesApartByEveryByteAndTheirLength)

@@ -33,9 +33,14 @@ struct Recorder : Object {
     }
 };
 
+/// Calls what stands in a place of the virtual table, which must be the operation of this name.
 template <class Result, class... Arguments>
-Result callSlot(Object* object, std::size_t slot, Arguments... arguments)
+Result call(char const* name, Object* object, std::size_t slot, Arguments... arguments)
 {
+    struct Check {
+        char const* name;
+        ~Check() { EXPECT_EQ(lastCall, name); }
+    } const check{name};
     void* const* const table = *reinterpret_cast<void* const**>(object);
     return reinterpret_cast<Result (*)(Object*, Arguments...)>(table[slot])(object, arguments...);
 }
@@ -47,26 +52,16 @@ TEST(VirtualTable, TheTenOperationsStandInTheirPlaces)
     String const key("key");
     Any number(3);
     // The first operation, the destructor, takes two places: one destroys, the other also frees.
-    EXPECT_EQ(callSlot<std::uint64_t>(object, 2), 11u);
-    EXPECT_EQ(lastCall, "size");
-    EXPECT_TRUE(callSlot<bool>(object, 3));
-    EXPECT_EQ(lastCall, "empty");
-    EXPECT_TRUE(callSlot<bool>(object, 4, &key));
-    EXPECT_EQ(lastCall, "hasProperty");
-    EXPECT_EQ(*callSlot<Any>(object, 5, &key).get<String>(), "key");
-    EXPECT_EQ(lastCall, "getProperty");
-    EXPECT_EQ(*callSlot<Any>(object, 6, &key).get<String>(), "key");
-    EXPECT_EQ(lastCall, "extractProperty");
-    EXPECT_TRUE(callSlot<bool>(object, 7, &key));
-    EXPECT_EQ(lastCall, "eraseProperty");
-    callSlot<void>(object, 8);
-    EXPECT_EQ(lastCall, "eraseAllProperties");
-    EXPECT_EQ(callSlot<Array<String>>(object, 9)[0], "key");
-    EXPECT_EQ(lastCall, "keys");
-    EXPECT_TRUE(callSlot<bool>(object, 10, &key, &number));
-    EXPECT_EQ(lastCall, "setPropertyAny");
-    callSlot<void>(object, 0);
-    EXPECT_EQ(lastCall, "destructor");
+    EXPECT_EQ(call<std::uint64_t>("size", object, 2), 11u);
+    EXPECT_TRUE(call<bool>("empty", object, 3));
+    EXPECT_TRUE(call<bool>("hasProperty", object, 4, &key));
+    EXPECT_EQ(*call<Any>("getProperty", object, 5, &key).get<String>(), "key");
+    EXPECT_EQ(*call<Any>("extractProperty", object, 6, &key).get<String>(), "key");
+    EXPECT_TRUE(call<bool>("eraseProperty", object, 7, &key));
+    call<void>("eraseAllProperties", object, 8);
+    EXPECT_EQ(call<Array<String>>("keys", object, 9)[0], "key");
+    EXPECT_TRUE(call<bool>("setPropertyAny", object, 10, &key, &number));
+    call<void>("destructor", object, 0);
 }
 
 } // namespace
