@@ -67,14 +67,15 @@ public:
         }
     }
 
-    /// Makes two sets one with a plain store, several times cheaper than the locked one of `unite`, and adds 1 to
-    /// `linkCount` when they were two. Returns an element at or near the root: handed to the next call in the place of `a`,
-    /// it saves the way there.
+    /// Makes two sets one with a plain store, several times cheaper than the locked one of `unite`, and calls
+    /// onLink(root, lesserRoot) when they were two. Returns an element at or near the root: handed to the next call in the
+    /// place of `a`, it saves the way there.
     ///
     /// Two threads that link the same root at once lose one of the unions. They know it afterwards: no union was lost if
-    /// and only if all calls since the set was made have counted size() - rootCount() links. Otherwise every pair has to be
-    /// united again, with `unite`; what is linked already stays, and is right.
-    Index uniteLoosely(Index a, Index b, std::uint64_t& linkCount) noexcept
+    /// and only if there have been size() - rootCount() links since the set was made. Otherwise `unite` has to be called for
+    /// each pair that onLink was told, which brings back what was lost.
+    template <class OnLink>
+    Index uniteLoosely(Index a, Index b, OnLink const& onLink) noexcept(noexcept(onLink(a, b)))
     {
         // Most pairs of a mesh hang together already, under one parent.
         Index const parent = load(a);
@@ -85,8 +86,9 @@ public:
         if (a == b)
             return a;
         Index const root = std::min(a, b);
-        parentOf(std::max(a, b)).store(root, std::memory_order_relaxed);
-        ++linkCount;
+        Index const linked = std::max(a, b);
+        onLink(linked, root);
+        parentOf(linked).store(root, std::memory_order_relaxed);
         return root;
     }
 

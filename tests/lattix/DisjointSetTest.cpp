@@ -83,29 +83,29 @@ TEST(DisjointSet, LooseUnionsAreTheSameOnOneThreadAndTellOnSeveralWhetherOneWasL
         Sets sets(2000);
         std::uint64_t linkCount = 0;
         for (auto const& [a, b] : pairs) {
-            unsigned int const near = sets.uniteLoosely(a, b, linkCount);
+            unsigned int const near = sets.uniteLoosely(a, b, [&](unsigned int, unsigned int) { ++linkCount; });
             EXPECT_EQ(sets.find(near), sets.find(a));
             EXPECT_EQ(sets.find(near), sets.find(b));
         }
         EXPECT_EQ(linkCount, sets.size() - sets.rootCount());
         expectSets(sets, labels);
     }
-    // Sets that say that nothing was lost must be right as they are, others once all pairs are united again.
+    // Sets that say that nothing was lost must be right as they are, others once all links are made again.
     for (int round = 0; round < 200; ++round) {
         Sets sets(2000);
-        std::uint64_t linkCounts[2] = {0, 0};
+        std::vector<std::pair<unsigned int, unsigned int>> links[2];
         auto const half = [&](std::size_t part) {
-            std::uint64_t linkCount = 0;
+            auto const onLink = [&](unsigned int a, unsigned int b) { links[part].emplace_back(a, b); };
             for (std::size_t i = part; i < pairs.size(); i += 2)
-                sets.uniteLoosely(pairs[i].first, pairs[i].second, linkCount);
-            linkCounts[part] = linkCount;
+                sets.uniteLoosely(pairs[i].first, pairs[i].second, onLink);
         };
         std::thread other(half, 1);
         half(0);
         other.join();
-        if (linkCounts[0] + linkCounts[1] != sets.size() - sets.rootCount())
-            for (auto const& [a, b] : pairs)
-                sets.unite(a, b);
+        if (links[0].size() + links[1].size() != sets.size() - sets.rootCount())
+            for (auto const& part : links)
+                for (auto const& [a, b] : part)
+                    sets.unite(a, b);
         expectSets(sets, labels);
     }
 }

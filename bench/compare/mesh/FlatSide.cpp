@@ -78,6 +78,11 @@ namespace {
         }
     }
 
+    struct FaceCorner {
+        std::uint32_t face;
+        std::uint32_t corner;
+    };
+
     template <std::uint32_t N>
     class Loops {
     public:
@@ -136,8 +141,8 @@ namespace {
             normalise();
         }
 
-        /// Corners by point, and for each side of a face the side that runs the other way.
-        std::int64_t adjacency(std::uint32_t* opposite, std::uint32_t* pointCorners, std::uint32_t* ends) const
+        /// Faces and their corners by point, and for each side of a face the side that runs the other way.
+        std::int64_t adjacency(FaceCorner* opposite, FaceCorner* pointFaces, std::uint32_t* ends) const
         {
             std::fill_n(ends, pointCount_ + 1, 0u);
             for (std::size_t c = 0; c < cornerCount_; ++c)
@@ -145,18 +150,19 @@ namespace {
             std::uint32_t sum = 0;
             for (std::size_t p = 0; p <= pointCount_; ++p)
                 sum += std::exchange(ends[p], sum);
-            for (std::size_t c = 0; c < cornerCount_; ++c)
-                pointCorners[ends[corners_[c]]++] = static_cast<std::uint32_t>(c);
+            for (std::uint32_t f = 0; f < cornerCount_ / N; ++f)
+                for (std::uint32_t k = 0; k < N; ++k)
+                    pointFaces[ends[corners_[f * N + k]]++] = {f, k};
             std::int64_t found = 0;
             for (std::size_t f = 0; f < cornerCount_; f += N)
                 for (std::uint32_t k = 0; k < N; ++k) {
                     std::uint32_t const from = corners_[f + k];
                     std::uint32_t const to = corners_[f + (k + 1) % N];
-                    opposite[f + k] = ~0u;
+                    opposite[f + k] = {~0u, ~0u};
                     for (std::uint32_t i = to == 0 ? 0 : ends[to - 1]; i < ends[to]; ++i) {
-                        std::uint32_t const c = pointCorners[i];
-                        if (corners_[c % N == N - 1 ? c + 1 - N : c + 1] == from) {
-                            opposite[f + k] = c;
+                        auto const [face, corner] = pointFaces[i];
+                        if (corners_[face * N + (corner + 1) % N] == from) {
+                            opposite[f + k] = {face, corner};
                             ++found;
                             break;
                         }
@@ -265,8 +271,8 @@ namespace {
             mesh_ = &mesh;
             normals_.assign(mesh.points.size(), {});
             faceNormals_.assign(mesh.faceCount(), {});
-            opposite_.assign(mesh.corners.size(), 0);
-            pointCorners_.assign(mesh.corners.size(), 0);
+            opposite_.assign(mesh.corners.size(), {});
+            pointFaces_.assign(mesh.corners.size(), {});
             ends_.assign(mesh.points.size() + 1, 0);
         }
 
@@ -297,7 +303,7 @@ namespace {
             case Kernel::AreaNormals: return loops.areaNormals();
             case Kernel::AngleNormals: return loops.angleNormals();
             case Kernel::Adjacency:
-                number_ = loops.adjacency(opposite_.data(), pointCorners_.data(), ends_.data());
+                number_ = loops.adjacency(opposite_.data(), pointFaces_.data(), ends_.data());
                 return;
             case Kernel::Components: number_ = loops.components(); return;
             case Kernel::Euler: number_ = loops.euler(); return;
@@ -307,8 +313,8 @@ namespace {
         PlainMesh const* mesh_ = nullptr;
         std::vector<Point> normals_;
         std::vector<Point> faceNormals_;
-        std::vector<std::uint32_t> opposite_;
-        std::vector<std::uint32_t> pointCorners_;
+        std::vector<FaceCorner> opposite_;
+        std::vector<FaceCorner> pointFaces_;
         std::vector<std::uint32_t> ends_;
         std::int64_t number_ = 0;
     };

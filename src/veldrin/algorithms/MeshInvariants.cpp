@@ -6,6 +6,9 @@
 #include <veldrin/algorithms/internal/MeshFaces.h>
 #include <veldrin/geometry/Prototypes.h>
 
+#include <algorithm>
+#include <vector>
+
 namespace Veldrin::Geometry::Mesh {
 
 namespace {
@@ -29,26 +32,37 @@ namespace {
         return static_cast<int>(cut(faces.faceCount()) + (cut(faces.pointCount()) - cut(edges.edgeCount())));
     }
 
+    struct Link {
+        unsigned int root;
+        unsigned int lesserRoot;
+    };
+
     /// Unites all pairs that unitePairs(begin, end, unite) hands to unite(a, b) over [0, count), and returns the number of
-    /// sets. What unite(a, b) returns may stand for either in the next call. The first pass links without locks; only where two threads got into each other's way is there a second one.
+    /// sets. What unite(a, b) returns may stand for either in the next call. Sets are linked without locks; only what was
+    /// linked is united once more, and only where two threads got into each other's way.
     template <class UnitePairs>
     std::uint64_t uniteAll(Sets& sets, std::uint64_t count, std::size_t grain, UnitePairs const& unitePairs)
     {
-        auto const links = parallel::reduceInOrder(
-            count, grain, std::uint64_t(0),
-            [&](std::size_t begin, std::size_t end, std::uint64_t linked) {
-                unitePairs(begin, end, [&](unsigned int a, unsigned int b) { return sets.uniteLoosely(a, b, linked); });
-                return linked;
-            },
-            [](std::uint64_t left, std::uint64_t right) { return left + right; });
+        std::vector<std::vector<Link>> links(count / grain + 1);
+        parallel::forRange(links.size(), 1, [&](std::size_t firstRange, std::size_t endRange) {
+            for (std::size_t range = firstRange; range < endRange; ++range) {
+                auto const onLink = [&found = links[range]](unsigned int root, unsigned int lesserRoot) {
+                    found.push_back({root, lesserRoot});
+                };
+                unitePairs(range * grain, std::min<std::uint64_t>(count, (range + 1) * grain),
+                           [&](unsigned int a, unsigned int b) { return sets.uniteLoosely(a, b, onLink); });
+            }
+        });
+        std::uint64_t linkCount = 0;
+        for (auto const& found : links)
+            linkCount += found.size();
         std::uint64_t const roots = sets.rootCount();
-        if (links == sets.size() - roots)
+        if (linkCount == sets.size() - roots)
             return roots;
-        parallel::forRange(count, grain, [&](std::size_t begin, std::size_t end) {
-            unitePairs(begin, end, [&](unsigned int a, unsigned int b) {
-                sets.unite(a, b);
-                return a;
-            });
+        parallel::forRange(links.size(), 1, [&](std::size_t firstRange, std::size_t endRange) {
+            for (std::size_t range = firstRange; range < endRange; ++range)
+                for (Link const& link : links[range])
+                    sets.unite(link.root, link.lesserRoot);
         });
         return sets.rootCount();
     }
