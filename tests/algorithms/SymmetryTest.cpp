@@ -1,0 +1,138 @@
+#include "EdgeOracle.h"
+
+#include <veldrin/algorithms/FaceVertexAdjacency.h>
+#include <veldrin/algorithms/MeshDiagnostic.h>
+#include <veldrin/algorithms/MeshInvariants.h>
+#include <veldrin/algorithms/MeshNormals.h>
+#include <veldrin/algorithms/NormalsTopology.h>
+#include <veldrin/geometry/FaceEdge.h>
+
+#include <gtest/gtest.h>
+
+#include <numeric>
+
+// What must stay, and what must follow, when points are numbered otherwise or all faces are turned over.
+
+namespace {
+
+using namespace Veldrin::GeometryAlgorithms;
+using namespace Veldrin::Geometry::Mesh;
+using support::Polygons;
+using Veldrin::Math::float3;
+
+constexpr unsigned int kPointCount = 60;
+
+/// All that is computed of a mesh.
+struct Answers {
+    Nexil::Array<float3> faceNormals, pointNormals[4];
+    Nexil::Array<FaceEdge> edges, pointFaces;
+    Nexil::Array<unsigned int> pointFaceIndex, groups;
+    unsigned int groupCount = 0;
+    std::vector<int> numbers;
+    Diagnostic found;
+
+    Answers(std::vector<float3> const& points, Polygons const& faces)
+    {
+        auto const mesh = support::mesh(points, faces);
+        computeMeshFaceNormals(*mesh, faceNormals);
+        for (int variant = 0; variant < 4; ++variant)
+            computeMeshVertexNormals(*mesh, variant >= 2, variant % 2 == 1, pointNormals[variant]);
+        EXPECT_TRUE(buildFaceVertexAdjacency(*mesh, edges, pointFaces, pointFaceIndex, nullptr));
+        computeMeshNormalsTopology(*mesh, {}, 1.0f, groups, groupCount, nullptr);
+        auto const betti = bettiNumbers(*mesh);
+        numbers = {eulerCharacteristic(*mesh), connectedComponents(*mesh), betti.x, betti.y, betti.z};
+        found = diagnose(*mesh);
+    }
+
+    [[nodiscard]] std::vector<FaceEdge> facesOf(unsigned int point) const
+    {
+        return {pointFaces.begin() + pointFaceIndex[point], pointFaces.begin() + pointFaceIndex[point + 1]};
+    }
+};
+
+std::vector<float3> randomPoints(std::mt19937& random)
+{
+    auto const coordinate = [&] { return static_cast<float>(random() % 2001) / 100 - 10; };
+    std::vector<float3> points(kPointCount);
+    for (float3& p : points)
+        p = {coordinate(), coordinate(), coordinate()};
+    return points;
+}
+
+Polygons facesWithin(unsigned int faceSize, unsigned int seed)
+{
+    auto faces = support::randomFaces(kPointCount - 5, 100, faceSize, seed);
+    for (auto& face : faces)
+        for (unsigned int& corner : face)
+            corner = std::min(corner, kPointCount - 1);
+    return faces;
+}
+
+TEST(Symmetry, NumberingPointsOtherwiseOnlyNumbersResultsOtherwise)
+{
+    for (unsigned int seed = 0; seed < 12; ++seed) {
+        std::mt19937 random(seed);
+        auto const points = randomPoints(random);
+        auto const faces = facesWithin(seed % 3 == 0 ? 0 : seed % 3 + 2, seed);
+        std::vector<unsigned int> number(kPointCount);
+        std::iota(number.begin(), number.end(), 0u);
+        std::shuffle(number.begin(), number.end(), random);
+        auto renumbered = points;
+        for (unsigned int p = 0; p < kPointCount; ++p)
+            renumbered[number[p]] = points[p];
+        auto renamed = faces;
+        for (auto& face : renamed)
+            for (unsigned int& corner : face)
+                corner = number[corner];
+
+        Answers const before(points, faces);
+        Answers const after(renumbered, renamed);
+        EXPECT_EQ(after.faceNormals, before.faceNormals);
+        EXPECT_EQ(after.edges, before.edges);
+        EXPECT_EQ(after.groups, before.groups);
+        EXPECT_EQ(after.groupCount, before.groupCount);
+        EXPECT_EQ(after.numbers, before.numbers);
+        EXPECT_EQ(after.found.degenerateFaces, before.found.degenerateFaces);
+        EXPECT_EQ(after.found.zeroAreaFaces, before.found.zeroAreaFaces);
+        EXPECT_EQ(after.found.nonManifoldFaces, before.found.nonManifoldFaces);
+        EXPECT_EQ(after.found.inconsistentFaces, before.found.inconsistentFaces);
+        EXPECT_EQ(after.found.isolatedPoints.size(), before.found.isolatedPoints.size());
+        for (unsigned int p = 0; p < kPointCount; ++p) {
+            EXPECT_EQ(after.facesOf(number[p]), before.facesOf(p));
+            for (int variant = 0; variant < 4; ++variant)
+                EXPECT_EQ(after.pointNormals[variant][number[p]], before.pointNormals[variant][p]) << variant;
+        }
+    }
+}
+
+TEST(Symmetry, TurningAllFacesOverTurnsNormalsAndDirectionsOnly)
+{
+    for (unsigned int seed = 0; seed < 12; ++seed) {
+        std::mt19937 random(seed);
+        auto const points = randomPoints(random);
+        auto faces = facesWithin(3, seed);
+        std::erase_if(faces, [](auto const& f) { return f[0] == f[1] || f[1] == f[2] || f[2] == f[0]; });
+        auto turned = faces;
+        for (auto& face : turned)
+            std::swap(face[1], face[2]);
+
+        Answers const before(points, faces);
+        Answers const after(points, turned);
+        auto const expectTurned = [](float3 const& now, float3 const& then) {
+            bool const hasNone = then == float3{0, 1, 0};
+            EXPECT_EQ(now, (hasNone ? then : float3{-then.x, -then.y, -then.z}));
+        };
+        for (std::size_t f = 0; f < faces.size(); ++f) {
+            expectTurned(after.faceNormals[f], before.faceNormals[f]);
+            // The side from corner k to the next is the one that ends at corner k now.
+            for (std::size_t k = 0; k < 3; ++k)
+                EXPECT_EQ(after.edges[3 * f + 2 - k].face, before.edges[3 * f + k].face);
+        }
+        for (unsigned int p = 0; p < kPointCount; ++p)
+            expectTurned(after.pointNormals[0][p], before.pointNormals[0][p]);
+        EXPECT_EQ(after.numbers, before.numbers);
+        EXPECT_EQ(after.found, before.found);
+    }
+}
+
+} // namespace
