@@ -31,23 +31,29 @@ namespace Internal {
         std::size_t elementSize = 0;
     };
 
-    /// Voxels of a list that follow each other in it and lie in one leaf tile.
+    /// Voxels that follow each other in a list and lie in one leaf tile; the next run begins where they end.
     struct VoxelRun {
+        unsigned int begin; // from its chunk's first voxel on
+        unsigned int tile;  // of those of its chunk
+    };
+
+    /// A part of a list of voxels.
+    struct VoxelChunk {
         std::uint64_t begin = 0;
         std::uint64_t end = 0;
+        Nexil::Array<VoxelRun> runs;
+        /// The leaf tile that each of the chunk's tiles is.
+        Nexil::Array<unsigned int> leaves;
     };
 
     /// Where the values of a list of voxels go.
     template <class Traits>
     struct VoxelLayout {
         Nexil::Ptr<VoxelTopology<Traits>> topology;
-        /// Sorted by leaf tile, then by place in the list.
-        Nexil::Array<VoxelRun> runs;
-        /// One per leaf tile, and one behind.
-        Nexil::Array<std::uint64_t> runOffsets;
+        Nexil::Array<VoxelChunk> chunks;
     };
 
-    /// Sorts voxels into tiles; the topology is null on failure.
+    /// Finds the tiles of voxels; the topology is null on failure.
     template <class Traits>
     VELDRIN_PLATFORM_API VoxelLayout<Traits> layOutVoxels(GridDescription const& description,
                                                           Nexil::Array<Coordinate> const& voxels);
@@ -74,7 +80,7 @@ namespace Internal {
 /// voxels: in any order; of one that comes several times, the last value stays.
 /// values: one per voxel; another number of them gives an empty grid.
 /// background: all other voxels, and the channel's default.
-/// Cost: n log n at worst; near linear where neighbours in the list are neighbours in space.
+/// Cost: linear in the list, n log n in its tiles; least where neighbours in the list are neighbours in space.
 template <class Traits, class E>
     requires std::is_trivially_copyable_v<E>
 [[nodiscard]] Grid<Traits> buildFromVoxels(GridDescription const& description, Nexil::Array<Coordinate> const& voxels,

@@ -1,141 +1,88 @@
 #include <vld/BuildFromValues.h>
 
+#include <nexil/JobCancel.h>
 #include <nexil/parallel/Parallel.h>
+#include <nexil/parallel/Scan.h>
+#include <vld/TileHash.h>
 #include <vld/internal/ElementWrites.h>
+#include <vld/internal/TileNumbering.h>
 #include <vld/internal/TopologyAssembly.h>
 
 #include <algorithm>
-#include <array>
-#include <bit>
 
 namespace VLD::TileTree3D::Internal {
 
 namespace {
 
     namespace grain {
-        constexpr std::size_t kVoxels = 16384;
-        constexpr std::size_t kTiles = 256;
+        constexpr std::uint64_t kVoxels = 65536;
+        constexpr std::uint64_t kTiles = 4096;
     } // namespace grain
 
-    /// Tile numbers along each axis, from the lowest tile of the list on.
-    using TileNumbers = std::array<std::uint32_t, 3>;
-
-    template <class Traits>
-    TileNumbers numbersOf(Coordinate const& voxel)
-    {
-        return {tileNumber<Traits::kDataWidth>(voxel.x), tileNumber<Traits::kDataWidth>(voxel.y),
-                tileNumber<Traits::kDataWidth>(voxel.z)};
-    }
-
-    struct Extent {
-        TileNumbers low{0xFFFFFFFFu, 0xFFFFFFFFu, 0xFFFFFFFFu};
-        TileNumbers high{0, 0, 0};
-        bool isWithin = true;
-
-        void join(Extent const& other)
-        {
-            for (std::size_t axis = 0; axis < 3; ++axis) {
-                low[axis] = std::min(low[axis], other.low[axis]);
-                high[axis] = std::max(high[axis], other.high[axis]);
-            }
-            isWithin = isWithin && other.isWithin;
-        }
+    /// A chunk, and which tiles it has; none when one of its voxels lies outside the limits.
+    struct FoundChunk {
+        VoxelChunk chunk;
+        TileNumbering tiles;
+        bool isWithinLimits = true;
     };
 
     template <class Traits>
-    Extent extentOf(Nexil::Array<Coordinate> const& voxels)
+    void findRuns(Nexil::Array<Coordinate> const& voxels, FoundChunk& found)
     {
-        return Nexil::parallel::reduceInOrder(
-            voxels.size(), grain::kVoxels, Extent(),
-            [&](std::size_t begin, std::size_t end, Extent extent) {
-                for (std::size_t i = begin; i < end; ++i) {
-                    TileNumbers const tile = numbersOf<Traits>(voxels[i]);
-                    extent.join({tile, tile, isWithinLimits(voxels[i])});
-                }
-                return extent;
-            },
-            [](Extent left, Extent const& right) {
-                left.join(right);
-                return left;
-            });
+        constexpr unsigned int w = Traits::kDataWidth;
+        auto isApart = [](int v, int start) {
+            return static_cast<unsigned int>(v) - static_cast<unsigned int>(start) >= w;
+        };
+        Coordinate const* const first = voxels.data() + found.chunk.begin;
+        std::uint64_t const count = found.chunk.end - found.chunk.begin;
+        Coordinate tile{};
+        for (std::uint64_t i = 0; i < count; ++i) {
+            if (i % grain::kVoxels == 0)
+                Nexil::Internal::throwIfJobCancelled();
+            Coordinate const voxel = first[i];
+            if (i != 0 && !isApart(voxel.x, tile.x) && !isApart(voxel.y, tile.y) && !isApart(voxel.z, tile.z))
+                continue;
+            // The limits cut no tile.
+            if (!isWithinLimits(voxel)) {
+                found.isWithinLimits = false;
+                return;
+            }
+            tile = tileOrigin<Traits::kDataWidth>(voxel);
+            found.chunk.runs.push_back({static_cast<unsigned int>(i), found.tiles.numberOf(tile)});
+        }
     }
 
-    /// A tile as one number where the list's extent allows it, which it mostly does: sorting is then twice as fast.
-    struct NarrowKey {
-        using Type = std::uint64_t;
-        TileNumbers low;
-        unsigned int yBits, zBits;
-
-        Type operator()(TileNumbers const& tile) const
-        {
-            return (std::uint64_t(tile[0] - low[0]) << yBits | (tile[1] - low[1])) << zBits | (tile[2] - low[2]);
-        }
-    };
-
-    struct WideKey {
-        using Type = TileNumbers;
-        Type operator()(TileNumbers const& tile) const { return tile; }
-    };
-
-    template <class Key>
-    struct KeyedRun {
-        Key key;
-        VoxelRun run;
-    };
-
-    /// All runs of the list. Blocks of fixed length find theirs at once; a run ends where its block does.
-    template <class Traits, class Key>
-    Nexil::Array<KeyedRun<typename Key::Type>> sortedRuns(Nexil::Array<Coordinate> const& voxels, Key const& keyOf)
+    /// Writes the values of those of a chunk's voxels that lie in the leaf tiles [firstLeaf, lastLeaf).
+    template <class Traits, class Size>
+    void writeChunk(VoxelChunk const& chunk, std::uint64_t firstLeaf, std::uint64_t lastLeaf,
+                    Coordinate const* leafOrigins, Coordinate const* voxels, std::byte const* values,
+                    std::byte* elements, Size size)
     {
-        using Run = KeyedRun<typename Key::Type>;
-        std::uint64_t const count = voxels.size();
-        std::uint64_t const blockCount = (count + grain::kVoxels - 1) / grain::kVoxels;
-        Nexil::Array<Nexil::Array<Run>> blocks;
-        blocks.resize(blockCount);
-        Nexil::parallel::forRange(blockCount, 1, [&](std::size_t first, std::size_t last) {
-            for (std::size_t block = first; block < last; ++block) {
-                std::uint64_t const end = std::min<std::uint64_t>(count, (block + 1) * grain::kVoxels);
-                Nexil::Array<Run>& runs = blocks[block];
-                for (std::uint64_t i = block * grain::kVoxels; i < end; ++i) {
-                    auto const key = keyOf(numbersOf<Traits>(voxels[i]));
-                    if (runs.empty() || runs[runs.size() - 1].key != key)
-                        runs.push_back({key, {i, i}});
-                    runs[runs.size() - 1].run.end = i + 1;
-                }
-            }
-        });
-        std::uint64_t runCount = 0;
-        for (auto const& block : blocks)
-            runCount += block.size();
-        Nexil::Array<Run> runs;
-        runs.reserve(runCount);
-        for (auto const& block : blocks)
-            for (Run const& run : block)
-                runs.push_back(run);
-        Nexil::parallel::sort(runs.begin(), runs.end(), [](Run const& a, Run const& b) {
-            return a.key == b.key ? a.run.begin < b.run.begin : a.key < b.key;
-        });
-        return runs;
+        std::uint64_t const runCount = chunk.runs.size();
+        VoxelRun const* const runs = chunk.runs.data();
+        unsigned int const* const leaves = chunk.leaves.data();
+        for (std::uint64_t r = 0; r < runCount; ++r) {
+            if (r % grain::kVoxels == 0)
+                Nexil::Internal::throwIfJobCancelled();
+            std::uint64_t const leaf = leaves[runs[r].tile];
+            if (leaf < firstLeaf || leaf >= lastLeaf)
+                continue;
+            Coordinate const origin = leafOrigins[leaf];
+            std::uint64_t const end = r + 1 == runCount ? chunk.end : chunk.begin + runs[r + 1].begin;
+            for (std::uint64_t i = chunk.begin + runs[r].begin; i < end; ++i)
+                copyElement(elements,
+                            leaf * Traits::kLeafVoxels + VoxelTopology<Traits>::placeInLeaf(origin, voxels[i]), values,
+                            i, size);
+        }
     }
 
-    template <class Traits, class Key>
-    VoxelLayout<Traits> layOut(GridDescription const& description, Nexil::Array<Coordinate> const& voxels,
-                               Key const& keyOf)
+    /// One chunk per thread, so that most tiles are found in few chunks; what is made of them depends on no cut.
+    std::uint64_t chunkCountFor(std::uint64_t voxelCount)
     {
-        auto const keyed = sortedRuns<Traits>(voxels, keyOf);
-        VoxelLayout<Traits> layout;
-        layout.runs.reserve(keyed.size());
-        Nexil::Array<Coordinate> origins;
-        for (std::uint64_t i = 0; i < keyed.size(); ++i) {
-            if (i == 0 || keyed[i].key != keyed[i - 1].key) {
-                layout.runOffsets.push_back(i);
-                origins.push_back(tileOrigin<Traits::kDataWidth>(voxels[keyed[i].run.begin]));
-            }
-            layout.runs.push_back(keyed[i].run);
-        }
-        layout.runOffsets.push_back(keyed.size());
-        layout.topology = assembleTopology<Traits>(description.topologyName, std::move(origins));
-        return layout;
+        std::uint64_t const forThreads =
+            std::min<std::uint64_t>(Nexil::parallel::threadCount(), voxelCount / grain::kVoxels);
+        // Runs count the voxels of their chunk by 32 bits.
+        return std::max(forThreads, voxelCount / kNoElement + 1);
     }
 
 } // namespace
@@ -145,15 +92,38 @@ VoxelLayout<Traits> layOutVoxels(GridDescription const& description, Nexil::Arra
 {
     if (!isUsable(description))
         return {};
-    Extent const extent = extentOf<Traits>(voxels);
-    if (!extent.isWithin)
-        return {};
-    auto bits = [&](std::size_t axis) {
-        return voxels.empty() ? 0u : static_cast<unsigned int>(std::bit_width(extent.high[axis] - extent.low[axis]));
-    };
-    if (bits(0) + bits(1) + bits(2) <= 64 && bits(1) + bits(2) < 64)
-        return layOut<Traits>(description, voxels, NarrowKey{extent.low, bits(1), bits(2)});
-    return layOut<Traits>(description, voxels, WideKey{});
+    std::uint64_t const chunkCount = chunkCountFor(voxels.size());
+    Nexil::Array<FoundChunk> found;
+    found.resize(chunkCount);
+    Nexil::parallel::forRange(chunkCount, 1, [&](std::size_t first, std::size_t last) {
+        for (std::size_t i = first; i < last; ++i) {
+            found[i].chunk.begin = voxels.size() * i / chunkCount;
+            found[i].chunk.end = voxels.size() * (i + 1) / chunkCount;
+            findRuns<Traits>(voxels, found[i]);
+        }
+    });
+    Nexil::Array<Coordinate> origins;
+    for (FoundChunk const& part : found) {
+        if (!part.isWithinLimits)
+            return {};
+        for (Coordinate const& origin : part.tiles.origins())
+            origins.push_back(origin);
+    }
+    sortUnique(origins);
+
+    TileHash const leaves(origins);
+    VoxelLayout<Traits> layout;
+    for (FoundChunk& part : found) {
+        auto const& tiles = part.tiles.origins();
+        Nexil::Internal::resizeUninitialized(part.chunk.leaves, tiles.size());
+        Nexil::parallel::forRange(tiles.size(), grain::kTiles, [&](std::size_t begin, std::size_t end) {
+            for (std::size_t tile = begin; tile < end; ++tile)
+                part.chunk.leaves[tile] = leaves.find(tiles[tile]);
+        });
+        layout.chunks.push_back(std::move(part.chunk));
+    }
+    layout.topology = assembleTopology<Traits>(description.topologyName, std::move(origins));
+    return layout;
 }
 
 template <class Traits>
@@ -161,16 +131,24 @@ void writeVoxels(VoxelLayout<Traits> const& layout, Nexil::Array<Coordinate> con
                  std::byte* elements)
 {
     VoxelTopology<Traits> const& topology = *layout.topology;
+    // Each stripe of leaf tiles is written by one thread that goes through the whole list, so that the last value of a voxel
+    // stays. Where runs are long, going through them costs little, and stripes are so many that each stays in the cache.
+    std::uint64_t runCount = 1;
+    for (VoxelChunk const& chunk : layout.chunks)
+        runCount += chunk.runs.size();
+    std::uint64_t const leafCount = topology.leafCount();
+    std::uint64_t const stripeCount = std::min<std::uint64_t>(
+        leafCount,
+        std::max<std::uint64_t>(Nexil::parallel::threadCount(), std::min<std::uint64_t>(voxels.size() / runCount, 64)));
     withElementSize(bytes.elementSize, [&](auto size) {
-        Nexil::parallel::forRange(topology.leafCount(), grain::kTiles, [&](std::size_t begin, std::size_t end) {
-            fillElements(elements, begin * Traits::kLeafVoxels, end * Traits::kLeafVoxels, bytes.background, size);
-            for (std::size_t leaf = begin; leaf < end; ++leaf) {
-                Coordinate const origin = topology.leafOrigins()[leaf];
-                for (std::uint64_t r = layout.runOffsets[leaf]; r < layout.runOffsets[leaf + 1]; ++r)
-                    for (std::uint64_t i = layout.runs[r].begin; i < layout.runs[r].end; ++i)
-                        copyElement(elements, leaf * Traits::kLeafVoxels + topology.placeInLeaf(origin, voxels[i]),
-                                    bytes.values, i, size);
-            }
+        Nexil::parallel::forRange(stripeCount, 1, [&](std::size_t firstStripe, std::size_t lastStripe) {
+            std::uint64_t const firstLeaf = leafCount * firstStripe / stripeCount;
+            std::uint64_t const lastLeaf = leafCount * lastStripe / stripeCount;
+            fillElements(elements, firstLeaf * Traits::kLeafVoxels, lastLeaf * Traits::kLeafVoxels, bytes.background,
+                         size);
+            for (VoxelChunk const& chunk : layout.chunks)
+                writeChunk<Traits>(chunk, firstLeaf, lastLeaf, topology.leafOrigins().data(), voxels.data(),
+                                   bytes.values, elements, size);
         });
         fillElements(elements, topology.voxelCount(), topology.elementCount(), bytes.background, size);
     });

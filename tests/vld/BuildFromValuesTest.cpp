@@ -22,7 +22,6 @@ struct Cloud {
     int spread;
 };
 
-// The last two need more than 64 bits to tell tiles apart.
 std::vector<Cloud> const kClouds{
     {"around the origin", {{0, 0, 0}}, 9},
     {"at -2^30", {{-(1 << 30), -(1 << 30), -(1 << 30)}}, 9},
@@ -100,7 +99,8 @@ TYPED_TEST(BuildFromValues, TheLastValueOfEachVoxelStaysAndAllOthersAreBackgroun
 
 TYPED_TEST(BuildFromValues, OneResultForEveryNumberOfThreads)
 {
-    VoxelList const list = listOf({"", {{0, 0, 0}, {500, -80, 1 << 30}}, 40}, 100000);
+    // Long enough for a part per thread; half of the voxels come twice.
+    VoxelList const list = listOf({"", {{0, 0, 0}, {500, -80, 1 << 30}}, 40}, 400000);
     Grid<TypeParam> first;
     support::onThreadCounts([&] {
         auto grid = buildFromVoxels<TypeParam>({.channelName = "c"}, list.voxels, list.values, 0.0f);

@@ -31,8 +31,16 @@ void copyElement(std::byte* to, std::uint64_t toIndex, std::byte const* from, st
 template <class Size>
 void fillElements(std::byte* elements, std::uint64_t begin, std::uint64_t end, std::byte const* value, Size size)
 {
-    for (std::uint64_t i = begin; i < end; ++i)
-        copyElement(elements, i, value, 0, size);
+    if constexpr (!std::is_same_v<Size, std::size_t>) {
+        // A copy that the writes cannot change, so that many go at once.
+        std::byte held[Size::value];
+        std::memcpy(held, value, size);
+        for (std::uint64_t i = begin; i < end; ++i)
+            copyElement(elements, i, held, 0, size);
+    } else {
+        for (std::uint64_t i = begin; i < end; ++i)
+            copyElement(elements, i, value, 0, size);
+    }
 }
 
 } // namespace VLD::TileTree3D::Internal

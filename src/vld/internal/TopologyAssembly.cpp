@@ -23,7 +23,9 @@ namespace {
 
 void sortUnique(Nexil::Array<Coordinate>& coordinates)
 {
-    Nexil::parallel::sort(coordinates.begin(), coordinates.end(), isBefore);
+    // Not by a pointer to the function, which would be called for every comparison.
+    Nexil::parallel::sort(coordinates.begin(), coordinates.end(),
+                          [](Coordinate const& a, Coordinate const& b) { return isBefore(a, b); });
     dropRepeats(coordinates);
 }
 
