@@ -39,9 +39,9 @@ struct BandVoxels {
     Nexil::Array<VLD::TileTree3D::Coordinate> voxels;
     Nexil::Array<float> values;
 
-    /// All voxels of a grid within its band, tile after tile.
+    /// All voxels of a grid within its band, tile after tile or at random.
     template <class Traits>
-    explicit BandVoxels(VLD::TileTree3D::Grid<Traits> const& grid)
+    BandVoxels(VLD::TileTree3D::Grid<Traits> const& grid, bool isShuffled)
     {
         auto const all = grid.channel->template values<float>();
         for (unsigned int element = 0; element < grid.topology->voxelCount(); ++element)
@@ -49,8 +49,11 @@ struct BandVoxels {
                 voxels.push_back(grid.topology->elementCube(element).origin);
                 values.push_back((*all)[element]);
             }
+        if (isShuffled)
+            shuffle();
     }
 
+private:
     void shuffle()
     {
         std::mt19937 random(1);

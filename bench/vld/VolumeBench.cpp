@@ -1,15 +1,12 @@
-#include "Spheres.h"
+#include "VolumeCases.h"
 
 #include <veldrin/geometry/Prototypes.h>
 #include <veldrin/volume/VolumeBounds.h>
 #include <veldrin/volume/VolumeConversion.h>
-#include <vld/Accessor.h>
 #include <vld/BuildFromPoints.h>
 #include <vld/BuildFromValues.h>
 
 #include <benchmark/benchmark.h>
-
-#include <tbb/global_control.h>
 
 #include <cstring>
 
@@ -18,46 +15,8 @@
 namespace {
 
 using namespace VLD::TileTree3D;
+using namespace bench;
 using Veldrin::Math::float3;
-
-constexpr int kRadius = 125;
-
-struct ThreadLimit : tbb::global_control {
-    explicit ThreadLimit(benchmark::State const& state)
-        : tbb::global_control(max_allowed_parallelism, static_cast<std::size_t>(state.range(0)))
-    {
-    }
-};
-
-template <class Traits>
-void countVoxels(benchmark::State& state, Grid<Traits> const& grid)
-{
-    auto const perSecond = benchmark::Counter::kIsIterationInvariantRate;
-    state.counters["voxels"] = benchmark::Counter(static_cast<double>(grid.topology->voxelCount()), perSecond);
-}
-
-template <class Traits>
-void buildSphere(benchmark::State& state)
-{
-    ThreadLimit const limit(state);
-    Grid<Traits> grid;
-    for (auto _ : state)
-        grid = bench::sphere<Traits>(kRadius);
-    countVoxels(state, grid);
-    state.counters["MB"] = static_cast<double>(grid.topology->byteSize() + grid.channel->elementCount() * 4) / 1e6;
-}
-
-template <class Traits>
-void buildFromVoxelList(benchmark::State& state)
-{
-    ThreadLimit const limit(state);
-    bench::BandVoxels list(bench::sphere<Traits>(kRadius));
-    if (state.range(1) != 0)
-        list.shuffle();
-    for (auto _ : state)
-        benchmark::DoNotOptimize(buildFromVoxels<Traits>({.channelName = "c"}, list.voxels, list.values, bench::kBand));
-    state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(list.voxels.size()));
-}
 
 template <class Traits>
 void buildFromDenseBox(benchmark::State& state)
@@ -79,18 +38,17 @@ void rasterisePoints(benchmark::State& state)
 {
     ThreadLimit const limit(state);
     Nexil::Array<float3> positions;
-    for (Coordinate const& voxel : bench::voxelsInShell(kRadius, 100000))
+    for (Coordinate const& voxel : voxelsInShell(kRadius, 100000))
         positions.push_back({float(voxel.x), float(voxel.y), float(voxel.z)});
     for (auto _ : state)
-        benchmark::DoNotOptimize(
-            buildLevelSetFromPoints<Traits>({.channelName = "c"}, positions, {2.0f}, bench::kBand));
+        benchmark::DoNotOptimize(buildLevelSetFromPoints<Traits>({.channelName = "c"}, positions, {2.0f}, kBand));
     state.SetItemsProcessed(state.iterations() * static_cast<std::int64_t>(positions.size()));
 }
 
 template <class Traits>
 void visitEveryVoxel(benchmark::State& state)
 {
-    auto const grid = bench::sphere<Traits>(kRadius);
+    auto const grid = sphere<Traits>(kRadius);
     auto const values = grid.channel->template values<float>();
     for (auto _ : state) {
         float sum = 0;
@@ -101,42 +59,15 @@ void visitEveryVoxel(benchmark::State& state)
         }
         benchmark::DoNotOptimize(sum);
     }
-    countVoxels(state, grid);
+    perVoxel(state, heldVoxels(grid));
 }
 
-template <class Traits>
-void readAtRandom(benchmark::State& state)
-{
-    auto const grid = bench::sphere<Traits>(kRadius);
-    auto const voxels = bench::voxelsInShell(kRadius, 1 << 16);
-    Accessor<Traits, float> value(*grid.topology, *grid.channel);
-    std::uint64_t i = 0;
-    for (auto _ : state)
-        benchmark::DoNotOptimize(value(voxels[i++ & 0xFFFF]));
-}
-
-template <class Traits>
-void boundsOfContent(benchmark::State& state)
-{
-    ThreadLimit const limit(state);
-    auto const grid = bench::sphere<Traits>(kRadius);
-    auto volume = VLD::createObject();
-    grid.addTo(*volume);
-    for (auto _ : state) {
-        Veldrin::Math::bbox<float3, float> box;
-        Veldrin::GeometryAlgorithms::volumeBounds(*volume, *grid.container, *grid.topology, box);
-        if (box.max.x != kRadius)
-            state.SkipWithError("wrong bounds");
-    }
-    state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(grid.channel->elementCount() * 4));
-}
-
-/// The same when every tile has to be looked at: the content lies in the last one only.
+/// The box around the content where every tile has to be looked at: the content lies in the last one only.
 template <class Traits>
 void boundsOfContentAtTheEnd(benchmark::State& state)
 {
     ThreadLimit const limit(state);
-    auto const grid = bench::sphere<Traits>(kRadius);
+    auto const grid = sphere<Traits>(kRadius);
     Nexil::Array<float> values;
     values.resize(grid.channel->elementCount());
     values[grid.topology->voxelCount() - 1] = 1;
@@ -156,7 +87,7 @@ void boundsOfContentAtTheEnd(benchmark::State& state)
 
 void copyChannel(benchmark::State& state)
 {
-    auto const grid = bench::sphere<SmallTiles>(kRadius);
+    auto const grid = sphere<SmallTiles>(kRadius);
     auto const values = grid.channel->values<float>();
     Nexil::Array<float> copy = *values;
     for (auto _ : state) {
@@ -171,7 +102,7 @@ template <class Traits>
 void convertBothWays(benchmark::State& state)
 {
     auto volume = VLD::createObject();
-    bench::sphere<Traits>(static_cast<int>(state.range(0))).addTo(*volume);
+    sphere<Traits>(static_cast<int>(state.range(0))).addTo(*volume);
     for (auto _ : state) {
         auto object = Veldrin::Geometry::move_vld_volume_to_object(*volume);
         volume = Veldrin::Geometry::move_object_to_vld_volume(*object);

@@ -1,10 +1,8 @@
-#include <vld/Spheres.h>
+#include <vld/VolumeCases.h>
 
 #include <veldrin/io/ObjectStream.h>
-#include <veldrin/volume/VolumeBounds.h>
 #include <veldrin/volume/VolumeConversion.h>
 #include <vld/Accessor.h>
-#include <vld/BuildFromValues.h>
 
 #include <openvdb/openvdb.h>
 #include <openvdb/tools/LevelSetSphere.h>
@@ -12,7 +10,6 @@
 #include <benchmark/benchmark.h>
 
 #include <blosc.h>
-#include <tbb/global_control.h>
 
 #include <cstdlib>
 #include <filesystem>
@@ -28,43 +25,11 @@
 namespace {
 
 using namespace VLD::TileTree3D;
-
-constexpr int kRadius = 125;
-
-struct ThreadLimit : tbb::global_control {
-    explicit ThreadLimit(benchmark::State const& state)
-        : tbb::global_control(max_allowed_parallelism, static_cast<std::size_t>(state.range(0)))
-    {
-    }
-};
-
-void perVoxel(benchmark::State& state, double voxelCount)
-{
-    state.counters["held"] = voxelCount;
-    state.counters["perVoxel"] =
-        benchmark::Counter(voxelCount, benchmark::Counter::kIsIterationInvariantRate | benchmark::Counter::kInvert);
-}
-
-template <class Traits>
-double heldVoxels(Grid<Traits> const& grid)
-{
-    return static_cast<double>(grid.topology->voxelCount());
-}
+using namespace bench;
 
 openvdb::FloatGrid::Ptr peerSphere()
 {
-    return openvdb::tools::createLevelSetSphere<openvdb::FloatGrid>(float(kRadius), openvdb::Vec3f(0), 1, bench::kBand);
-}
-
-template <class Traits>
-void buildOurs(benchmark::State& state)
-{
-    ThreadLimit const limit(state);
-    Grid<Traits> grid;
-    for (auto _ : state)
-        grid = bench::sphere<Traits>(kRadius);
-    perVoxel(state, heldVoxels(grid));
-    state.counters["MB"] = static_cast<double>(grid.topology->byteSize() + grid.channel->elementCount() * 4) / 1e6;
+    return openvdb::tools::createLevelSetSphere<openvdb::FloatGrid>(float(kRadius), openvdb::Vec3f(0), 1, kBand);
 }
 
 void buildPeer(benchmark::State& state)
@@ -77,26 +42,12 @@ void buildPeer(benchmark::State& state)
     state.counters["MB"] = static_cast<double>(grid->memUsage()) / 1e6;
 }
 
-template <class Traits>
-void buildFromListOurs(benchmark::State& state)
-{
-    ThreadLimit const limit(state);
-    bench::BandVoxels list(bench::sphere<Traits>(kRadius));
-    if (state.range(1) != 0)
-        list.shuffle();
-    for (auto _ : state)
-        benchmark::DoNotOptimize(buildFromVoxels<Traits>({.channelName = "c"}, list.voxels, list.values, bench::kBand));
-    perVoxel(state, static_cast<double>(list.voxels.size()));
-}
-
 void buildFromListPeer(benchmark::State& state)
 {
     ThreadLimit const limit(state);
-    bench::BandVoxels list(bench::sphere<SmallTiles>(kRadius));
-    if (state.range(1) != 0)
-        list.shuffle();
+    BandVoxels const list(sphere<SmallTiles>(kRadius), state.range(1) != 0);
     for (auto _ : state) {
-        auto grid = openvdb::FloatGrid::create(bench::kBand);
+        auto grid = openvdb::FloatGrid::create(kBand);
         auto accessor = grid->getAccessor();
         for (std::uint64_t i = 0; i < list.voxels.size(); ++i) {
             Coordinate const& c = list.voxels[i];
@@ -105,21 +56,6 @@ void buildFromListPeer(benchmark::State& state)
         benchmark::DoNotOptimize(grid.get());
     }
     perVoxel(state, static_cast<double>(list.voxels.size()));
-}
-
-template <class Traits>
-void boundsOurs(benchmark::State& state)
-{
-    ThreadLimit const limit(state);
-    auto const grid = bench::sphere<Traits>(kRadius);
-    auto volume = VLD::createObject();
-    grid.addTo(*volume);
-    for (auto _ : state) {
-        Veldrin::Math::bbox<Veldrin::Math::float3, float> box;
-        Veldrin::GeometryAlgorithms::volumeBounds(*volume, *grid.container, *grid.topology, box);
-        benchmark::DoNotOptimize(box);
-    }
-    perVoxel(state, heldVoxels(grid));
 }
 
 /// Of the active voxels, whatever their values: the question that the peer answers without reading any.
@@ -136,7 +72,7 @@ void boundsPeer(benchmark::State& state)
 template <class Traits>
 void visitOurs(benchmark::State& state)
 {
-    auto const grid = bench::sphere<Traits>(kRadius);
+    auto const grid = sphere<Traits>(kRadius);
     auto const values = grid.channel->template values<float>();
     for (auto _ : state) {
         double sum = 0;
@@ -145,7 +81,7 @@ void visitOurs(benchmark::State& state)
             float const* const tile = values->data() + std::uint64_t(leaf) * Traits::kLeafVoxels;
             Coordinate const origin = grid.topology->leafOrigins()[leaf];
             for (unsigned int place = 0; place < Traits::kLeafVoxels; ++place)
-                if (tile[place] > -bench::kBand && tile[place] < bench::kBand) {
+                if (tile[place] > -kBand && tile[place] < kBand) {
                     Coordinate const voxel = origin + cellAtPlace<Traits::kDataWidth>(place);
                     sum += tile[place];
                     places += voxel.x + voxel.y + voxel.z;
@@ -174,23 +110,10 @@ void visitPeer(benchmark::State& state)
     perVoxel(state, static_cast<double>(grid->activeVoxelCount()));
 }
 
-constexpr std::uint64_t kReads = 1 << 16;
-
-template <class Traits>
-void readOurs(benchmark::State& state)
-{
-    auto const grid = bench::sphere<Traits>(kRadius);
-    auto const voxels = bench::voxelsInShell(kRadius, kReads);
-    Accessor<Traits, float> value(*grid.topology, *grid.channel);
-    std::uint64_t i = 0;
-    for (auto _ : state)
-        benchmark::DoNotOptimize(value(voxels[i++ % kReads]));
-}
-
 void readPeer(benchmark::State& state)
 {
     auto const grid = peerSphere();
-    auto const voxels = bench::voxelsInShell(kRadius, kReads);
+    auto const voxels = voxelsInShell(kRadius, kReads);
     auto accessor = grid->getConstAccessor();
     std::uint64_t i = 0;
     for (auto _ : state) {
@@ -212,13 +135,20 @@ void countFile(benchmark::State& state, std::string const& path)
     std::filesystem::remove(path);
 }
 
+/// The second number of a case is the radius: that of all other cases, and a larger one, whose bytes fit no cache.
+template <class Traits>
+Grid<Traits> fileSphere(benchmark::State const& state)
+{
+    return sphere<Traits>(static_cast<int>(state.range(1)));
+}
+
 using Objects = Nexil::Array<Nexil::Ptr<Veldrin::Object>>;
 
 template <class Traits>
-Objects sphereAsGeometry()
+Objects sphereAsGeometry(benchmark::State const& state)
 {
     auto volume = VLD::createObject();
-    bench::sphere<Traits>(kRadius).addTo(*volume);
+    fileSphere<Traits>(state).addTo(*volume);
     return {Nexil::Ptr<Veldrin::Object>(Veldrin::Geometry::move_vld_volume_to_object(*volume))};
 }
 
@@ -228,7 +158,7 @@ template <class Traits>
 void saveOurs(benchmark::State& state)
 {
     auto const path = filePath("volume.zon");
-    auto const objects = sphereAsGeometry<Traits>();
+    auto const objects = sphereAsGeometry<Traits>(state);
     Veldrin::IO::SerializationOptions options;
     options.compressionLevel = static_cast<int>(state.range(0));
     for (auto _ : state)
@@ -256,7 +186,7 @@ void loadOurs(benchmark::State& state)
     auto const path = filePath("volume.zon");
     Veldrin::IO::SerializationOptions options;
     options.compressionLevel = static_cast<int>(state.range(0));
-    Veldrin::IO::serialize(sphereAsGeometry<Traits>(), path.c_str(), options, nullptr);
+    Veldrin::IO::serialize(sphereAsGeometry<Traits>(state), path.c_str(), options, nullptr);
     for (auto _ : state) {
         Objects objects;
         if (!Veldrin::IO::deserialize(path.c_str(), objects, {}, nullptr) ||
@@ -311,7 +241,7 @@ template <class Traits>
 void saveBare(benchmark::State& state)
 {
     auto const path = filePath("volume.blosc");
-    auto const grid = bench::sphere<Traits>(kRadius);
+    auto const grid = fileSphere<Traits>(state);
     for (auto _ : state) {
         std::ofstream file(path, std::ios::binary);
         for (Part const& part : partsOf(grid)) {
@@ -327,7 +257,7 @@ template <class Traits>
 void loadBare(benchmark::State& state)
 {
     auto const path = filePath("volume.blosc");
-    auto const grid = bench::sphere<Traits>(kRadius);
+    auto const grid = fileSphere<Traits>(state);
     auto const parts = partsOf(grid);
     std::vector<std::size_t> sizes;
     {
@@ -357,11 +287,11 @@ void loadBare(benchmark::State& state)
 /// Both sides hold the same distances, or nothing here compares anything.
 bool isSameSphere()
 {
-    auto const ours = bench::sphere<SmallTiles>(kRadius);
+    auto const ours = sphere<SmallTiles>(kRadius);
     auto const peer = peerSphere();
     auto accessor = peer->getConstAccessor();
     Accessor<SmallTiles, float> value(*ours.topology, *ours.channel);
-    for (Coordinate const& c : bench::voxelsInShell(kRadius, 1000)) {
+    for (Coordinate const& c : voxelsInShell(kRadius, 1000)) {
         // The peer's values lie at integer positions, ours at centres of voxels: half a voxel apart along each axis.
         if (std::abs(value(c) - accessor.getValue(openvdb::Coord(c.x, c.y, c.z))) > 0.9f)
             return false;
@@ -369,24 +299,27 @@ bool isSameSphere()
     return true;
 }
 
-#define VELDRIN_SIDES(name)                                                                        \
-    BENCHMARK(name##Peer)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime();                      \
-    BENCHMARK_TEMPLATE(name##Ours, SmallTiles)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime(); \
-    BENCHMARK_TEMPLATE(name##Ours, WideTiles)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime()
+#define VELDRIN_SIDES(peer, ours)                                                            \
+    BENCHMARK(peer)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime();                      \
+    BENCHMARK_TEMPLATE(ours, SmallTiles)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime(); \
+    BENCHMARK_TEMPLATE(ours, WideTiles)->ArgName("threads")->Arg(1)->Arg(2)->UseRealTime()
 
-VELDRIN_SIDES(build);
+VELDRIN_SIDES(buildPeer, buildSphere);
 BENCHMARK(buildFromListPeer)->ArgNames({"threads", "shuffled"})->ArgsProduct({{1}, {0, 1}})->UseRealTime();
-BENCHMARK_TEMPLATE(buildFromListOurs, SmallTiles)
+BENCHMARK_TEMPLATE(buildFromVoxelList, SmallTiles)
     ->ArgNames({"threads", "shuffled"})
     ->ArgsProduct({{1, 2}, {0, 1}})
     ->UseRealTime();
-VELDRIN_SIDES(bounds);
+VELDRIN_SIDES(boundsPeer, boundsOfContent);
 BENCHMARK(visitPeer);
 BENCHMARK_TEMPLATE(visitOurs, SmallTiles);
 BENCHMARK_TEMPLATE(visitOurs, WideTiles);
-#define VELDRIN_FILES(name)                                                                \
-    BENCHMARK_TEMPLATE(name, SmallTiles)->ArgName("level")->Arg(1)->Arg(9)->UseRealTime(); \
-    BENCHMARK_TEMPLATE(name, WideTiles)->ArgName("level")->Arg(1)->Arg(9)->UseRealTime()
+#define VELDRIN_FILES(name)                             \
+    BENCHMARK_TEMPLATE(name, SmallTiles)                \
+        ->ArgNames({"level", "radius"})                 \
+        ->ArgsProduct({{1, 9}, {kRadius, 4 * kRadius}}) \
+        ->UseRealTime();                                \
+    BENCHMARK_TEMPLATE(name, WideTiles)->ArgNames({"level", "radius"})->ArgsProduct({{1, 9}, {kRadius}})->UseRealTime()
 
 BENCHMARK(savePeer)->UseRealTime();
 VELDRIN_FILES(saveOurs);
@@ -395,8 +328,8 @@ BENCHMARK(loadPeer)->UseRealTime();
 VELDRIN_FILES(loadOurs);
 VELDRIN_FILES(loadBare);
 BENCHMARK(readPeer);
-BENCHMARK_TEMPLATE(readOurs, SmallTiles);
-BENCHMARK_TEMPLATE(readOurs, WideTiles);
+BENCHMARK_TEMPLATE(readAtRandom, SmallTiles);
+BENCHMARK_TEMPLATE(readAtRandom, WideTiles);
 
 } // namespace
 
