@@ -1,6 +1,6 @@
 #pragma once
 
-#include <veldrin/algorithms/internal/BlockMath.h>
+#include <veldrin/algorithms/internal/CornerGather.h>
 #include <veldrin/algorithms/internal/FaceNormal.h>
 #include <veldrin/algorithms/internal/MeshFaces.h>
 
@@ -71,13 +71,18 @@ private:
     {
         unsigned int const* const corners = points + ranges[begin].begin;
         std::size_t const count = end - begin;
-        for (std::size_t i = 0; i < count; ++i) {
-            isCovered_[i] = positions.cover(corners + i * N, N);
-            for (unsigned int k = 0; k < N; ++k) {
-                Math::float3 const position = isCovered_[i] ? positions[corners[i * N + k]] : Math::float3{};
-                corners_.x[k][i] = position.x;
-                corners_.y[k][i] = position.y;
-                corners_.z[k][i] = position.z;
+        if (count == kSize && mayGather(positions, corners, kSize * N)) {
+            gatherBlock<N>(positions, corners, corners_);
+            isCovered_.fill(true);
+        } else {
+            for (std::size_t i = 0; i < count; ++i) {
+                isCovered_[i] = positions.cover(corners + i * N, N);
+                for (unsigned int k = 0; k < N; ++k) {
+                    Math::float3 const position = isCovered_[i] ? positions[corners[i * N + k]] : Math::float3{};
+                    corners_.x[k][i] = position.x;
+                    corners_.y[k][i] = position.y;
+                    corners_.z[k][i] = position.z;
+                }
             }
         }
         fanVectors(corners_, x_.data(), y_.data(), z_.data());
