@@ -10,9 +10,9 @@
 #include <xxhash.h>
 
 #include <cstdio>
-#include <functional>
 #include <string>
 #include <string_view>
+#include <type_traits>
 #include <typeindex>
 #include <unordered_map>
 
@@ -20,76 +20,140 @@ namespace support {
 
 namespace {
 
+    using Veldrin::Geometry::Common::GeoLocation;
+    using FCurve = Veldrin::Math::FCurve;
+    using ObjectPtr = Nexil::Ptr<Veldrin::Object>;
+    template <class T>
+    using ArrayPtr = Nexil::Ptr<Nexil::Array<T>>;
+
+    std::string hex(void const* bytes, std::size_t count)
+    {
+        std::string text = "\"";
+        for (std::size_t i = 0; i < count; ++i) {
+            char digits[3];
+            std::snprintf(digits, sizeof(digits), "%02x", static_cast<unsigned char const*>(bytes)[i]);
+            text += digits;
+        }
+        return text + '"';
+    }
+
+    std::string quoted(std::string_view raw)
+    {
+        std::string text = "\"";
+        for (char const c : raw) {
+            if (c >= 32 && c < 127 && c != '"' && c != '\\')
+                text += c;
+            else
+                text += "\\u00" + hex(&c, 1).substr(1, 2);
+        }
+        return text + '"';
+    }
+
+    template <class Elements, class One>
+    std::string listed(Elements const& elements, One const& one)
+    {
+        std::string text;
+        for (auto const& element : elements)
+            text += (text.empty() ? "" : ",") + one(element);
+        return "[" + text + "]";
+    }
+
+    /// One describer numbers what it meets, so it describes one set of objects.
     class StreamDescriber {
     public:
-        std::string describe(Nexil::Array<Nexil::Ptr<Veldrin::Object>> const& objects)
+        std::string describe(Nexil::Array<ObjectPtr> const& objects)
         {
             std::string text;
             for (auto const& object : objects)
-                text += (text.empty() ? "" : ",\n") + pointer(362, Nexil::Any(object));
+                text += (text.empty() ? "" : ",\n") + value(object);
             return text + (text.empty() ? "]}\n" : "\n]}\n");
         }
 
     private:
-        using FCurvePtr = Nexil::Ptr<Veldrin::Math::FCurve>;
-        using ObjectPtr = Nexil::Ptr<Veldrin::Object>;
-        using GeoLocation = Veldrin::Geometry::Common::GeoLocation;
-        using Mode = Veldrin::Geometry::Common::DataInterpolationMode;
-        template <class T>
-        using ArrayPtr = Nexil::Ptr<Nexil::Array<T>>;
-
         struct Type {
             unsigned int code;
-            std::function<std::string(StreamDescriber&, Nexil::Any const&)> describe;
+            std::string (*describe)(StreamDescriber&, Nexil::Any const&);
         };
 
-        static std::string hex(void const* bytes, std::size_t count)
+        template <class T>
+            requires std::is_trivially_copyable_v<T>
+        std::string value(T const& held)
         {
-            std::string text = "\"";
-            for (std::size_t i = 0; i < count; ++i) {
-                char digits[3];
-                std::snprintf(digits, sizeof(digits), "%02x", static_cast<unsigned char const*>(bytes)[i]);
-                text += digits;
-            }
-            return text + '"';
+            if constexpr (std::is_same_v<T, bool>)
+                return held ? "true" : "false";
+            else if constexpr (std::is_integral_v<T> || std::is_enum_v<T>)
+                return std::to_string(static_cast<std::conditional_t<std::is_enum_v<T>, unsigned int, T>>(held));
+            else
+                return hex(&held, sizeof(held));
         }
 
-        static std::string quoted(std::string_view raw)
+        std::string value(Nexil::String const& text) { return quoted(text.view()); }
+
+        std::string value(Nexil::Ptr<FCurve> const& curve)
         {
-            std::string text = "\"";
-            for (char const c : raw) {
-                auto const byte = static_cast<unsigned char>(c);
-                if (byte >= 32 && byte < 127 && c != '"' && c != '\\') {
-                    text += c;
-                } else {
-                    char escape[8];
-                    std::snprintf(escape, sizeof(escape), "\\u%04x", byte);
-                    text += escape;
-                }
-            }
-            return text + '"';
+            if (!curve)
+                return "null";
+            auto const tangent = [&](FCurve::Tangent const& t) {
+                return "[" + value(t.time) + "," + value(t.value) + "]";
+            };
+            auto const key = [&](FCurve::Key const& k) {
+                return "[" + value(k.time) + "," + value(k.value) + "," + tangent(k.in) + "," + tangent(k.out) + "," +
+                       value(k.interpolation) + "]";
+            };
+            return "{\"pre\":" + value(curve->preExtrapolation()) + ",\"post\":" + value(curve->postExtrapolation()) +
+                   ",\"keys\":" + listed(curve->keys(), key) + "}";
+        }
+
+        std::string value(GeoLocation const& held)
+        {
+            auto const each = [this](auto part) { return value(part); };
+            std::string const ids = listed(held.ids, each);
+            std::string const params = listed(held.params, each);
+            std::string const indices = value(held.indices);
+            return ids.substr(0, ids.size() - 1) + "," + params.substr(1, params.size() - 2) + "," + indices + "," +
+                   value(held.weights) + "]";
+        }
+
+        /// With the code of its type.
+        std::string value(Nexil::Any const& held)
+        {
+            if (held.empty())
+                return "null";
+            auto const type = types().find(std::type_index(*held.type().info()));
+            return type == types().end()
+                       ? "[-1,\"unknown\"]"
+                       : "[" + std::to_string(type->second.code) + "," + type->second.describe(*this, held) + "]";
         }
 
         template <class T>
-        static std::string scalar(T const& value)
+        std::string value(ArrayPtr<T> const& array)
         {
-            if constexpr (std::is_same_v<T, Nexil::String>)
-                return quoted(value.view());
-            else if constexpr (std::is_same_v<T, bool>)
-                return value ? "true" : "false";
-            else if constexpr (std::is_integral_v<T>)
-                return std::to_string(value);
-            else
-                return hex(&value, sizeof(value));
+            return shared(array, [&] {
+                std::string const content = "\"count\":" + std::to_string(array->size()) + ",";
+                if constexpr (std::is_trivially_copyable_v<T> && !std::is_enum_v<T>) {
+                    std::size_t const size = array->size() * sizeof(T);
+                    if (size <= 64)
+                        return content + "\"bytes\":" + hex(array->data(), size);
+                    XXH64_canonical_t hash;
+                    XXH64_canonicalFromHash(&hash, XXH3_64bits(array->data(), size));
+                    return content + "\"xxh3\":" + hex(hash.digest, sizeof(hash.digest));
+                } else {
+                    return content + "\"elements\":" + listed(*array, [this](T const& part) { return value(part); });
+                }
+            });
         }
 
-        template <class Elements, class One>
-        static std::string listed(Elements const& elements, One const& one)
+        std::string value(ObjectPtr const& held)
         {
-            std::string text;
-            for (auto const& element : elements)
-                text += (text.empty() ? "" : ",") + one(element);
-            return "[" + text + "]";
+            return shared(held, [&] {
+                Veldrin::Object const& content = contentOf(*held);
+                std::string const lead = &content == held.get() ? "" : "\"proxy\":true,";
+                return lead + "\"properties\":" + listed(content.keys(), [&](Nexil::String const& key) {
+                           Nexil::Any const property = content.getProperty(key);
+                           std::string const frame = value(property);
+                           return "[" + value(key) + "," + (property.empty() ? "null,null]" : frame.substr(1));
+                       });
+            });
         }
 
         /// A shared value: described where it is met first, by its number where it is met again.
@@ -103,73 +167,6 @@ namespace {
             return isNew ? "{\"id\":" + number + "," + content() + "}" : "{\"ref\":" + number + "}";
         }
 
-        template <class T, class One>
-        std::string elements(ArrayPtr<T> const& array, One const& one)
-        {
-            return shared(array, [&] {
-                return "\"count\":" + std::to_string(array->size()) + ",\"elements\":" + listed(*array, one);
-            });
-        }
-
-        template <class T>
-        std::string valueArray(ArrayPtr<T> const& array)
-        {
-            if constexpr (std::is_same_v<T, Nexil::String>) {
-                return elements(array, [](Nexil::String const& text) { return quoted(text.view()); });
-            } else {
-                return shared(array, [&] {
-                    std::size_t const size = array->size() * sizeof(T);
-                    std::string content = "\"count\":" + std::to_string(array->size()) + ",";
-                    if (size <= 64)
-                        return content + "\"bytes\":" + hex(array->data(), size);
-                    char digits[17];
-                    std::snprintf(digits, sizeof(digits), "%016llx",
-                                  static_cast<unsigned long long>(XXH3_64bits(array->data(), size)));
-                    return content + "\"xxh3\":\"" + digits + '"';
-                });
-            }
-        }
-
-        static std::string curve(FCurvePtr const& held)
-        {
-            if (!held)
-                return "null";
-            auto mode = [](auto value) { return std::to_string(static_cast<unsigned int>(value)); };
-            auto tangent = [](Veldrin::Math::FCurve::Tangent const& t) {
-                return "[" + scalar(t.time) + "," + scalar(t.value) + "]";
-            };
-            return "{\"pre\":" + mode(held->preExtrapolation()) + ",\"post\":" + mode(held->postExtrapolation()) +
-                   ",\"keys\":" +
-                   listed(held->keys(),
-                          [&](Veldrin::Math::FCurve::Key const& key) {
-                              return "[" + scalar(key.time) + "," + scalar(key.value) + "," + tangent(key.in) + "," +
-                                     tangent(key.out) + "," + mode(key.interpolation) + "]";
-                          }) +
-                   "}";
-        }
-
-        std::string location(GeoLocation const& held)
-        {
-            std::string const ids = listed(held.ids, &scalar<unsigned int>);
-            std::string const params = listed(held.params, &scalar<float>);
-            std::string const indices = valueArray(held.indices);
-            return ids.substr(0, ids.size() - 1) + "," + params.substr(1, params.size() - 2) + "," + indices + "," +
-                   valueArray(held.weights) + "]";
-        }
-
-        std::string object(ObjectPtr const& held)
-        {
-            return shared(held, [&] {
-                Veldrin::Object const& content = contentOf(*held);
-                std::string const lead = &content == held.get() ? "" : "\"proxy\":true,";
-                return lead + "\"properties\":" + listed(content.keys(), [&](Nexil::String const& key) {
-                           Nexil::Any const value = content.getProperty(key);
-                           std::string const frame = framed(value);
-                           return "[" + quoted(key.view()) + "," + (value.empty() ? "null,null]" : frame.substr(1));
-                       });
-            });
-        }
-
         /// The object itself, or what a file holds for a proxy of a volume.
         Veldrin::Object const& contentOf(Veldrin::Object const& object)
         {
@@ -181,72 +178,29 @@ namespace {
             return place->second;
         }
 
-        std::string objects(ArrayPtr<ObjectPtr> const& array)
-        {
-            return elements(array, [this](ObjectPtr const& held) { return object(held); });
-        }
-
-        std::string framed(Nexil::Any const& value)
-        {
-            if (value.empty())
-                return "null";
-            auto const type = types().find(std::type_index(*value.type().info()));
-            if (type == types().end())
-                return "[-1,\"unknown\"]";
-            return "[" + std::to_string(type->second.code) + "," + type->second.describe(*this, value) + "]";
-        }
-
-        std::string pointer(unsigned int code, Nexil::Any const& value)
-        {
-            std::string const frame = framed(value);
-            std::size_t const lead = std::to_string(code).size() + 2;
-            return frame.substr(lead, frame.size() - lead - 1);
-        }
-
-        template <class T, class Describe>
-        static void add(std::unordered_map<std::type_index, Type>& types, unsigned int code, Describe describe)
-        {
-            types[std::type_index(typeid(T))] = {code, [describe](StreamDescriber& self, Nexil::Any const& value) {
-                                                     return describe(self, *value.get<T>());
-                                                 }};
-        }
-
         static std::unordered_map<std::type_index, Type> const& types()
         {
             static auto const table = [] {
-                using Self = StreamDescriber;
                 std::unordered_map<std::type_index, Type> made;
-                Veldrin::Geometry::Internal::forEachValueType([&made]<class T>(unsigned int code, char const*) {
-                    add<T>(made, code, [](Self&, T const& value) { return scalar(value); });
-                    add<ArrayPtr<T>>(made, 120 + code,
-                                     [](Self& self, ArrayPtr<T> const& array) { return self.valueArray(array); });
-                    add<ArrayPtr<ArrayPtr<T>>>(made, 240 + code, [](Self& self, ArrayPtr<ArrayPtr<T>> const& arrays) {
-                        return self.elements(arrays, [&](ArrayPtr<T> const& array) { return self.valueArray(array); });
-                    });
+                auto const add = [&made]<class T>(unsigned int code, std::type_identity<T>) {
+                    made[std::type_index(typeid(T))] = {
+                        code, [](StreamDescriber& self, Nexil::Any const& held) { return self.value(*held.get<T>()); }};
+                };
+                auto const addWithArray = [&]<class T>(unsigned int code, std::type_identity<T> type) {
+                    add(code, type);
+                    add(code + 1, std::type_identity<ArrayPtr<T>>());
+                };
+                Veldrin::Geometry::Internal::forEachValueType([&]<class T>(unsigned int code, char const*) {
+                    add(code, std::type_identity<T>());
+                    add(120 + code, std::type_identity<ArrayPtr<T>>());
+                    add(240 + code, std::type_identity<ArrayPtr<ArrayPtr<T>>>());
                 });
-                auto mode = [](Mode value) { return std::to_string(static_cast<unsigned int>(value)); };
-                add<Mode>(made, 360, [mode](Self&, Mode value) { return mode(value); });
-                add<ArrayPtr<Mode>>(
-                    made, 361, [mode](Self& self, ArrayPtr<Mode> const& modes) { return self.elements(modes, mode); });
-                add<ObjectPtr>(made, 362, [](Self& self, ObjectPtr const& held) { return self.object(held); });
-                add<ArrayPtr<ObjectPtr>>(
-                    made, 363, [](Self& self, ArrayPtr<ObjectPtr> const& array) { return self.objects(array); });
-                add<ArrayPtr<ArrayPtr<ObjectPtr>>>(
-                    made, 364, [](Self& self, ArrayPtr<ArrayPtr<ObjectPtr>> const& arrays) {
-                        return self.elements(arrays,
-                                             [&](ArrayPtr<ObjectPtr> const& array) { return self.objects(array); });
-                    });
-                add<FCurvePtr>(made, 365, [](Self&, FCurvePtr const& held) { return curve(held); });
-                add<ArrayPtr<FCurvePtr>>(made, 366, [](Self& self, ArrayPtr<FCurvePtr> const& array) {
-                    return self.elements(array, curve);
-                });
-                add<GeoLocation>(made, 367, [](Self& self, GeoLocation const& held) { return self.location(held); });
-                add<ArrayPtr<GeoLocation>>(made, 368, [](Self& self, ArrayPtr<GeoLocation> const& array) {
-                    return self.elements(array, [&](GeoLocation const& held) { return self.location(held); });
-                });
-                add<ArrayPtr<Nexil::Any>>(made, 369, [](Self& self, ArrayPtr<Nexil::Any> const& array) {
-                    return self.elements(array, [&](Nexil::Any const& value) { return self.framed(value); });
-                });
+                addWithArray(360, std::type_identity<Veldrin::Geometry::Common::DataInterpolationMode>());
+                addWithArray(362, std::type_identity<ObjectPtr>());
+                add(364, std::type_identity<ArrayPtr<ArrayPtr<ObjectPtr>>>());
+                addWithArray(365, std::type_identity<Nexil::Ptr<FCurve>>());
+                addWithArray(367, std::type_identity<GeoLocation>());
+                add(369, std::type_identity<ArrayPtr<Nexil::Any>>());
                 return made;
             }();
             return table;
