@@ -7,8 +7,10 @@
 
 #include <veldrin/veldrin.h>
 
+#include <cstdio>
 #include <sstream>
 #include <stdexcept>
+#include <thread>
 
 namespace support {
 
@@ -97,6 +99,20 @@ namespace {
             throw;
         }
         return (digest(*outputs) + ...);
+    }
+
+    /// Runs change(object), which either does all of it or, when memory runs out, nothing.
+    template <class Change>
+    void changeWhole(Object& object, Change const& change)
+    {
+        auto const before = dump(object);
+        try {
+            change(object);
+        } catch (...) {
+            if (dump(object) != before)
+                throw std::logic_error("an object was left half changed");
+            throw;
+        }
     }
 
     std::string validate(Sample const& sample)
@@ -269,13 +285,14 @@ namespace {
             auto const count = copy.size();
             Nexil::Ptr<VLD::Object> volume;
             try {
-                volume = Geometry::move_object_to_vld_volume_const(copy);
+                volume = Geometry::move_object_to_vld_volume(copy);
             } catch (...) {
                 if (copy.size() != count)
                     throw std::logic_error("an object was left half moved");
                 throw;
             }
             result += volume ? text(volume->componentRange()) : "null";
+            result += Geometry::move_object_to_vld_volume_const(copy) ? "again" : "null";
         }
         return result;
     }
@@ -296,10 +313,39 @@ namespace {
             addData(o, "voxel_fog_density", "voxel_tile_tree", {});
         });
         auto proxies = createObject();
-        Geometry::vldProxyFactory(*description, *proxies);
+        changeWhole(*proxies, [&](Object& o) { Geometry::vldProxyFactory(*description, o); });
         auto const built = sphereVolume<VLD::TileTree3D::SmallTiles>(2);
         addPoints<VLD::TileTree3D::WideTiles>(*built);
-        return text(proxies->keys()) + text(built->componentRange());
+        auto const made = Geometry::move_vld_volume_to_object_const(*built);
+        // The indices of a container are made when they are first asked for.
+        auto const indices = arrayIn<unsigned int>(*made, "voxel_tile_tree", "indices");
+        return text(proxies->keys()) + text(made->keys()) + (indices ? digest(*indices) : "");
+    }
+
+    std::string proxies(Sample const& sample)
+    {
+        std::string result;
+        for (auto const& volume : {sample.smallVolume, sample.wideVolume}) {
+            auto const topology = Geometry::getVldTopologyFromProxy(part(*volume, "voxel_component"));
+            auto const container = Geometry::getVldContainerFromProxy(part(*volume, "voxel_tile_tree"));
+            auto const channel = Geometry::getVldChannelFromProxy(part(*volume, "voxel_signed_distance"));
+            result += (topology->name() + container->name() + channel->name()).view();
+            for (auto const& name : volume->keys()) {
+                auto const proxy = part(*volume, name.c_str());
+                Nexil::Ptr<Object> copy = proxy;
+                Nexil::MutablePtr<Object> own(std::move(copy));
+                for (auto const& key : proxy->keys()) {
+                    auto value = proxy->getProperty(key);
+                    result +=
+                        std::to_string(proxy->propertyInfo(key).arraySize) + (proxy->hasProperty(key) ? "+" : "-");
+                    result += own->setPropertyAny(key, std::move(value)) ? 's' : '-';
+                    result += own->extractProperty(key).empty() ? '-' : 'x';
+                }
+                own->eraseAllProperties();
+                result += std::to_string(own->size());
+            }
+        }
+        return result;
     }
 
     std::string accessors(Sample const& sample)
@@ -310,29 +356,46 @@ namespace {
             result += Geometry::getTargetComponent(*sample.mesh, key).view();
             result += Geometry::getDataGeoProperty(*sample.mesh, key) ? 'd' : '-';
             result += Geometry::getRangeGeoPropIndices(*sample.mesh, key) ? 'r' : '-';
+            result += Geometry::getRangeGeoProperty(*sample.mesh, key) ? 'R' : '-';
+            result += Geometry::getGeoPropTarget(*sample.mesh, *part(*sample.mesh, key.c_str())) ? 't' : '-';
+            result += Geometry::getGeoPropTargetName(*sample.mesh, key).view();
+            result += Geometry::getGeoPropRangeName(key).view();
+            result += std::to_string(Geometry::getGeoPropsByTarget(*sample.mesh, key).size());
             result += text(Geometry::getGeoPropNamesByTarget(*sample.mesh, key));
             result += Geometry::getUniqueGeoPropName(key, *sample.mesh).view();
             result += Veldrin::mapGeoPropertyName(key, *sample.mesh, *sample.smallVolume).view();
+            result += Veldrin::mapGeoPropertyNameToVLDVolume(key, *sample.mesh).view();
+            result += Veldrin::mapGeoPropertyNameFromVLDVolume(key, *sample.smallVolume).view();
         }
-        return result + text(Geometry::getGeoPropsByName(*sample.mesh, "*o*")) +
+        for (auto const& type : *Geometry::getGeometryTypes())
+            result += Object::isA(*sample.mesh, *type) ? 'm' : '-';
+        auto const components =
+            Geometry::getGeoPropsByPrototype(*sample.mesh, *Geometry::getComponentGeoPropPrototype());
+        return result + std::to_string(components.size()) + text(Geometry::getGeoPropsByName(*sample.mesh, "*o*")) +
                text(Geometry::getGeoPropNamesByPrototype(*sample.mesh, *Geometry::getComponentGeoPropPrototype()));
     }
 
     std::string population(Sample const& sample)
     {
         std::string result;
-        for (auto const& populate : {&Geometry::populateVolume, &Geometry::populateLevelSet,
-                                     &Geometry::populateFogVolume, &Geometry::populateInstances})
-            result += text(filled(*populate)->keys());
         auto copy = sample.mesh;
         Nexil::MutablePtr<Object> own(std::move(copy));
-        auto const before = own->size();
-        Geometry::populatePlaneMesh(1, 2, *own);
-        Geometry::populateSphereMesh(1, *own);
-        if (!Geometry::setElementCount("point_component", 5, *own) ||
-            !Geometry::setRangeGeoPropIndices("corner_index", array<unsigned int>({0}), *own))
-            return "";
-        return result + std::to_string(before) + text(own->keys());
+        auto const change = [&](auto const& populate) {
+            changeWhole(*own, populate);
+            result += text(own->keys());
+        };
+        change([](Object& o) { Geometry::populatePlaneMesh(1, 2, o); });
+        change([](Object& o) { Geometry::populateSphereMesh(1, o); });
+        change([](Object& o) { Geometry::populateCubeMesh(1, o); });
+        change([](Object& o) { Geometry::populatePointCloud(array<Math::float3>({{}, {}}), o); });
+        change([](Object& o) { (void)Geometry::setElementCount("point_component", 5, o); });
+        change([](Object& o) { Geometry::setRangeGeoPropIndices("corner_index", array<unsigned int>({0}), o); });
+        for (auto const& populate : {&Geometry::populateVolume, &Geometry::populateLevelSet,
+                                     &Geometry::populateFogVolume, &Geometry::populateInstances})
+            change(*populate);
+        change([](Object& o) { Geometry::populateTag("point_component", array<bool>({true}), o); });
+        change([](Object& o) { Geometry::populateRangeGeoProperty(array<unsigned int>({0}), "face_component", o); });
+        return result + text(taggedMesh()->keys()) + text(someStrands()->keys());
     }
 
     std::string dumps(Sample const& sample)
@@ -364,9 +427,30 @@ namespace {
         return result.empty() ? result : std::to_string(stream.str().size());
     }
 
-    std::string load(Sample const& sample)
+    std::string saveFile(Sample const& sample)
     {
-        IO::InputMemoryBuf buffer(sample.stream.data(), sample.stream.size());
+        // Others may be writing theirs.
+        auto const name = sample.path + "." + std::to_string(std::hash<std::thread::id>()(std::this_thread::get_id()));
+        bool const isWritten = IO::serialize(allOf(sample), Nexil::String(std::string_view(name)), {}, nullptr);
+        auto const size = fileBytes(name).size();
+        std::remove(name.c_str());
+        return isWritten ? std::to_string(size) : "";
+    }
+
+    std::string saveHandles(Sample const& sample)
+    {
+        auto objects = allOf(sample);
+        Nexil::Array<Nexil::Ptr<Object>*> handles;
+        for (auto& object : objects)
+            handles.push_back(&object);
+        std::ostringstream stream;
+        Nexil::OutputStream output(stream);
+        return IO::serialize(handles, output, {}, nullptr) ? "written" : "";
+    }
+
+    std::string load(std::string const& bytes, Sample const& sample)
+    {
+        IO::InputMemoryBuf buffer(bytes.data(), bytes.size());
         std::istream stream(&buffer);
         Nexil::InputStream input(stream);
         Objects objects;
@@ -381,7 +465,15 @@ namespace {
         }
         if (!isRead && objects.size() != 1)
             throw std::logic_error("objects of a failed reading were left");
-        return isRead ? std::to_string(objects.size()) + text(objects[objects.size() - 1]->keys()) : "";
+        return isRead ? std::to_string(objects.size()) : "";
+    }
+
+    template <char version>
+    std::string loadCorpus(Sample const& sample)
+    {
+        static std::string const bytes =
+            fileBytes(std::string(VELDRIN_TEST_CORPUS "/streams/valid/v") + version + ".zon");
+        return load(bytes, sample);
     }
 
     std::string loadFile(Sample const& sample)
@@ -390,8 +482,9 @@ namespace {
         Objects objects;
         auto const header = createObject();
         IO::StreamLayout layout;
-        if (!IO::deserialize(path, objects, {}, nullptr) || !IO::deserializeHeader(path, *header, nullptr) ||
-            !IO::inspectStream(path, layout, nullptr))
+        bool isHeaderRead = false;
+        changeWhole(*header, [&](Object& o) { isHeaderRead = IO::deserializeHeader(path, o, nullptr); });
+        if (!isHeaderRead || !IO::deserialize(path, objects, {}, nullptr) || !IO::inspectStream(path, layout, nullptr))
             return "";
         return std::to_string(objects.size()) + text(header->keys()) + std::to_string(layout.entries.size());
     }
@@ -430,13 +523,21 @@ std::vector<Operation> const& operations()
         {"object to volume", objectToVolume},
         {"volume bounds", volumeBounds},
         {"volumes made", volumesMade},
+        {"proxies", proxies},
         {"accessors", accessors},
         {"population", population},
         {"dumps", dumps},
         {"save at level 0", save<0>},
         {"save at level 9", save<9>},
-        {"load", load},
+        {"save of handles", saveHandles},
+        {"save of a file", saveFile},
+        {"load", [](Sample const& sample) { return load(sample.stream, sample); }},
         {"load of a file", loadFile},
+        {"load of version 1", loadCorpus<'1'>},
+        {"load of version 2", loadCorpus<'2'>},
+        {"load of version 3", loadCorpus<'3'>},
+        {"load of version 4", loadCorpus<'4'>},
+        {"load of version 5", loadCorpus<'5'>},
     };
     return all;
 }

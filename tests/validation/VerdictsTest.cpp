@@ -48,19 +48,71 @@ Nexil::MutablePtr<Object> threePoints()
     return filled([](Object& cloud) { Geometry::populatePointCloud(array<Math::float3>({{}, {}, {}}), cloud); });
 }
 
-/// Three elements of "c", and the shape of data shared out by a range.
-void shareOut(Object& o, std::vector<float> const& values, Indices const& indices)
+using Change = std::function<void(Object&)>;
+
+Change indices(char const* name, Indices const& values)
 {
-    addComponent(o, "c", 3);
-    addRange(o, "d_index", "c", indices);
-    addData(o, "d", "d_index", values);
+    return [=](Object& o) { setIndices(o, name, values); };
+}
+
+Change noIndices(char const* name)
+{
+    return [=](Object& o) { setField(o, name, "data", Nexil::Ptr<Nexil::Array<unsigned int>>()); };
+}
+
+Change count(char const* component, unsigned int number)
+{
+    return [=](Object& o) { setField(o, component, "count", number); };
+}
+
+Change noFaces(Indices const& offsets)
+{
+    return [=](Object& o) {
+        o.eraseAllProperties();
+        Geometry::populateMesh(o);
+        setIndices(o, "face_offset", offsets);
+    };
+}
+
+Change without(char const* name)
+{
+    return [=](Object& o) { o.eraseProperty(name); };
+}
+
+/// Data over component "c" of three elements.
+Change data(char const* name, char const* target, std::vector<float> const& values)
+{
+    return [=](Object& o) {
+        addComponent(o, "c", 3);
+        addData(o, name, target, values);
+    };
+}
+
+/// A range beside the same; with a null pointer where no indices are handed in.
+Change range(char const* name, char const* target, Nexil::Ptr<Nexil::Array<unsigned int>> const& values)
+{
+    return [=](Object& o) {
+        addComponent(o, "c", 3);
+        addRange(o, name, target, {});
+        setField(o, name, "indices", values);
+    };
+}
+
+/// The shape of data shared out over the same by a range.
+Change sharedOut(std::vector<float> const& values, Indices const& of)
+{
+    return [=](Object& o) {
+        addComponent(o, "c", 3);
+        addRange(o, "d_index", "c", of);
+        addData(o, "d", "d_index", values);
+    };
 }
 
 struct Case {
     char const* what;
     Kind kind;
     /// Breaks a valid object of the kind; an empty one for Kind::Any.
-    std::function<void(Object&)> change;
+    Change change;
     Code code = Code::Success;
     char const* message = "";
 };
@@ -80,8 +132,6 @@ constexpr char kFaceOffsetFailure[] = "face_offset contains an invalid index int
 constexpr char kStrandOffsetFailure[] = "strand_offset contains an invalid index into strand_component";
 constexpr char kIndexFailure[] = "d_index contains an invalid index into d";
 
-Nexil::Ptr<Nexil::Array<unsigned int>> const kNoIndices;
-
 Case const kCases[] = {
     {"a mesh", Kind::Mesh, [](Object&) {}},
     {"no mesh at all", Kind::Mesh, [](Object& o) { o.eraseAllProperties(); }, Code::InvalidObject,
@@ -94,87 +144,42 @@ Case const kCases[] = {
     {"a null array of positions", Kind::Mesh,
      [](Object& o) { setField(o, "point_position", "data", Nexil::Ptr<Nexil::Array<Math::float3>>()); },
      Code::InvalidProperty, "point_position contains an invalid property data"},
-    {"more points than positions", Kind::Mesh, [](Object& o) { setField(o, "point_component", "count", 5u); },
-     Code::InvalidElementCount, "point_position has an invalid number of elements"},
+    {"more points than positions", Kind::Mesh, count("point_component", 5), Code::InvalidElementCount,
+     "point_position has an invalid number of elements"},
     {"more positions than points", Kind::Mesh,
      [](Object& o) {
          setField(o, "point_position", "data", array<Math::float3>({{}, {}, {}, {}, {}}));
      }},
-    {"a null array of corners", Kind::Mesh, [](Object& o) { setField(o, "face_vertex", "data", kNoIndices); },
-     Code::InvalidProperty, "face_vertex contains an invalid property data"},
-    {"a corner behind the last point", Kind::Mesh,
-     [](Object& o) {
-         setIndices(o, "face_vertex", {0, 1, 4, 2, 1, 3});
-     },
-     Code::InvalidIndex, "face_vertex contains an invalid index into point_component"},
-    {"a corner without a point", Kind::Mesh,
-     [](Object& o) {
-         setIndices(o, "face_vertex", {0, 1, 2, 2, 1, kInvalidIndex});
-     },
-     Code::InvalidIndex, "face_vertex contains an invalid index into point_component"},
-    {"a wrong corner beyond those that count", Kind::Mesh,
-     [](Object& o) {
-         setIndices(o, "face_vertex", {0, 1, 2, 2, 1, 3, 9});
-     },
+    {"a null array of corners", Kind::Mesh, noIndices("face_vertex"), Code::InvalidProperty,
+     "face_vertex contains an invalid property data"},
+    {"a corner behind the last point", Kind::Mesh, indices("face_vertex", {0, 1, 4, 2, 1, 3}), Code::InvalidIndex,
+     "face_vertex contains an invalid index into point_component"},
+    {"a corner without a point", Kind::Mesh, indices("face_vertex", {0, 1, 2, 2, 1, kInvalidIndex}), Code::InvalidIndex,
+     "face_vertex contains an invalid index into point_component"},
+    {"a wrong corner beyond those that count", Kind::Mesh, indices("face_vertex", {0, 1, 2, 2, 1, 3, 9}),
      Code::InvalidIndex, "face_vertex contains an invalid index into point_component"},
     {"fewer corners than counted, found by the check of all properties", Kind::Mesh,
-     [](Object& o) {
-         setIndices(o, "face_vertex", {0, 1, 2, 2, 1});
-     },
-     Code::InvalidElementCount, "face_vertex has an invalid number of elements"},
-    {"a null array of offsets", Kind::Mesh, [](Object& o) { setField(o, "face_offset", "data", kNoIndices); },
-     Code::InvalidProperty, "face_offset contains an invalid property data"},
-    {"an offset too few", Kind::Mesh,
-     [](Object& o) {
-         setIndices(o, "face_offset", {0, 6});
-     },
-     Code::InvalidIndex, kFaceOffsetFailure},
-    {"an offset too many", Kind::Mesh,
-     [](Object& o) {
-         setIndices(o, "face_offset", {0, 3, 6, 6});
-     },
-     Code::InvalidIndex, kFaceOffsetFailure},
-    {"a first offset above 0", Kind::Mesh,
-     [](Object& o) {
-         setIndices(o, "face_offset", {1, 3, 6});
-     },
-     Code::InvalidIndex, kFaceOffsetFailure},
+     indices("face_vertex", {0, 1, 2, 2, 1}), Code::InvalidElementCount,
+     "face_vertex has an invalid number of elements"},
+    {"a null array of offsets", Kind::Mesh, noIndices("face_offset"), Code::InvalidProperty,
+     "face_offset contains an invalid property data"},
+    {"an offset too few", Kind::Mesh, indices("face_offset", {0, 6}), Code::InvalidIndex, kFaceOffsetFailure},
+    {"an offset too many", Kind::Mesh, indices("face_offset", {0, 3, 6, 6}), Code::InvalidIndex, kFaceOffsetFailure},
+    {"a first offset above 0", Kind::Mesh, indices("face_offset", {1, 3, 6}), Code::InvalidIndex, kFaceOffsetFailure},
     {"offsets that fall", Kind::Mesh,
      [](Object& o) {
          setField(o, "face_component", "count", 3u);
          setIndices(o, "face_offset", {0, 4, 3, 6});
      },
      Code::InvalidIndex, kFaceOffsetFailure},
-    {"a last offset above the corners", Kind::Mesh,
-     [](Object& o) {
-         setIndices(o, "face_offset", {0, 3, 7});
-     },
-     Code::InvalidIndex, kFaceOffsetFailure},
-    {"a last offset below the corners", Kind::Mesh,
-     [](Object& o) {
-         setIndices(o, "face_offset", {0, 3, 5});
-     }},
+    {"a last offset above the corners", Kind::Mesh, indices("face_offset", {0, 3, 7}), Code::InvalidIndex,
+     kFaceOffsetFailure},
+    {"a last offset below the corners", Kind::Mesh, indices("face_offset", {0, 3, 5})},
     {"offsets that target nothing, thus no face", Kind::Mesh, [](Object& o) { setTarget(o, "face_offset", "nowhere"); },
      Code::InvalidIndex, "face_offset contains an invalid index into nowhere"},
-    {"no faces and the offset 0", Kind::Mesh,
-     [](Object& o) {
-         o.eraseAllProperties();
-         Geometry::populateMesh(o);
-     }},
-    {"no faces and the offset 1", Kind::Mesh,
-     [](Object& o) {
-         o.eraseAllProperties();
-         Geometry::populateMesh(o);
-         setIndices(o, "face_offset", {1});
-     },
-     Code::InvalidIndex, kFaceOffsetFailure},
-    {"no faces and no offset", Kind::Mesh,
-     [](Object& o) {
-         o.eraseAllProperties();
-         Geometry::populateMesh(o);
-         setIndices(o, "face_offset", {});
-     },
-     Code::InvalidIndex, kFaceOffsetFailure},
+    {"no faces and the offset 0", Kind::Mesh, noFaces({0})},
+    {"no faces and the offset 1", Kind::Mesh, noFaces({1}), Code::InvalidIndex, kFaceOffsetFailure},
+    {"no faces and no offset", Kind::Mesh, noFaces({}), Code::InvalidIndex, kFaceOffsetFailure},
     {"a broken further property", Kind::Mesh,
      [](Object& o) {
          addData(o, "point_mass", "point_component", {1, 2});
@@ -182,31 +187,24 @@ Case const kCases[] = {
      Code::InvalidElementCount, "point_mass has an invalid number of elements"},
 
     {"points", Kind::PointCloud, [](Object&) {}},
-    {"no points at all", Kind::PointCloud, [](Object& o) { o.eraseProperty("point_component"); }, Code::InvalidObject,
+    {"no points at all", Kind::PointCloud, without("point_component"), Code::InvalidObject,
      "Object is not a valid point cloud"},
-    {"fewer positions than points", Kind::PointCloud, [](Object& o) { setField(o, "point_component", "count", 4u); },
-     Code::InvalidElementCount, "point_position has an invalid number of elements"},
+    {"fewer positions than points", Kind::PointCloud, count("point_component", 4), Code::InvalidElementCount,
+     "point_position has an invalid number of elements"},
 
     {"strands", Kind::Strand, [](Object&) {}},
-    {"no strands at all", Kind::Strand, [](Object& o) { o.eraseProperty("strand_offset"); }, Code::InvalidObject,
-     "Object is not a valid strand"},
-    {"no offsets of strands", Kind::Strand, [](Object& o) { setField(o, "strand_offset", "data", kNoIndices); },
-     Code::InvalidProperty, "strand_offset contains an invalid property data"},
-    {"a strand beyond the points", Kind::Strand,
-     [](Object& o) {
-         setIndices(o, "strand_offset", {0, 2, 5});
-     },
-     Code::InvalidIndex, kStrandOffsetFailure},
-    {"positions fewer than the points of strands", Kind::Strand,
-     [](Object& o) { setField(o, "point_component", "count", 9u); }, Code::InvalidElementCount,
+    {"no strands at all", Kind::Strand, without("strand_offset"), Code::InvalidObject, "Object is not a valid strand"},
+    {"no offsets of strands", Kind::Strand, noIndices("strand_offset"), Code::InvalidProperty,
+     "strand_offset contains an invalid property data"},
+    {"a strand beyond the points", Kind::Strand, indices("strand_offset", {0, 2, 5}), Code::InvalidIndex,
+     kStrandOffsetFailure},
+    {"positions fewer than the points of strands", Kind::Strand, count("point_component", 9), Code::InvalidElementCount,
      "point_position has an invalid number of elements"},
 
     {"a volume", Kind::Volume, [](Object&) {}},
-    {"no volume at all", Kind::Volume, [](Object& o) { o.eraseProperty("voxel_tile_tree"); }, Code::InvalidObject,
-     "Object is not a valid volume"},
-    {"a volume whose voxels are claimed by numbers alone", Kind::Volume,
-     [](Object& o) { setField(o, "voxel_component", "count", 1u); }, Code::InvalidObject,
-     "Object is not a valid volume"},
+    {"no volume at all", Kind::Volume, without("voxel_tile_tree"), Code::InvalidObject, "Object is not a valid volume"},
+    {"a volume whose voxels are claimed by numbers alone", Kind::Volume, count("voxel_component", 1),
+     Code::InvalidObject, "Object is not a valid volume"},
 
     {"nothing", Kind::Any, [](Object&) {}},
     {"plain values, components and further objects", Kind::Any,
@@ -216,107 +214,62 @@ Case const kCases[] = {
          setProperty(o, "further", createObject());
          addComponent(o, "c", 3);
      }},
-    {"data that targets nothing", Kind::Any, [](Object& o) { addData(o, "d", "", {1}); }, Code::MissingTarget,
-     "d has no target"},
-    {"data that targets what is not there", Kind::Any, [](Object& o) { addData(o, "d", "c", {1}); },
-     Code::MissingTarget, "d has no target"},
-    {"data that targets itself", Kind::Any, [](Object& o) { addData(o, "d", "d", {1}); }, Code::InvalidTarget,
-     "d target itself"},
-    {"data shorter than its component", Kind::Any,
-     [](Object& o) {
-         addComponent(o, "c", 3);
-         addData(o, "d", "c", {1, 2});
-     },
-     Code::InvalidElementCount, "d has an invalid number of elements"},
+    {"data that targets nothing", Kind::Any, data("d", "", {1}), Code::MissingTarget, "d has no target"},
+    {"data that targets what is not there", Kind::Any, data("d", "e", {1}), Code::MissingTarget, "d has no target"},
+    {"data that targets itself", Kind::Any, data("d", "d", {1}), Code::InvalidTarget, "d target itself"},
+    {"data shorter than its component", Kind::Any, data("d", "c", {1, 2}), Code::InvalidElementCount,
+     "d has an invalid number of elements"},
     {"a null array over a component", Kind::Any,
      [](Object& o) {
-         addComponent(o, "c", 1);
-         addData(o, "d", "c", {});
+         data("d", "c", {})(o);
          setField(o, "d", "data", Nexil::Ptr<Nexil::Array<float>>());
      },
      Code::InvalidElementCount, "d has an invalid number of elements"},
     {"data that targets data", Kind::Any,
      [](Object& o) {
-         addComponent(o, "c", 1);
-         addData(o, "e", "c", {1});
-         addData(o, "d", "e", {1});
+         data("e", "c", {1, 2, 3})(o);
+         data("d", "e", {1})(o);
      },
      Code::InvalidTarget, "d has an invalid target e"},
-    {"data over a range", Kind::Any,
-     [](Object& o) {
-         shareOut(o, {5, 6}, {0, 1, 1});
-     }},
-    {"data over a range that asks for no value", Kind::Any,
-     [](Object& o) {
-         shareOut(o, {5, 6}, {kInvalidIndex, 1, kInvalidIndex});
-     }},
+    {"data over a range", Kind::Any, sharedOut({5, 6}, {0, 1, 1})},
+    {"data over a range that asks for no value", Kind::Any, sharedOut({5, 6}, {kInvalidIndex, 1, kInvalidIndex})},
     {"data over a range that asks for no value of none", Kind::Any,
-     [](Object& o) {
-         shareOut(o, {}, {kInvalidIndex, kInvalidIndex, kInvalidIndex});
-     }},
-    {"an index at the number of values", Kind::Any,
-     [](Object& o) {
-         shareOut(o, {5, 6}, {0, 2, 1});
-     },
+     sharedOut({}, {kInvalidIndex, kInvalidIndex, kInvalidIndex})},
+    {"an index at the number of values", Kind::Any, sharedOut({5, 6}, {0, 2, 1}), Code::InvalidIndex, kIndexFailure},
+    {"a last index at the number of values, one more than elements", Kind::Any, sharedOut({5, 6}, {0, 1, 1, 2})},
+    {"a last index at the number of values, as many as elements", Kind::Any, sharedOut({5, 6}, {0, 1, 2}),
      Code::InvalidIndex, kIndexFailure},
-    {"a last index at the number of values, one more than elements", Kind::Any,
-     [](Object& o) {
-         shareOut(o, {5, 6}, {0, 1, 1, 2});
-     }},
-    {"a last index at the number of values, as many as elements", Kind::Any,
-     [](Object& o) {
-         shareOut(o, {5, 6}, {0, 1, 2});
-     },
+    {"a last index behind the number of values", Kind::Any, sharedOut({5, 6}, {0, 1, 1, 3}), Code::InvalidIndex,
+     kIndexFailure},
+    {"a first index at the number of values, one more than elements", Kind::Any, sharedOut({5, 6}, {2, 1, 1, 2}),
      Code::InvalidIndex, kIndexFailure},
-    {"a last index behind the number of values", Kind::Any,
-     [](Object& o) {
-         shareOut(o, {5, 6}, {0, 1, 1, 3});
-     },
-     Code::InvalidIndex, kIndexFailure},
-    {"a first index at the number of values, one more than elements", Kind::Any,
-     [](Object& o) {
-         shareOut(o, {5, 6}, {2, 1, 1, 2});
-     },
-     Code::InvalidIndex, kIndexFailure},
-    {"a range that is told first, though the data over it fails as well", Kind::Any,
-     [](Object& o) {
-         shareOut(o, {5, 6}, {0, 9});
-     },
+    {"a range that is told first, though the data over it fails as well", Kind::Any, sharedOut({5, 6}, {0, 9}),
      Code::InvalidElementCount, "indices has an invalid number of elements"},
     {"data over a range without indices", Kind::Any,
      [](Object& o) {
-         addData(o, "d", "d_index", {1});
-         addComponent(o, "c", 0);
-         addRange(o, "d_index", "c", {});
-         setField(o, "d_index", "indices", kNoIndices);
+         addData(o, "d", "r", {1});
+         range("r", "c", nullptr)(o);
      },
-     Code::InvalidTarget, "d has an invalid target d_index"},
-    {"a range that targets nothing", Kind::Any, [](Object& o) { addRange(o, "r", "c", {}); }, Code::MissingTarget,
+     Code::InvalidTarget, "d has an invalid target r"},
+    {"an end in a range over what is no component", Kind::Any,
+     [](Object& o) {
+         addData(o, "d", "r", {1});
+         range("r", "further", array(Indices{1}))(o);
+         setProperty(o, "further", createObject());
+     },
+     Code::InvalidIndex, "r contains an invalid index into d"},
+    {"a range that targets nothing", Kind::Any, range("r", "e", array(Indices{})), Code::MissingTarget,
      "r has no target"},
-    {"a range that targets itself, its indices being null", Kind::Any,
-     [](Object& o) {
-         addRange(o, "r", "r", {});
-         setField(o, "r", "indices", kNoIndices);
-     },
-     Code::InvalidTarget, "r target itself"},
-    {"a range without indices", Kind::Any,
-     [](Object& o) {
-         addComponent(o, "c", 0);
-         addRange(o, "r", "c", {});
-         setField(o, "r", "indices", kNoIndices);
-     },
-     Code::InvalidProperty, "r contains an invalid property indices"},
-    {"a range shorter than its component", Kind::Any,
-     [](Object& o) {
-         addComponent(o, "c", 3);
-         addRange(o, "r", "c", {0, 0});
-     },
-     Code::InvalidElementCount, "indices has an invalid number of elements"},
+    {"a range that targets itself, its indices being null", Kind::Any, range("r", "r", nullptr), Code::InvalidTarget,
+     "r target itself"},
+    {"a range without indices", Kind::Any, range("r", "c", nullptr), Code::InvalidProperty,
+     "r contains an invalid property indices"},
+    {"a range shorter than its component", Kind::Any, range("r", "c", array(Indices{0, 0})), Code::InvalidElementCount,
+     "indices has an invalid number of elements"},
     {"a range that targets a range", Kind::Any,
      [](Object& o) {
-         addComponent(o, "c", 0);
-         addRange(o, "q", "c", {});
-         addRange(o, "r", "q", {});
+         range("q", "c", array(Indices{0, 0, 0}))(o);
+         range("r", "q", array(Indices{}))(o);
      },
      Code::InvalidTarget, "r has an invalid target q"},
 };

@@ -19,8 +19,11 @@ bool populateRangeGeoProperty(Nexil::Ptr<Nexil::Array<unsigned int>> indices, Ne
 {
     if (!indices)
         indices = Nexil::makePtr<Nexil::Array<unsigned int>>();
-    return range.setPropertyAny(sIndices, std::move(indices)) && range.setPropertyAny(sTarget, target) &&
-           range.setPropertyAny(sDependsOn, Nexil::makePtr<Nexil::Array<Nexil::String>>());
+    Object made;
+    made.setPropertyAny(sIndices, std::move(indices));
+    made.setPropertyAny(sTarget, target);
+    made.setPropertyAny(sDependsOn, Nexil::makePtr<Nexil::Array<Nexil::String>>());
+    return moveProperties(made, range);
 }
 
 void populateTrivialRangeIndices(unsigned long long count, Nexil::Array<unsigned int>& indices)

@@ -6,7 +6,7 @@
 #include <veldrin/geometry/DataInterpolationMode.h>
 #include <veldrin/geometry/Export.h>
 #include <veldrin/geometry/Names.h>
-#include <veldrin/object/Object.h>
+#include <veldrin/object/Properties.h>
 
 #include <type_traits>
 #include <utility>
@@ -17,7 +17,7 @@
 ///     createDataGeoProperty(Math::float3{1, 1, 1}, sPointComp, std::move(values), *colors);
 ///     setProperty(*mesh, sPointColor, std::move(colors));
 ///
-/// Arrays are moved in, never copied. Errors: std::bad_alloc.
+/// Arrays are moved in, never copied. Errors: std::bad_alloc, which leaves the object as it was.
 namespace Veldrin::Geometry {
 
 /// Sets "count": the number of elements of one kind.
@@ -34,11 +34,13 @@ void createDataGeoProperty(T const& defaultValue, Nexil::String const& target,
 {
     if (!data)
         data = Nexil::makePtr<Nexil::Array<T>>();
-    geoProp.setPropertyAny(sData, std::move(data));
-    geoProp.setPropertyAny(sTarget, target);
-    geoProp.setPropertyAny(sDependsOn, Nexil::makePtr<Nexil::Array<Nexil::String>>());
-    geoProp.setPropertyAny(sDefault, Nexil::Any(defaultValue));
-    geoProp.setPropertyAny(sInterp, Common::DataInterpolationMode::Linear);
+    Object made;
+    made.setPropertyAny(sData, std::move(data));
+    made.setPropertyAny(sTarget, target);
+    made.setPropertyAny(sDependsOn, Nexil::makePtr<Nexil::Array<Nexil::String>>());
+    made.setPropertyAny(sDefault, Nexil::Any(defaultValue));
+    made.setPropertyAny(sInterp, Common::DataInterpolationMode::Linear);
+    moveProperties(made, geoProp);
 }
 
 /// The same with an empty array and the target "".

@@ -20,13 +20,12 @@ namespace {
         ObjectPtr object;
     };
 
-    /// All parts are made before the first is stored, so that running out of memory on the way leaves no half geometry.
     bool storeParts(Object& geometry, std::initializer_list<Part> parts)
     {
+        Object made;
         for (Part const& part : parts)
-            if (!setProperty(geometry, part.name, part.object))
-                return false;
-        return true;
+            setProperty(made, part.name, part.object);
+        return moveProperties(made, geometry);
     }
 
     template <class T>

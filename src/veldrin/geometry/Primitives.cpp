@@ -183,9 +183,11 @@ void populateCubeMesh(float size, Object& mesh)
     auto normals = createObject();
     createDataGeoProperty(Math::float3{}, rangeName, arrayOf(kCubeNormals), *normals);
 
-    populateMesh(arrayOf(points), arrayOf(kCubeCorners), arrayOf(offsets), mesh);
-    setProperty(mesh, rangeName, std::move(range));
-    setProperty(mesh, sFaceVertexNormal, std::move(normals));
+    Object made;
+    populateMesh(arrayOf(points), arrayOf(kCubeCorners), arrayOf(offsets), made);
+    setProperty(made, rangeName, std::move(range));
+    setProperty(made, sFaceVertexNormal, std::move(normals));
+    moveProperties(made, mesh);
 }
 
 bool populatePlaneMesh(float size, unsigned int subdivisions, Object& mesh)
@@ -213,8 +215,10 @@ void populateSphereMesh(float radius, Object& mesh)
     auto normalProperty = createObject();
     createDataGeoProperty(Math::float3{}, sPointComp, arrayOf(normals), *normalProperty);
 
-    populateMesh(arrayOf(points), arrayOf(kSphereCorners), arrayOf(offsets), mesh);
-    setProperty(mesh, sPointNormal, std::move(normalProperty));
+    Object made;
+    populateMesh(arrayOf(points), arrayOf(kSphereCorners), arrayOf(offsets), made);
+    setProperty(made, sPointNormal, std::move(normalProperty));
+    moveProperties(made, mesh);
 }
 
 } // namespace Veldrin::Geometry

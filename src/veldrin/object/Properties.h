@@ -53,4 +53,10 @@ bool setProperty(Object& object, Nexil::String const& key, T&& value)
         return object.setPropertyAny(key, Nexil::Any(std::forward<T>(value)));
 }
 
+/// Moves all properties of `from` to `to`, in their order, replacing those that are there already.
+///
+/// All or none: where one is refused, which false tells, or memory runs out, `to` is as it was; `from` is then left without
+/// some of its properties.
+VELDRIN_PLATFORM_API bool moveProperties(Object& from, Object& to);
+
 } // namespace Veldrin

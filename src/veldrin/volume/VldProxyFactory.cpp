@@ -108,9 +108,10 @@ namespace {
 
 void vldProxyFactory(Object const& source, Object& destination)
 {
+    Object made;
     for (auto const& name : getGeoPropNamesByPrototype(source, *getComponentGeoPropPrototype()))
-        Internal::forEachConfiguration(
-            [&]<class Traits>() { Factory<Traits>(source, destination).makeTopology(name); });
+        Internal::forEachConfiguration([&]<class Traits>() { Factory<Traits>(source, made).makeTopology(name); });
+    moveProperties(made, destination);
 }
 
 } // namespace Veldrin::Geometry

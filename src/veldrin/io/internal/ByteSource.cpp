@@ -45,13 +45,6 @@ void ByteSource::moveStream(std::uint64_t position)
     streamPosition_ = position;
 }
 
-int ByteSource::peek()
-{
-    if (taken_ == filled_ && !fill())
-        return -1;
-    return static_cast<unsigned char>(window_[taken_]);
-}
-
 std::uint8_t ByteSource::take()
 {
     if (taken_ == filled_ && !fill())

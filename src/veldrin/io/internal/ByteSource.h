@@ -29,8 +29,6 @@ public:
     [[nodiscard]] bool canSeek() const noexcept { return readAhead_ == ReadAhead::Window; }
     [[nodiscard]] std::uint64_t bytesLeft() const noexcept { return end_ - position(); }
 
-    /// The next byte, without taking it; -1 at the end.
-    [[nodiscard]] int peek();
     /// Takes the next byte. Throws like `read`.
     [[nodiscard]] std::uint8_t take();
     /// Takes `count` bytes into `target`. Throws msgpack::insufficient_bytes when the stream ends before.

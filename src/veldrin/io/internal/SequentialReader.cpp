@@ -50,7 +50,8 @@ Nexil::Array<Nexil::Ptr<Object>> readSequentialStream(ByteSource& source, Object
     bool const hasReferences = version == 4 && headerFlag(header, sStreamHandles);
     ItemReader reader(source);
     auto const visitor = makeVisitor(version, reader, hasReferences ? &earlier : nullptr);
-    while (source.peek() >= 0) {
+    // Up to where the bytes end, not to where reading them fails: what is missing was not read.
+    while (source.bytesLeft() != 0) {
         Nexil::Internal::throwIfJobCancelled();
         auto const& item = reader.next(source.end());
         objects.push_back(visitor->unpackObjectPointer(item));

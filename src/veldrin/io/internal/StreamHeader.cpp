@@ -91,8 +91,7 @@ void readHeader(ByteSource& source, Object& header)
     V3::UnpackVisitor(reader, true, nullptr, nullptr).unpackObject(item, unpacked);
     if (headerUnsigned(unpacked, sStreamIdentifier) != kStreamIdentifier)
         throw Nexil::String("Incorrect zon stream identifier");
-    for (Nexil::String const& key : unpacked.keys())
-        header.setPropertyAny(key, unpacked.getProperty(key));
+    moveProperties(unpacked, header);
 }
 
 unsigned int headerUnsigned(Object const& header, char const* key)
