@@ -1,3 +1,4 @@
+#include "../geometry/AllocationCount.h"
 #include "../volume/Samples.h"
 
 #include <support/Geometry.h>
@@ -41,6 +42,38 @@ TYPED_TEST(VolumeVerdicts, ConvertedVolumesAreValid)
         EXPECT_EQ(Geometry::GeoValidator().validate(*geometry).message.view(), "");
     });
     EXPECT_TRUE(Geometry::VolumeValidator().findFailures(*geometry).empty());
+}
+
+TYPED_TEST(VolumeVerdicts, DataOverAContainerAreJudgedWithoutItsIndices)
+{
+    auto const volume = support::sphereVolume<TypeParam>();
+    auto const count = volume->template component<VoxelTopology<TypeParam>>("voxel_component")->elementCount();
+    auto const geometry = Geometry::move_vld_volume_to_object(*volume);
+    auto const put = [&](std::uint64_t valueCount) {
+        Nexil::Array<float> values;
+        values.resize(valueCount);
+        auto data = createObject();
+        Geometry::createDataGeoProperty<float>(0, "voxel_tile_tree",
+                                               Nexil::makePtr<Nexil::Array<float>>(std::move(values)), *data);
+        setProperty(*geometry, "heat", std::move(data));
+    };
+    auto const message = [](Object const& object) {
+        return std::string(Geometry::GeoValidator().validate(object).message.view());
+    };
+    put(count);
+    EXPECT_EQ(message(*geometry), "");
+    put(count - 1);
+    EXPECT_EQ(message(*geometry), "voxel_tile_tree contains an invalid index into heat");
+
+    // Indices that were made for the first verdict on a volume would not be allocated for the second.
+    auto const fresh = Geometry::move_vld_volume_to_object(*support::sphereVolume<TypeParam>());
+    auto const allocations = [&] {
+        std::uint64_t const before = support::allocationCount();
+        EXPECT_EQ(message(*fresh), "");
+        return support::allocationCount() - before;
+    };
+    std::uint64_t const first = allocations();
+    EXPECT_EQ(first, allocations());
 }
 
 TYPED_TEST(VolumeVerdicts, InconsistentOnesAreNot)

@@ -78,9 +78,11 @@ namespace {
         };
         if (Nexil::AnyArray::is_any_array(data))
             takeArray("data", data);
-        else if (Object::isA(**part, *Geometry::getRangeGeoPropPrototype()))
-            takeArray("range", (*part)->getProperty(Geometry::sIndices));
-        else if (Object::isA(**part, *Geometry::getComponentGeoPropPrototype()))
+        else if (Object::isA(**part, *Geometry::getRangeGeoPropPrototype())) {
+            takeArray("range", Nexil::Ptr<Nexil::Array<unsigned int>>());
+            // Not read, as those of a volume are only made then.
+            line.elements = (*part)->propertyInfo(Geometry::sIndices).arraySize;
+        } else if (Object::isA(**part, *Geometry::getComponentGeoPropPrototype()))
             line.role = "component";
         return line;
     }

@@ -5,12 +5,14 @@
 #include <nexil/String.h>
 #include <veldrin/geometry/DataInterpolationMode.h>
 #include <veldrin/geometry/GeoLocation.h>
+#include <veldrin/geometry/Names.h>
 #include <veldrin/math/BBox.h>
 #include <veldrin/math/FCurve.h>
 #include <veldrin/math/Matrix.h>
 #include <veldrin/math/Quaternion.h>
 #include <veldrin/math/Vector.h>
 #include <veldrin/object/Object.h>
+#include <veldrin/volume/VldProxyComponentContainer.h>
 
 #include <fmt/format.h>
 
@@ -220,8 +222,7 @@ namespace {
                         sum_ += bytesOfView(inner, *known->row);
             } else if (auto const* const object = value.get<ObjectPtr>()) {
                 if (isNew(object->get()))
-                    for (auto const& key : (*object)->keys())
-                        pending_.push_back((*object)->getProperty(key));
+                    addObject(**object);
             } else if (auto const* const curve = value.get<Nexil::Ptr<Math::FCurve>>()) {
                 if (isNew(curve->get()))
                     sum_ += (*curve)->keys().size() * sizeof(Math::FCurve::Key);
@@ -241,6 +242,17 @@ namespace {
                 addElements<GeoLocation>(value);
                 addElements<Nexil::Any>(value);
             }
+        }
+
+        void addObject(Object const& object)
+        {
+            // Indices of a volume count up, and are only made when they are read.
+            bool const hasMadeIndices = dynamic_cast<Geometry::VldProxyComponentContainer const*>(&object);
+            for (auto const& key : object.keys())
+                if (hasMadeIndices && key == Geometry::sIndices)
+                    sum_ += object.propertyInfo(key).arraySize * sizeof(unsigned int);
+                else
+                    pending_.push_back(object.getProperty(key));
         }
 
         template <class T>

@@ -5,6 +5,7 @@
 #include <veldrin/object/Properties.h>
 #include <veldrin/validation/internal/IndexScan.h>
 #include <veldrin/validation/internal/Messages.h>
+#include <veldrin/volume/VldProxyComponentContainer.h>
 
 namespace Veldrin::Geometry::Internal {
 
@@ -35,6 +36,18 @@ namespace {
         return component && isComponent(*component) && indexCount == std::uint64_t(getElementCount(*component)) + 1;
     }
 
+    /// Data over the container of a volume, whose indices count up: they are not made to be looked at, as they are far more
+    /// than what a small file says of its tiles.
+    PropertyVerdict judgeDataOfContainer(Object const& geometry, Nexil::String const& name,
+                                         Nexil::String const& targetName, Object const& container,
+                                         std::uint64_t valueCount)
+    {
+        auto const indexCount = container.propertyInfo(sIndices).arraySize;
+        if (indexCount <= valueCount + (mayHaveEnd(geometry, container, indexCount) ? 1 : 0))
+            return {};
+        return invalidIndex(name, targetName, name);
+    }
+
     PropertyVerdict judgeData(Object const& geometry, Nexil::String const& name, Object const& data)
     {
         auto const targetName = getGeoPropTargetName(data);
@@ -49,6 +62,8 @@ namespace {
                 return tooFewElements(name, name);
             return {};
         }
+        if (dynamic_cast<VldProxyComponentContainer const*>(target.get()))
+            return judgeDataOfContainer(geometry, name, targetName, *target, valueCount);
         auto const indices = isRange(*target) ? getRangeGeoPropIndices(*target) : IndicesPtr();
         if (!indices)
             return invalidTarget(name, targetName);
