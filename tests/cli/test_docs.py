@@ -27,6 +27,8 @@ class Examples(tool.ToolTest):
                 self.write(command[4:], shown)
             result = subprocess.run(command, shell=True, cwd=self.folder, env=environment, encoding="utf-8",
                                     capture_output=True)
+            if "built without OpenVDB" in result.stderr:
+                self.skipTest(result.stderr)
             # What is computed is the same everywhere, to the last index and blank.
             compared = str if command.startswith(EXACT) else words
             self.assertEqual(compared(result.stderr + result.stdout), compared(shown), command)

@@ -40,29 +40,6 @@ namespace {
     // Ten thousand million voxels of constant values; what is larger is a fault, or more than memory holds.
     constexpr double kMostBlocks = 1 << 24;
 
-    template <class E>
-    struct VdbOf;
-    template <>
-    struct VdbOf<float> {
-        using Grid = openvdb::FloatGrid;
-    };
-    template <>
-    struct VdbOf<double> {
-        using Grid = openvdb::DoubleGrid;
-    };
-    template <>
-    struct VdbOf<int> {
-        using Grid = openvdb::Int32Grid;
-    };
-    template <>
-    struct VdbOf<bool> {
-        using Grid = openvdb::BoolGrid;
-    };
-    template <>
-    struct VdbOf<float3> {
-        using Grid = openvdb::Vec3SGrid;
-    };
-
     /// Calls visit.operator()<E>() for the element types that both sides have.
     template <class Visit>
     void forEachElementType(Visit const& visit)
@@ -96,6 +73,10 @@ namespace {
     {
         return {c.x, c.y, c.z};
     }
+
+    /// Their usual tree over values of that type: `openvdb::FloatGrid` for float.
+    template <class E>
+    using VdbGrid = openvdb::Grid<typename openvdb::tree::Tree4<decltype(theirs(E())), 5, 4, 3>::Type>;
 
     /// What the inside of a level set has where there is no band.
     template <class E>
@@ -187,7 +168,7 @@ namespace {
     template <class E>
     class GridReader {
     public:
-        using Grid = typename VdbOf<E>::Grid;
+        using Grid = VdbGrid<E>;
         using Leaf = typename Grid::TreeType::LeafNodeType;
         static_assert(Leaf::DIM == kBlockWidth);
 
@@ -412,7 +393,7 @@ namespace {
         Nexil::String channelName;
         bool isKnown = false;
         forEachElementType([&]<class E>() {
-            using Grid = typename VdbOf<E>::Grid;
+            using Grid = VdbGrid<E>;
             if (grid.type() != Grid::gridType())
                 return;
             isKnown = true;
@@ -461,7 +442,7 @@ namespace {
         auto const stateOf = [&](std::uint64_t element) {
             return states ? (*states)[element] : isActive((*values)[element]);
         };
-        auto grid = VdbOf<E>::Grid::create(theirs(background));
+        auto grid = VdbGrid<E>::create(theirs(background));
         grid->setGridClass(isLevelSet(channel.name())                     ? openvdb::GRID_LEVEL_SET
                            : channel.name() == Geometry::sVoxelFogDensity ? openvdb::GRID_FOG_VOLUME
                                                                           : openvdb::GRID_UNKNOWN);

@@ -51,10 +51,10 @@ public:
     /// Sets a property of the channel itself, for everybody who shares it; "target" only names this proxy's target as well.
     bool setInPlacePropertyAny(Nexil::String const& name, Nexil::Any const& value);
 
+private:
     /// The step behind both ways to set; false, and nothing changed, for a property or a value that is refused.
     bool setInternalPropertyAny(Nexil::String const& name, bool inPlace, Nexil::Any const& value);
 
-private:
     Nexil::Ptr<VLD::TileTree3D::ChannelBase> channel_;
     Nexil::String target_;
 };
