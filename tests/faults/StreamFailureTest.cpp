@@ -96,6 +96,8 @@ Objects objectsOf(Sample const& sample)
     Objects objects;
     for (auto const& object : {sample.mesh, sample.strands, sample.smallVolume, sample.mesh})
         objects.push_back(object);
+    // Arrays so long that they are read past the window, by seeking.
+    objects.push_back(support::filled([](Object& o) { Geometry::populatePlaneMesh(1, 70, o); }));
     return objects;
 }
 
@@ -157,6 +159,20 @@ TEST(StreamFailure, AtAnyWriteSeekOrFlushIsAFailureWithOneMessage)
         EXPECT_EQ(survived, 0);
     }
     EXPECT_EQ(sample.description(), before);
+}
+
+TEST(StreamFailure, OfAStreamWithoutABufferIsAMessage)
+{
+    std::iostream nowhere(nullptr);
+    Nexil::InputStream input(nowhere);
+    Nexil::OutputStream output(nowhere);
+    Messages messages;
+    Objects objects;
+    auto const header = createObject();
+    EXPECT_FALSE(IO::deserialize(input, objects, {}, &messages));
+    EXPECT_FALSE(IO::deserializeHeader(input, *header, &messages));
+    EXPECT_FALSE(IO::serialize(objects, output, {}, &messages));
+    EXPECT_EQ(messages.errors().size(), 3u);
 }
 
 } // namespace

@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdio>
+#include <filesystem>
 
 namespace {
 
@@ -72,6 +73,25 @@ TEST(StreamInspection, KnowsOlderVersionsAndRefusesWhatHasNoTable)
     EXPECT_THAT(messages.errors(),
                 testing::ElementsAre("Corrupt stream header", "Corrupt handles", "Unknown msgpack error occurred"));
     EXPECT_EQ(layout.version, 5u);
+}
+
+TEST(StreamInspection, StaysInsideOfDamagedStreamsAndFindsNoFaultInReadableOnes)
+{
+    for (auto const& file : std::filesystem::recursive_directory_iterator(VELDRIN_TEST_CORPUS "/streams")) {
+        if (file.path().extension() != ".zon")
+            continue;
+        auto const bytes = support::fileBytes(file.path().string());
+        bool const isReadable = support::read(bytes).isRead;
+        support::Messages messages;
+        StreamLayout layout;
+        bool const isInspected = inspect(bytes, layout, messages);
+        EXPECT_TRUE(isInspected || !isReadable) << file;
+        EXPECT_EQ(messages.errors().size(), isInspected ? 0u : 1u) << file;
+        for (auto const& entry : layout.entries) {
+            EXPECT_LE(entry.position + entry.byteCount, bytes.size()) << file;
+            EXPECT_TRUE(!isReadable || (entry.isIntact && entry.typeCode < 370)) << file;
+        }
+    }
 }
 
 } // namespace
