@@ -45,6 +45,19 @@ TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
     };
     std::vector<Damage> const damages{
         {"leaf origins not increasing", [&](TileLevels& l) { swap(l.leafOrigins, 0, 1); }},
+        {"leaf tiles in another order, with all that points at them",
+         [&](TileLevels& l) {
+             swap(l.leafOrigins, 0, 1);
+             swap(l.leafParents, 0, 1);
+             for (unsigned int& child : l.innerChildren)
+                 child = child < 2 ? 1 - child : child;
+         }},
+        {"an inner tile twice, once without leaf tiles",
+         [&](TileLevels& l) {
+             l.innerOrigins.push_back(l.innerOrigins[l.innerOrigins.size() - 1]);
+             for (unsigned int cell = 0; cell < Traits::kInnerCells; ++cell)
+                 l.innerChildren.push_back(kNoTile);
+         }},
         {"a leaf origin twice", [&](TileLevels& l) { l.leafOrigins[1] = l.leafOrigins[0]; }},
         {"a leaf origin not aligned", [&](TileLevels& l) { l.leafOrigins[0].z += 1; }},
         {"a leaf origin elsewhere", [&](TileLevels& l) { l.leafOrigins[0].x -= 100 * kWidth; }},
