@@ -233,12 +233,18 @@ bool buildFaceVertexAdjacency(Object const& mesh, Nexil::Array<FaceEdge>& adjace
     faces.withRanges([&](auto const& ranges) {
         blocks.forEach([&](std::size_t block) {
             blocks.forEachChunk(block, [&, points = faces.points(), places = blocks.counts(block).data(),
-                                        target = groups.data()](std::uint64_t begin, std::uint64_t end) {
+                                        target = groups.data(),
+                                        last = faces.cornerCount()](std::uint64_t begin, std::uint64_t end) {
                 for (std::uint64_t f = begin; f < end; ++f) {
                     Geometry::IndexRange const range = ranges[f];
-                    for (std::uint64_t i = range.begin; i < range.end; ++i)
+                    for (std::uint64_t i = range.begin; i < range.end; ++i) {
+                        if (i + 2 * kPrefetchDistance < last) {
+                            __builtin_prefetch(places + points[i + 2 * kPrefetchDistance], 1);
+                            __builtin_prefetch(target + places[points[i + kPrefetchDistance]], 1);
+                        }
                         target[places[points[i]]++] = {static_cast<unsigned int>(f),
                                                        static_cast<unsigned int>(i - range.begin)};
+                    }
                 }
             });
         });
