@@ -202,7 +202,8 @@ Case const kCases[] = {
      "point_position has an invalid number of elements"},
 
     {"a volume", Kind::Volume, [](Object&) {}},
-    {"no volume at all", Kind::Volume, without("voxel_tile_tree"), Code::InvalidObject, "Object is not a valid volume"},
+    {"no volume at all", Kind::Volume, [](Object& o) { o.eraseAllProperties(); }, Code::InvalidObject,
+     "Object is not a valid volume"},
     {"a volume whose voxels are claimed by numbers alone", Kind::Volume, count("voxel_component", 1),
      Code::InvalidObject, "Object is not a valid volume"},
 
@@ -262,8 +263,12 @@ Case const kCases[] = {
      "r has no target"},
     {"a range that targets itself, its indices being null", Kind::Any, range("r", "r", nullptr), Code::InvalidTarget,
      "r target itself"},
-    {"a range without indices", Kind::Any, range("r", "c", nullptr), Code::InvalidProperty,
-     "r contains an invalid property indices"},
+    {"a range without indices over what is no component", Kind::Any,
+     [](Object& o) {
+         data("d", "c", {1, 2, 3})(o);
+         range("r", "d", nullptr)(o);
+     },
+     Code::InvalidProperty, "r contains an invalid property indices"},
     {"a range shorter than its component", Kind::Any, range("r", "c", array(Indices{0, 0})), Code::InvalidElementCount,
      "indices has an invalid number of elements"},
     {"a range that targets a range", Kind::Any,

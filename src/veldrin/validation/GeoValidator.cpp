@@ -45,9 +45,8 @@ namespace Internal {
                     }
                     return verdicts;
                 },
-                [stopsAtFailure](Verdicts left, Verdicts right) {
-                    if (!stopsAtFailure || !endsInFailure(left))
-                        left.insert(left.end(), std::move_iterator(right.begin()), std::move_iterator(right.end()));
+                [](Verdicts left, Verdicts right) {
+                    left.insert(left.end(), std::move_iterator(right.begin()), std::move_iterator(right.end()));
                     return left;
                 });
         }
