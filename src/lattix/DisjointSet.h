@@ -72,8 +72,8 @@ public:
     /// place of `a`, it saves the way there.
     ///
     /// Two threads that link the same root at once lose one of the unions. They know it afterwards: no union was lost if
-    /// and only if there have been size() - rootCount() links since the set was made. Otherwise `unite` has to be called for
-    /// each pair that onLink was told, which brings back what was lost.
+    /// there have been size() - rootCount() links since the set was made. Otherwise `unite` has to be called for each pair
+    /// that onLink was told, which brings back what was lost. No thread may call `unite` beside this.
     template <class OnLink>
     Index uniteLoosely(Index a, Index b, OnLink const& onLink) noexcept(noexcept(onLink(a, b)))
     {

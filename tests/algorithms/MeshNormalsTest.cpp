@@ -266,6 +266,26 @@ TEST(MeshNormals, OfMessyMeshesAreTheBitsOfALoopOverTheFacesOnAllThreads)
                 expectBitsOfALoopOverTheFaces(pointCount, spread, faceSize);
 }
 
+TEST(MeshNormals, PointsWithoutAnyFaceGetTheFallback)
+{
+    for (std::size_t const pointCount : {20000u, 200000u}) {
+        auto const object = support::mesh(std::vector<float3>(pointCount), {{0, 1, 2}});
+        for (auto const* component : {Veldrin::Geometry::sFaceComp, Veldrin::Geometry::sFaceVertexComp})
+            ASSERT_TRUE(Veldrin::Geometry::setElementCount(component, 0, *object));
+        Nexil::MutablePtr<Veldrin::Object> offsets(support::part(*object, Veldrin::Geometry::sFaceOffset));
+        Veldrin::setProperty(*offsets, Veldrin::Geometry::sData, support::array(std::vector<unsigned int>{}));
+        Veldrin::setProperty(*object, Veldrin::Geometry::sFaceOffset, Nexil::Ptr<Veldrin::Object>(std::move(offsets)));
+        support::onThreadCounts([&] {
+            for (bool const byAngle : {false, true}) {
+                Normals normals;
+                computeMeshVertexNormals(*object, byAngle, false, normals);
+                ASSERT_EQ(normals.size(), pointCount);
+                EXPECT_EQ(normals[pointCount - 1], (float3{0, 1, 0}));
+            }
+        });
+    }
+}
+
 TEST(MeshNormals, AnglesAreExactToAFewUnitsInTheLastPlace)
 {
     // Two triangles at right angles share one point: the normal there tells their angles' ratio.
@@ -394,6 +414,34 @@ TEST(FaceVertexAdjacency, RefusesWhatIsNoMeshOfWholeFaces)
     Adjacency none;
     EXPECT_TRUE(none.build(*support::filled([](Veldrin::Object& object) { Veldrin::Geometry::populateMesh(object); })));
     EXPECT_EQ(none.index, (Nexil::Array<unsigned int>{0})) << "a mesh without faces or points is one";
+}
+
+TEST(FaceVertexAdjacency, OffsetsThatWrapAmongOnesThatRiseStayWithinTheirArrays)
+{
+    // Whole runs of offsets are looked at together: the second one has steps of 3 and wraps.
+    constexpr unsigned int kRun = 16384;
+    std::vector<unsigned int> offsets;
+    for (unsigned int i = 0; i < kRun; ++i)
+        offsets.push_back(3 * i);
+    for (unsigned int i = 0; i < kRun; ++i)
+        offsets.push_back(0xFFFFFFFEu + 3 * i);
+    for (unsigned int i = 0; i < 2 * kRun; ++i)
+        offsets.push_back(3 * kRun - 2 + 2 * i);
+    offsets.push_back(3 * 4 * kRun);
+    std::vector<unsigned int> corners(offsets.back());
+    for (std::size_t i = 0; i < corners.size(); ++i)
+        corners[i] = static_cast<unsigned int>(i * 7919 % 1000);
+    auto const object = support::filled([&](Veldrin::Object& mesh) {
+        Veldrin::Geometry::populateMesh(support::array(std::vector<float3>(1000)), support::array(corners),
+                                        support::array(offsets), mesh);
+    });
+    Normals normals;
+    computeMeshFaceNormals(*object, normals);
+    EXPECT_EQ(normals.size(), offsets.size() - 1);
+    computeMeshVertexNormals(*object, true, true, normals);
+    EXPECT_EQ(normals.size(), 1000u);
+    Adjacency found;
+    EXPECT_FALSE(found.build(*object));
 }
 
 TEST(FaceVertexAdjacency, FansBooksAndGiantPolygonsAreNoHarderThanAGrid)

@@ -110,6 +110,24 @@ TEST(DisjointSet, LooseUnionsAreTheSameOnOneThreadAndTellOnSeveralWhetherOneWasL
     }
 }
 
+TEST(DisjointSet, ALostUnionIsCountedAndComesBack)
+{
+    Sets sets(10);
+    std::vector<std::pair<unsigned int, unsigned int>> links;
+    auto const keep = [&](unsigned int a, unsigned int b) { links.emplace_back(a, b); };
+    // Links the same root between the look at it and the store, as another thread may.
+    sets.uniteLoosely(9, 3, [&](unsigned int a, unsigned int b) {
+        keep(a, b);
+        sets.uniteLoosely(9, 5, keep);
+    });
+    EXPECT_NE(sets.find(9), sets.find(5));
+    EXPECT_NE(links.size(), sets.size() - sets.rootCount());
+    for (auto const& [a, b] : links)
+        sets.unite(a, b);
+    EXPECT_EQ(sets.find(9), 3u);
+    EXPECT_EQ(sets.find(5), 3u);
+}
+
 TEST(DisjointSet, NoElementsAreNoSets)
 {
     Sets sets(0);

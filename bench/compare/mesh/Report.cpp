@@ -85,9 +85,12 @@ namespace {
             for (std::size_t i = 0; i < normals.size(); ++i) {
                 Point const& a = normals[i];
                 Point const& b = other.normals[i];
-                worst = std::max({worst, std::fabs(a.x - b.x), std::fabs(a.y - b.y), std::fabs(a.z - b.z)});
+                for (float const apart : {std::fabs(a.x - b.x), std::fabs(a.y - b.y), std::fabs(a.z - b.z)})
+                    worst = apart <= worst ? worst : apart; // also where it is no number
+                if (std::isnan(worst))
+                    break;
             }
-            if (worst > toleranceOf(kernel))
+            if (!(worst <= toleranceOf(kernel)))
                 std::fprintf(stderr, "[%s: %.2g apart] ", nameOf(kernel), static_cast<double>(worst));
             return worst <= toleranceOf(kernel);
         }

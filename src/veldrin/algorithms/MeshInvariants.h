@@ -12,7 +12,7 @@
 ///
 /// Points that no face uses count: each is a piece of its own. What counts as an edge stands at `HalfEdgeDataStructure`;
 /// corners whose index is not below the element count of "point_component" are ignored. Counts are cut to 32 bits.
-/// Cost:    that of the edge table, `connectedComponents` less; memory 12 bytes a point besides.
+/// Cost:    that of the edge table, `connectedComponents` less; memory 12 to 24 bytes a point besides.
 /// Errors:  std::bad_alloc; std::runtime_error when the job is cancelled. An object that is no mesh, or whose "face_offset"
 ///          or "face_vertex" is missing or shorter than its counts ask for, has the result that each function names.
 /// Threads: parallel, the same for every thread count; safe to run at once on one mesh.

@@ -35,6 +35,8 @@ public:
     /// The corners of the faces [begin, end).
     [[nodiscard]] IndexRange corners(std::uint64_t begin, std::uint64_t end) const noexcept
     {
+        if (begin == end)
+            return {};
         unsigned int const* const offsets = offsets_.data();
         return {std::min<std::uint64_t>(offsets[begin], cornerCount_),
                 std::min<std::uint64_t>(offsets[end], cornerCount_)};

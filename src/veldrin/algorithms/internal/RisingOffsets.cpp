@@ -37,13 +37,15 @@ namespace {
     {
         if (rangeCount == 0)
             return {};
-        // Ranges of one size that begin at 0 rise unless they run over what 32 bits count.
+        // Ranges of one size that begin at 0 rise unless they run over what 32 bits count. Differences wrap, so each chunk
+        // has to begin where such ranges would.
         unsigned int const size = offsets[1];
         bool const mayBeUniform = offsets[0] == 0 && size * rangeCount == offsets[rangeCount];
         return Nexil::parallel::reduceInOrder(
             rangeCount, grain::kOffsets, Shape{true, mayBeUniform},
             [&](std::size_t begin, std::size_t end, Shape shape) {
-                shape.isUniform = shape.isUniform && haveSize(offsets, begin, end, size);
+                shape.isUniform = shape.isUniform && offsets[begin] == size * std::uint64_t(begin) &&
+                                  haveSize(offsets, begin, end, size);
                 shape.isRising = shape.isRising && (shape.isUniform || rise(offsets, begin, end));
                 return shape;
             },
