@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <numeric>
 #include <random>
 
 namespace {
@@ -176,6 +177,66 @@ TEST(ComponentConversion, HostileTopologyStaysWithinItsArrays)
     EXPECT_EQ(flags(pointsToFaces(*mesh, mask(all), Style::AnyElement, &ok)), Flags({false, true, false, false}));
     EXPECT_EQ(flags(faceVerticesToFaces(*mesh, mask(all), Style::AllElements, &ok)),
               Flags({false, false, false, true}));
+}
+
+/// A mesh of one-point faces as these offsets have it.
+Nexil::MutablePtr<Veldrin::Object> meshWithOffsets(std::vector<unsigned int> const& offsets, unsigned int cornerCount)
+{
+    std::vector<unsigned int> corners(cornerCount);
+    std::iota(corners.begin(), corners.end(), 0u);
+    return support::filled([&](Veldrin::Object& mesh) {
+        populateMesh(support::array(std::vector<Veldrin::Math::float3>(cornerCount)), support::array(corners),
+                     support::array(offsets), mesh);
+    });
+}
+
+TEST(ComponentConversion, RangesThatOverlapAreEachTakenWhole)
+{
+    std::mt19937 random(5);
+    for (int round = 0; round < 40; ++round) {
+        unsigned int const cornerCount = 20;
+        std::vector<unsigned int> offsets(31);
+        for (unsigned int& offset : offsets)
+            offset = static_cast<unsigned int>(random() % (cornerCount + 1));
+        auto const mesh = meshWithOffsets(offsets, cornerCount);
+        Flags corners(cornerCount);
+        for (std::size_t i = 0; i < corners.size(); ++i)
+            corners[i] = round % 3 == 0 ? random() % 8 == 0 : random() % 8 != 0;
+        Flags any(30), all(30), faces(30), reached(cornerCount);
+        for (std::size_t f = 0; f < 30; ++f) {
+            faces[f] = random() % 6 == 0;
+            unsigned int selected = 0;
+            for (unsigned int i = offsets[f]; i < offsets[f + 1]; ++i) {
+                selected += corners[i];
+                reached[i] = reached[i] || faces[f];
+            }
+            any[f] = selected > 0;
+            all[f] = offsets[f] < offsets[f + 1] && selected == offsets[f + 1] - offsets[f];
+        }
+        EXPECT_EQ(flags(faceVerticesToFaces(*mesh, mask(corners), Style::AnyElement, nullptr)), any);
+        EXPECT_EQ(flags(pointsToFaces(*mesh, mask(corners), Style::AnyElement, nullptr)), any);
+        EXPECT_EQ(flags(faceVerticesToFaces(*mesh, mask(corners), Style::AllElements, nullptr)), all);
+        EXPECT_EQ(flags(pointsToFaces(*mesh, mask(corners), Style::AllElements, nullptr)), all);
+        EXPECT_EQ(flags(facesToFaceVertices(*mesh, mask(faces), nullptr)), reached);
+        EXPECT_EQ(flags(facesToPoints(*mesh, mask(faces), nullptr)), reached);
+    }
+}
+
+TEST(ComponentConversion, OffsetsThatSwingTakeNoMoreThanALinearTime)
+{
+    // Every other face owns all corners: face by face that would be 5e11 looks.
+    constexpr unsigned int kCount = 1000000;
+    std::vector<unsigned int> offsets(kCount + 1);
+    for (unsigned int f = 0; f <= kCount; ++f)
+        offsets[f] = f % 2 * kCount;
+    auto const mesh = meshWithOffsets(offsets, kCount);
+    Flags selected(kCount, true);
+    auto const faces = pointsToFaces(*mesh, mask(selected), Style::AllElements, nullptr);
+    EXPECT_TRUE((*faces)[0]);
+    EXPECT_FALSE((*faces)[1]);
+    EXPECT_TRUE((*facesToPoints(*mesh, mask(selected), nullptr))[kCount - 1]);
+    selected.back() = false;
+    EXPECT_FALSE((*faceVerticesToFaces(*mesh, mask(selected), Style::AllElements, nullptr))[0]);
 }
 
 } // namespace

@@ -96,27 +96,71 @@ namespace {
         std::uint64_t size_;
     };
 
+    /// Calls body(i) for every range below `count`, in parallel. False, and not all of them are visited, where offsets
+    /// fall: ranges overlap then, and to go over each could take the square of the time.
+    template <class Body>
+    bool forEachRange(OffsetRanges const& ranges, std::uint64_t count, Body const& body)
+    {
+        std::atomic<bool> areRising{true};
+        Nexil::parallel::forRange(count, grain::kElements, [&](std::size_t begin, std::size_t end) {
+            if (!areRising.load(std::memory_order_relaxed))
+                return;
+            if (!ranges.rise(begin, end)) {
+                areRising.store(false, std::memory_order_relaxed);
+                return;
+            }
+            // A copy: after each atomic store, what is read through a reference is read again.
+            Body const own = body;
+            for (std::size_t i = begin; i < end; ++i)
+                own(i);
+        });
+        return areRising.load(std::memory_order_relaxed);
+    }
+
     /// Gathers over ranges: destination i from isSelected over its own range.
     template <class IsSelected>
     void gather(Destination& destination, OffsetRanges const& ranges, TagConversionStyle style,
                 IsSelected const& isSelected)
     {
+        std::uint64_t const count = std::min(ranges.count(), destination.size());
         bool* const flags = destination.flags();
-        forEach(std::min(ranges.count(), destination.size()),
-                [&](std::uint64_t i) { flags[i] = isRangeSelected(ranges[i], style, isSelected); });
+        if (forEachRange(ranges, count,
+                         [&, flags](std::uint64_t i) { flags[i] = isRangeSelected(ranges[i], style, isSelected); }))
+            return;
+        // Ranges that overlap: for each element where the next one is that decides.
+        bool const decisive = style != TagConversionStyle::AllElements;
+        Nexil::Array<std::uint64_t> deciding;
+        Nexil::Internal::resizeUninitialized(deciding, ranges.limit());
+        for (std::uint64_t i = ranges.limit(), next = i; i-- > 0;)
+            deciding[i] = next = isSelected(i) == decisive ? i : next;
+        forEach(count, [=, next = deciding.data()](std::uint64_t i) {
+            IndexRange const range = ranges[i];
+            flags[i] = range.begin < range.end && (next[range.begin] < range.end) == decisive;
+        });
     }
 
     /// Scatters from ranges: every element of a selected range reaches visit(element).
     template <class Visit>
     void scatter(OffsetRanges const& ranges, Source const& source, Visit const& visit)
     {
-        forEach(std::min(ranges.count(), source.size()), [=](std::uint64_t i) {
-            if (!source[i])
-                return;
-            IndexRange const range = ranges[i];
-            for (std::uint64_t k = range.begin; k < range.end; ++k)
+        std::uint64_t const count = std::min(ranges.count(), source.size());
+        if (forEachRange(ranges, count, [=](std::uint64_t i) {
+                if (!source[i])
+                    return;
+                IndexRange const range = ranges[i];
+                for (std::uint64_t k = range.begin; k < range.end; ++k)
+                    visit(k);
+            }))
+            return;
+        // Ranges that overlap: for each element how far ranges that begin there reach.
+        Nexil::Array<std::uint64_t> ends;
+        ends.resize(ranges.limit());
+        for (std::uint64_t i = 0; i < count; ++i)
+            if (IndexRange const range = ranges[i]; source[i] && range.begin < range.end)
+                ends[range.begin] = std::max(ends[range.begin], range.end);
+        for (std::uint64_t k = 0, end = 0; k < ranges.limit(); ++k)
+            if (end = std::max(end, ends[k]); k < end)
                 visit(k);
-        });
     }
 
     /// From elements of `sourceName` to the elements that own ranges of them.

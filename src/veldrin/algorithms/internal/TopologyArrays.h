@@ -45,10 +45,21 @@ public:
 
     /// Number of ranges that the offsets describe.
     [[nodiscard]] std::uint64_t count() const noexcept { return count_; }
+    /// Where ranges are cut off.
+    [[nodiscard]] std::uint64_t limit() const noexcept { return limit_; }
 
     [[nodiscard]] IndexRange operator[](std::uint64_t i) const noexcept
     {
         return {std::min<std::uint64_t>(offsets_[i], limit_), std::min<std::uint64_t>(offsets_[i + 1], limit_)};
+    }
+
+    /// Whether no range of [begin, end) ends before it begins. To its end and by bits, so that it becomes vector code.
+    [[nodiscard]] bool rise(std::uint64_t begin, std::uint64_t end) const noexcept
+    {
+        unsigned int falls = 0;
+        for (std::uint64_t i = begin; i < end; ++i)
+            falls |= offsets_[i + 1] < offsets_[i] ? 1u : 0u;
+        return falls == 0;
     }
 
 private:
