@@ -3,7 +3,9 @@
 #include <nexil/parallel/Parallel.h>
 #include <veldrin/algorithms/internal/TopologyArrays.h>
 
+#include <algorithm>
 #include <atomic>
+#include <vector>
 
 namespace Veldrin::Geometry {
 
@@ -152,15 +154,17 @@ namespace {
                     visit(k);
             }))
             return;
-        // Ranges that overlap: for each element how far ranges that begin there reach.
-        Nexil::Array<std::uint64_t> ends;
-        ends.resize(ranges.limit());
+        // Ranges that overlap: from left to right, each from where those before it ended.
+        std::vector<IndexRange> selected;
         for (std::uint64_t i = 0; i < count; ++i)
-            if (IndexRange const range = ranges[i]; source[i] && range.begin < range.end)
-                ends[range.begin] = std::max(ends[range.begin], range.end);
-        for (std::uint64_t k = 0, end = 0; k < ranges.limit(); ++k)
-            if (end = std::max(end, ends[k]); k < end)
-                visit(k);
+            if (source[i] && ranges[i].begin < ranges[i].end)
+                selected.push_back(ranges[i]);
+        std::sort(selected.begin(), selected.end(),
+                  [](IndexRange const& a, IndexRange const& b) { return a.begin < b.begin; });
+        std::uint64_t next = 0;
+        for (IndexRange const& range : selected)
+            for (next = std::max(next, range.begin); next < range.end; ++next)
+                visit(next);
     }
 
     /// From elements of `sourceName` to the elements that own ranges of them.

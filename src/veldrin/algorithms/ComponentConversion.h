@@ -18,7 +18,8 @@
 ///          the result is all false.
 /// Ranges that run beyond their index array are cut off there; indices beyond the destination are dropped.
 /// Cost: one pass over the topology that it reads, parallel from 1025 elements on; no memory but the result. Where offsets
-/// fall, so that ranges overlap, two more passes in order, and 8 bytes for each element that the ranges run over.
+/// fall, so that ranges overlap, two more passes in order, n log n in the ranges, and 8 bytes for each flag of the mask or
+/// corner that is looked at, or 16 for each selected range.
 /// Errors: std::bad_alloc, and std::runtime_error when the job is cancelled.
 /// Threads: same result for every thread count; safe to run at once on one geometry.
 namespace Veldrin::Geometry {
