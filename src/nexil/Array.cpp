@@ -6,6 +6,7 @@
 
 #if defined(__linux__)
 #    include <sys/mman.h>
+#    include <unistd.h>
 #endif
 
 namespace Nexil::Internal {
@@ -17,6 +18,8 @@ namespace {
     // grows by doubling: from one run to the next, blocks that soon go back made that twice as quick or thrice as slow.
     // Below this an array gains nothing from huge pages, and the padding to whole ones would be a large share.
     constexpr std::size_t kHugePagesFromBytes = std::size_t(16) << 20;
+    // Smaller blocks come from memory that is in use already.
+    constexpr std::size_t kTakePagesFromBytes = std::size_t(64) << 10;
 
     void* allocateOnHugePages(std::size_t byteCount)
     {
@@ -66,6 +69,25 @@ void* UntypedTypeRep::allocateWhileGrowing(std::uint64_t count) const
 void UntypedTypeRep::deallocate(void* pointer, std::uint64_t) const noexcept
 {
     std::free(pointer);
+}
+
+void takePages([[maybe_unused]] void* block, [[maybe_unused]] std::size_t byteCount) noexcept
+{
+#if defined(__linux__) && defined(MADV_POPULATE_WRITE)
+    if (byteCount < kTakePagesFromBytes || byteCount >= kHugePagesFromBytes)
+        return;
+    auto const pageBytes = static_cast<std::uintptr_t>(sysconf(_SC_PAGESIZE));
+    auto const begin = (reinterpret_cast<std::uintptr_t>(block) + pageBytes - 1) / pageBytes * pageBytes;
+    auto const end = (reinterpret_cast<std::uintptr_t>(block) + byteCount) / pageBytes * pageBytes;
+    if (begin >= end)
+        return;
+    // The last page tells for all: memory is taken from the front.
+    unsigned char isPresent = 0;
+    if (mincore(reinterpret_cast<void*>(end - pageBytes), pageBytes, &isPresent) != 0 || (isPresent & 1) != 0)
+        return;
+    // Advice only: a system that refuses gives the pages one by one.
+    madvise(reinterpret_cast<void*>(begin), end - begin, MADV_POPULATE_WRITE);
+#endif
 }
 
 } // namespace Nexil::Internal

@@ -25,7 +25,7 @@ VOLUME_BASE = GEOMETRY_BASE + ["veldrin/geometry", "vld"]
 # A folder's library; the folders or header patterns it may include; patterns of headers from outside the project.
 TABLE = {
     # Values and services stand on the standard library alone, but for type names in messages and for large arrays.
-    "nexil": (PLATFORM, [], ["cxxabi.h", "sys/mman.h"]),
+    "nexil": (PLATFORM, [], ["cxxabi.h", "sys/mman.h", "unistd.h"]),
     # The one folder that names the task runtime, so that it can be exchanged in one place.
     "nexil/parallel": (PLATFORM, ["nexil"], ["tbb/*", "oneapi/tbb/*"]),
     # Numbers and objects do not know each other: a host may bring its own of either.

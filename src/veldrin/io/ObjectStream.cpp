@@ -15,7 +15,6 @@
 
 #include <cstring>
 #include <fstream>
-#include <memory>
 #include <stdexcept>
 #include <vector>
 
@@ -24,8 +23,6 @@ namespace Veldrin::IO {
 namespace {
 
     using Objects = Nexil::Array<Nexil::Ptr<Object>>;
-
-    constexpr std::size_t kFileBufferBytes = std::size_t(2) << 20;
 
     bool writeReported(Objects const& objects, WriterContext const& context, Nexil::OutputStream& stream)
     {
@@ -139,12 +136,8 @@ bool serialize(Objects const& objects, Nexil::String const& path, SerializationO
     return runReported(services, Nexil::String("Cannot write to file: ") + path, [&] {
         // Before the file is opened, which empties it.
         checkLevel(options.compressionLevel);
-        auto const memory = std::make_unique_for_overwrite<char[]>(kFileBufferBytes);
-        std::ofstream file;
-        // Once a file is open the buffer can no longer be set.
-        file.rdbuf()->pubsetbuf(memory.get(), kFileBufferBytes);
-        file.open(systemPath(path, kCannotOpenForWriting),
-                  std::ios_base::out | std::ios_base::binary | std::ios_base::trunc);
+        std::ofstream file(systemPath(path, kCannotOpenForWriting),
+                           std::ios_base::out | std::ios_base::binary | std::ios_base::trunc);
         if (!file)
             throw Nexil::String(kCannotOpenForWriting) + path;
         writeStream(objects, context, file);

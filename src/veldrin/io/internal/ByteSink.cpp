@@ -12,7 +12,7 @@ namespace {
     // Streams pass on what they get in large portions, so the portions are made here.
     constexpr std::size_t kBufferBytes = std::size_t(2) << 20;
     // Runs from here on skip the buffer.
-    constexpr std::size_t kLongRunBytes = std::size_t(256) << 10;
+    constexpr std::size_t kLongRunBytes = std::size_t(64) << 10;
     // Bytes that the stream gets at once: between two of them cancellation is asked for.
     constexpr std::size_t kPieceBytes = std::size_t(1) << 20;
     // Runs from here on are hashed beside being written: hashing takes a fifth of the time of writing.

@@ -10,24 +10,29 @@ namespace Veldrin::IO {
 namespace {
 
     constexpr std::size_t kWindowBytes = std::size_t(64) << 10;
+    // Behind a jump often only the few bytes up to the next one are wanted: reading ahead begins small and doubles.
+    constexpr std::size_t kFirstFillBytes = std::size_t(2) << 10;
 
 } // namespace
 
 ByteSource::ByteSource(std::streambuf& stream, std::uint64_t position, std::uint64_t end, ReadAhead readAhead)
     : stream_(stream), end_(end), readAhead_(readAhead),
-      window_(readAhead == ReadAhead::None
-                  ? 1
-                  : static_cast<std::size_t>(std::min<std::uint64_t>(kWindowBytes, end - position + 1))),
-      windowPosition_(position), streamPosition_(position)
+      windowSize_(readAhead == ReadAhead::None
+                      ? 1
+                      : static_cast<std::size_t>(std::min<std::uint64_t>(kWindowBytes, end - position + 1))),
+      nextFill_(kFirstFillBytes), windowPosition_(position), streamPosition_(position)
 {
+    window_ = std::make_unique_for_overwrite<char[]>(windowSize_);
 }
 
 bool ByteSource::fill()
 {
     std::uint64_t const next = position();
-    std::size_t const wanted = static_cast<std::size_t>(std::min<std::uint64_t>(window_.size(), end_ - next));
+    std::size_t const wanted =
+        static_cast<std::size_t>(std::min<std::uint64_t>(std::min(windowSize_, nextFill_), end_ - next));
+    nextFill_ = std::min(nextFill_ * 2, kWindowBytes);
     moveStream(next);
-    auto const got = wanted == 0 ? 0 : stream_.sgetn(window_.data(), static_cast<std::streamsize>(wanted));
+    auto const got = wanted == 0 ? 0 : stream_.sgetn(window_.get(), static_cast<std::streamsize>(wanted));
     windowPosition_ = next;
     taken_ = 0;
     filled_ = static_cast<std::size_t>(std::max<std::streamsize>(got, 0));
@@ -58,7 +63,7 @@ void ByteSource::read(void* target, std::size_t count)
         throwTruncated();
     auto* out = static_cast<char*>(target);
     while (count != 0) {
-        if (taken_ == filled_ && count >= window_.size()) {
+        if (taken_ == filled_ && count >= windowSize_) {
             std::uint64_t const next = position();
             moveStream(next);
             auto const got = stream_.sgetn(out, static_cast<std::streamsize>(count));
@@ -71,7 +76,7 @@ void ByteSource::read(void* target, std::size_t count)
         if (taken_ == filled_ && !fill())
             throwTruncated();
         std::size_t const piece = std::min(count, filled_ - taken_);
-        std::memcpy(out, window_.data() + taken_, piece);
+        std::memcpy(out, window_.get() + taken_, piece);
         taken_ += piece;
         out += piece;
         count -= piece;
@@ -87,6 +92,7 @@ void ByteSource::seek(std::uint64_t position)
     // The next fill moves the stream itself.
     windowPosition_ = position;
     filled_ = taken_ = 0;
+    nextFill_ = kFirstFillBytes;
 }
 
 } // namespace Veldrin::IO

@@ -3,8 +3,8 @@
 #include <cstddef>
 #include <cstdint>
 #include <limits>
+#include <memory>
 #include <streambuf>
-#include <vector>
 
 namespace Veldrin::IO {
 
@@ -45,7 +45,9 @@ private:
     std::streambuf& stream_;
     std::uint64_t end_;
     ReadAhead readAhead_;
-    std::vector<char> window_;
+    std::unique_ptr<char[]> window_;
+    std::size_t windowSize_;
+    std::size_t nextFill_;   // bytes to read ahead next
     std::size_t filled_ = 0; // bytes in the window
     std::size_t taken_ = 0;  // bytes of them already taken
     std::uint64_t windowPosition_;
