@@ -1,4 +1,5 @@
 #include "Meshes.h"
+#include "support/FreshMemory.h"
 #include "support/PeakMemory.h"
 
 #include <benchmark/benchmark.h>
@@ -6,7 +7,6 @@
 #include <blosc.h>
 #include <fcntl.h>
 #include <hdf5.h>
-#include <malloc.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -20,10 +20,6 @@
 /// All files lie in the folder for temporary files, so in the page cache: what is measured is the work, not the disk.
 /// Bytes per second count the arrays' bytes in memory, on every row.
 namespace {
-
-/// Large blocks come from the system and go back there, on every side: a program keeps what it loads, so a load fills
-/// memory that it never had. Without this, each round would fill the memory that the round before gave back.
-[[maybe_unused]] bool const isMemoryFresh = mallopt(M_MMAP_THRESHOLD, 64 << 10) == 1;
 
 std::string filePath(char const* name)
 {

@@ -16,8 +16,6 @@ namespace {
     constexpr std::size_t kHugePageBytes = std::size_t(2) << 20;
     // Fresh huge pages take 0.6 of the time of ordinary ones to fill from a file. They are not asked for while an array
     // grows by doubling: from one run to the next, blocks that soon go back made that twice as quick or thrice as slow.
-    // Below this an array gains nothing from huge pages, and the padding to whole ones would be a large share.
-    constexpr std::size_t kHugePagesFromBytes = std::size_t(16) << 20;
     // Smaller blocks come from memory that is in use already.
     constexpr std::size_t kTakePagesFromBytes = std::size_t(64) << 10;
 
@@ -74,7 +72,7 @@ void UntypedTypeRep::deallocate(void* pointer, std::uint64_t) const noexcept
 void takePages([[maybe_unused]] void* block, [[maybe_unused]] std::size_t byteCount) noexcept
 {
 #if defined(__linux__) && defined(MADV_POPULATE_WRITE)
-    if (byteCount < kTakePagesFromBytes || byteCount >= kHugePagesFromBytes)
+    if (byteCount < kTakePagesFromBytes)
         return;
     auto const pageBytes = static_cast<std::uintptr_t>(sysconf(_SC_PAGESIZE));
     auto const begin = (reinterpret_cast<std::uintptr_t>(block) + pageBytes - 1) / pageBytes * pageBytes;

@@ -44,9 +44,13 @@ namespace Internal {
 
     struct ArrayAccess;
 
-    /// Has the system give all pages of a block at once, for callers that are about to overwrite it whole: page by page, as
-    /// bytes arrive, fresh memory takes 1.6 times as long to fill from a file. A block that has its pages costs one question,
-    /// one too small to matter or on huge pages none.
+    /// Blocks of so many bytes and more ask the system for huge pages. Below, an array gains nothing from them, and the
+    /// padding to whole ones would be a large share.
+    inline constexpr std::size_t kHugePagesFromBytes = std::size_t(16) << 20;
+
+    /// Has the system give all pages of a block, or of a part of one, at once, for callers that are about to overwrite it:
+    /// page by page, as bytes arrive, fresh memory takes 1.6 times as long to fill from a file. Where the pages are there
+    /// already, or the block is too small to matter, this costs one question at most.
     VELDRIN_PLATFORM_API void takePages(void* block, std::size_t byteCount) noexcept;
 
 } // namespace Internal

@@ -1,3 +1,4 @@
+#include <support/FreshMemory.h>
 #include <vld/VolumeCases.h>
 
 #include <veldrin/io/ObjectStream.h>

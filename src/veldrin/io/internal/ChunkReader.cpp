@@ -2,6 +2,7 @@
 
 #include <nexil/Array.h>
 #include <nexil/String.h>
+#include <nexil/parallel/Parallel.h>
 #include <veldrin/io/internal/Compressor.h>
 
 #include <algorithm>
@@ -10,6 +11,18 @@
 namespace Veldrin::IO {
 
 namespace {
+
+    constexpr std::size_t kPagesGrainBytes = std::size_t(1) << 20;
+
+    /// All pages of a fresh block, taken by all threads at once. Huge pages are few: they come while they are filled.
+    void takePages(std::byte* bytes, std::uint64_t byteCount)
+    {
+        if (byteCount >= Nexil::Internal::kHugePagesFromBytes)
+            return;
+        Nexil::parallel::forRange(
+            static_cast<std::size_t>(byteCount), kPagesGrainBytes,
+            [&](std::size_t begin, std::size_t end) { Nexil::Internal::takePages(bytes + begin, end - begin); });
+    }
 
     class ChunkList {
     public:
@@ -101,6 +114,7 @@ namespace {
             auto const* bytes = item_.binaryInMemory(chunk);
             if (!bytes) {
                 Nexil::Internal::resizeUninitialized(compressed_, size);
+                takePages(compressed_.data(), size);
                 item_.readBinary(chunk, compressed_.data());
                 bytes = compressed_.data();
             }
@@ -132,6 +146,7 @@ Nexil::Any readTrivialArray(ItemReader& item, msgpack::object const& list, Value
 {
     ChunkList chunks(item, list, row.elementSize, isCompressed, framing);
     NewArray array = row.newArray(chunks.count());
+    takePages(array.bytes, chunks.count() * row.elementSize);
     chunks.load(array.bytes);
     if (row.holdsBools)
         normaliseBools(array.bytes, chunks.count() * row.elementSize);

@@ -44,7 +44,6 @@ namespace {
         auto array = Nexil::makeMutable<Nexil::Array<T>>();
         Nexil::Internal::resizeUninitialized(*array, count);
         auto* const bytes = reinterpret_cast<std::byte*>(array->data());
-        Nexil::Internal::takePages(bytes, count * sizeof(T));
         return {ArrayPtr<T>(std::move(array)), bytes};
     }
 
