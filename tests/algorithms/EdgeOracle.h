@@ -2,6 +2,8 @@
 
 #include <support/Geometry.h>
 
+#include <veldrin/geometry/FaceEdge.h>
+
 #include <algorithm>
 #include <map>
 #include <random>
@@ -11,26 +13,34 @@
 /// Edges of a mesh the slow and simple way, and meshes that have much to get wrong.
 namespace support {
 
-/// Which faces use an edge, and in which directions.
+using Veldrin::Geometry::Mesh::FaceEdge;
+
+/// The sides of faces that lie on an edge: those from its lower point to its upper one, and those back, each in order.
 struct EdgeUses {
-    std::set<std::size_t> faces;
-    bool isForward = false;
-    bool isBackward = false;
+    std::vector<FaceEdge> forward, backward;
+
+    [[nodiscard]] std::set<unsigned int> faces() const
+    {
+        std::set<unsigned int> found;
+        for (auto const* uses : {&forward, &backward})
+            for (FaceEdge const& use : *uses)
+                found.insert(use.face);
+        return found;
+    }
 };
 using EdgeMap = std::map<std::pair<unsigned int, unsigned int>, EdgeUses>;
 
 inline EdgeMap edgesOf(unsigned int pointCount, Polygons const& faces)
 {
     EdgeMap edges;
-    for (std::size_t f = 0; f < faces.size(); ++f)
-        for (std::size_t k = 0; k < faces[f].size(); ++k) {
+    for (unsigned int f = 0; f < faces.size(); ++f)
+        for (unsigned int k = 0; k < faces[f].size(); ++k) {
             unsigned int const a = faces[f][k];
             unsigned int const b = faces[f][(k + 1) % faces[f].size()];
             if (a == b || a >= pointCount || b >= pointCount)
                 continue;
             EdgeUses& uses = edges[std::minmax(a, b)];
-            uses.faces.insert(f);
-            (a < b ? uses.isForward : uses.isBackward) = true;
+            (a < b ? uses.forward : uses.backward).push_back({f, k});
         }
     return edges;
 }
@@ -51,25 +61,19 @@ inline Polygons randomFaces(unsigned int pointCount, std::size_t faceCount, unsi
     return faces;
 }
 
-/// `side` x `side` quads that wrap around in both directions.
-inline Polygons torusFaces(unsigned int side)
+/// `side` x `side` quads that wrap around in both directions; neighbours have numbers `stride` apart, modulo the points.
+inline Polygons torusFaces(unsigned int side, unsigned int stride = 1)
 {
+    auto const number = [&](unsigned int row, unsigned int column) {
+        std::uint64_t const point = std::uint64_t(row % side) * side + column % side;
+        return static_cast<unsigned int>(point * stride % (side * side));
+    };
     Polygons faces;
     for (unsigned int r = 0; r < side; ++r)
-        for (unsigned int c = 0; c < side; ++c) {
-            unsigned int const nextRow = (r + 1) % side;
-            unsigned int const nextColumn = (c + 1) % side;
-            faces.push_back({r * side + c, nextRow * side + c, nextRow * side + nextColumn, r * side + nextColumn});
-        }
+        for (unsigned int c = 0; c < side; ++c)
+            faces.push_back({number(r, c), number(r + 1, c), number(r + 1, c + 1), number(r, c + 1)});
     return faces;
 }
-
-/// Corners of the largest face, points of the longest strand; fewer under sanitizers, which take ten times as long.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-inline constexpr unsigned int kGiant = 1000000;
-#else
-inline constexpr unsigned int kGiant = 10000000;
-#endif
 
 /// A mesh whose points stand anywhere: on a curve that no three of them share a line on.
 inline Nexil::MutablePtr<Veldrin::Object> meshOn(unsigned int pointCount, Polygons const& faces)

@@ -28,7 +28,8 @@ struct Answers {
     Nexil::Array<FaceEdge> edges, pointFaces;
     Nexil::Array<unsigned int> pointFaceIndex, groups;
     unsigned int groupCount = 0;
-    std::vector<int> numbers;
+    int euler = 0;
+    Veldrin::Math::int3 betti;
     Diagnostic found;
 
     Answers(std::vector<float3> const& points, Polygons const& faces)
@@ -39,8 +40,8 @@ struct Answers {
             computeMeshVertexNormals(*mesh, variant >= 2, variant % 2 == 1, pointNormals[variant]);
         EXPECT_TRUE(buildFaceVertexAdjacency(*mesh, edges, pointFaces, pointFaceIndex, nullptr));
         computeMeshNormalsTopology(*mesh, {}, 1.0f, groups, groupCount, nullptr);
-        auto const betti = bettiNumbers(*mesh);
-        numbers = {eulerCharacteristic(*mesh), connectedComponents(*mesh), betti.x, betti.y, betti.z};
+        euler = eulerCharacteristic(*mesh);
+        betti = bettiNumbers(*mesh);
         found = diagnose(*mesh);
     }
 
@@ -86,17 +87,15 @@ TEST(Symmetry, NumberingPointsOtherwiseOnlyNumbersResultsOtherwise)
                 corner = number[corner];
 
         Answers const before(points, faces);
-        Answers const after(renumbered, renamed);
+        Answers after(renumbered, renamed);
         EXPECT_EQ(after.faceNormals, before.faceNormals);
         EXPECT_EQ(after.edges, before.edges);
         EXPECT_EQ(after.groups, before.groups);
         EXPECT_EQ(after.groupCount, before.groupCount);
-        EXPECT_EQ(after.numbers, before.numbers);
-        EXPECT_EQ(after.found.degenerateFaces, before.found.degenerateFaces);
-        EXPECT_EQ(after.found.zeroAreaFaces, before.found.zeroAreaFaces);
-        EXPECT_EQ(after.found.nonManifoldFaces, before.found.nonManifoldFaces);
-        EXPECT_EQ(after.found.inconsistentFaces, before.found.inconsistentFaces);
+        EXPECT_TRUE(after.euler == before.euler && after.betti == before.betti);
         EXPECT_EQ(after.found.isolatedPoints.size(), before.found.isolatedPoints.size());
+        after.found.isolatedPoints = before.found.isolatedPoints;
+        EXPECT_TRUE(after.found == before.found);
         for (unsigned int p = 0; p < kPointCount; ++p) {
             EXPECT_EQ(after.facesOf(number[p]), before.facesOf(p));
             for (int variant = 0; variant < 4; ++variant)
@@ -130,7 +129,7 @@ TEST(Symmetry, TurningAllFacesOverTurnsNormalsAndDirectionsOnly)
         }
         for (unsigned int p = 0; p < kPointCount; ++p)
             expectTurned(after.pointNormals[0][p], before.pointNormals[0][p]);
-        EXPECT_EQ(after.numbers, before.numbers);
+        EXPECT_TRUE(after.euler == before.euler && after.betti == before.betti);
         EXPECT_EQ(after.found, before.found);
     }
 }

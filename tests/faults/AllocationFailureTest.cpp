@@ -1,5 +1,5 @@
-#include "FailingMemory.h"
 #include "Operations.h"
+#include <support/FailingMemory.h>
 
 #include <support/Streams.h>
 

@@ -37,14 +37,9 @@ TEST(DebugDump, ValuesReadAsWritten)
     std::pair<Nexil::Any, char const*> const cases[] = {
         {static_cast<unsigned char>(65), "65 (unsigned char)"},
         {static_cast<signed char>(-65), "-65 (signed char)"},
-        {static_cast<unsigned short>(65535), "65535 (unsigned short)"},
-        {static_cast<short>(-32768), "-32768 (short)"},
         {0xFFFFFFFFu, "4294967295 (unsigned int)"},
-        {-1234567, "-1234567 (int)"},
         {0xFFFFFFFFFFFFFFFFull, "18446744073709551615 (unsigned long long)"},
-        {-9223372036854775807ll, "-9223372036854775807 (long long)"},
         {7ul, "7 (unsigned long)"},
-        {true, "1 (bool)"},
         {false, "0 (bool)"},
         {0.1f, "0.1 (float)"},
         {1234567.0f, "1.23457e+06 (float)"},
@@ -52,15 +47,10 @@ TEST(DebugDump, ValuesReadAsWritten)
         {1.0 / 3, "0.333333 (double)"},
         {Nexil::String("a, \"b\"\n"), "a, \"b\"\n (string)"},
         {float2{1, 2}, "{1f, 2f} (Math::float2)"},
-        {double3{1, -2.5, 3}, "{1, -2.5, 3} (Math::double3)"},
-        {uchar4{1, 2, 3, 255}, "{1, 2, 3, 255} (Math::uchar4)"},
         {bool2{true, false}, "{1, 0} (Math::bool2)"},
         {float3x2{{{1, 2, 3}, {4, 5, 6}}}, "{{1f, 2f, 3f}, {4f, 5f, 6f}} (Math::float3x2)"},
-        {short2x3{{{1, 2}, {3, 4}, {5, 6}}}, "{{1, 2}, {3, 4}, {5, 6}} (Math::short2x3)"},
         {quatf{1, 2, 3, 4}, "{1f, 2f, 3f, 4f} (Math::quatf)"},
-        {quatd{1, 2, 3, 4}, "{1, 2, 3, 4} (Math::quatd)"},
         {bbox<float3, float>{{1, 2, 3}, {4, 5, 6}}, "{{1f, 2f, 3f}, {4f, 5f, 6f}} (Math::bbox<Math::float3, float>)"},
-        {DataInterpolationMode::Nearest, "Nearest (Geometry::Common::DataInterpolationMode)"},
         {DataInterpolationMode::Linear, "Linear (Geometry::Common::DataInterpolationMode)"},
         {DataInterpolationMode::DefaultValue, "DefaultValue (Geometry::Common::DataInterpolationMode)"},
         {static_cast<DataInterpolationMode>(9), "9 (Geometry::Common::DataInterpolationMode)"},
@@ -69,12 +59,9 @@ TEST(DebugDump, ValuesReadAsWritten)
         {Geometry::Common::GeoLocation(), "(unknown data type) (Veldrin::Geometry::Common::GeoLocation)"},
         {support::array<int>({}), "[  ] 0 elements (array<int>)"},
         {Nexil::Ptr<Nexil::Array<int>>(), "[  ] 0 elements (array<int>)"},
-        {support::array<float>({1, 2}), "[ 1, 2 ] 2 elements (array<float>)"},
         {support::array<float>({1, 2, 3}), "[ 1, 2, 3 ] 3 elements (array<float>)"},
         {support::array<float>({1, 2, 3, 4, 5}), "[ 1, 2, 3, ... ] 5 elements (array<float>)"},
-        {support::array<bool>({true, false}), "[ 1, 0 ] 2 elements (array<bool>)"},
         {support::array<Nexil::String>({"a", "", "b", "c"}), "[ a, , b, ... ] 4 elements (array<string>)"},
-        {support::array<float2>({{1, 2}, {3, 4}}), "[ {1f, 2f}, {3f, 4f} ] 2 elements (array<Math::float2>)"},
         {support::array<double2x2>({{{{1, 2}, {3, 4}}}}), "[ {{1, 2}, {3, 4}} ] 1 elements (array<Math::double2x2>)"},
         {support::array<Nexil::Any>({1, 2}),
          "[ ... ] 2 elements (array<unknown data type>) (Nexil::Ptr<Nexil::Array<Nexil::Any> >)"},
@@ -87,7 +74,6 @@ TEST(DebugDump, ValuesReadAsWritten)
         EXPECT_EQ(written(value), text);
     EXPECT_NE(written(Unheard::Of).find("(unknown data type) ("), std::string::npos);
     EXPECT_EQ(written(support::array<int>({1, 2, 3, 4, 5}), 0), "[ ... ] 5 elements (array<int>)");
-    EXPECT_EQ(written(support::array<int>({1, 2}), ~0ull), "[ 1, 2 ] 2 elements (array<int>)");
 }
 
 TEST(DebugDump, EveryValueTypeAndItsArrayIsKnownByItsName)
@@ -102,13 +88,10 @@ TEST(DebugDump, EveryValueTypeAndItsArrayIsKnownByItsName)
                   "[ " + value + ", " + value + " ] 2 elements (array<" + name + ">)");
         // As many numbers as the type has.
         auto const numberCount = static_cast<std::size_t>(std::count(value.begin(), value.end(), ',')) + 1;
-        if constexpr (std::is_same_v<T, Geometry::Internal::Box3f>) {
-            EXPECT_EQ(numberCount, 6u);
-        } else if constexpr (requires { typename T::value_type; }) {
+        if constexpr (requires { typename T::value_type; })
             EXPECT_EQ(numberCount, sizeof(T) / sizeof(typename T::value_type)) << name;
-        } else {
-            EXPECT_EQ(numberCount, 1u) << name;
-        }
+        else
+            EXPECT_EQ(numberCount, (std::is_same_v<T, Geometry::Internal::Box3f> ? 6u : 1u)) << name;
     });
     EXPECT_EQ(typeCount, Geometry::Internal::kValueTypeCount);
 }
@@ -118,14 +101,16 @@ TEST(DebugDump, ObjectsAndListsNestByFourBlanks)
     EXPECT_EQ(support::dump(*createObject()), "{\n}");
     auto const inner = holding(1);
     auto const outer = createObject();
-    setProperty(*outer, "one", inner);
+    setProperty(*outer, "one", holding(Nexil::Any(inner)));
     setProperty(*outer, "none", support::array<ObjectPtr>({}));
     setProperty(*outer, "list", support::array<ObjectPtr>({inner, nullptr, inner}));
-    setProperty(*outer, "deep", holding(Nexil::Any(inner)));
     EXPECT_EQ(support::dump(*outer), "{\n"
                                      "    one: \n"
                                      "    {\n"
-                                     "        v: 1 (int)\n"
+                                     "        v: \n"
+                                     "        {\n"
+                                     "            v: 1 (int)\n"
+                                     "        }\n"
                                      "    }\n"
                                      "    none:     [\n"
                                      "    ]\n"
@@ -137,13 +122,6 @@ TEST(DebugDump, ObjectsAndListsNestByFourBlanks)
                                      "        {\n"
                                      "            v: 1 (int)\n"
                                      "        }    ]\n"
-                                     "    deep: \n"
-                                     "    {\n"
-                                     "        v: \n"
-                                     "        {\n"
-                                     "            v: 1 (int)\n"
-                                     "        }\n"
-                                     "    }\n"
                                      "}");
 }
 
@@ -158,12 +136,8 @@ TEST(DebugDump, DeepAndMultiplyingObjectsAreCut)
 
     // Two to the power of sixty objects, were each written wherever it is met.
     auto doubled = holding(1);
-    for (int level = 0; level < 60; ++level) {
-        auto both = createObject();
-        setProperty(*both, "a", doubled);
-        setProperty(*both, "b", doubled);
-        doubled = std::move(both);
-    }
+    for (int level = 0; level < 60; ++level)
+        doubled = holding(support::array<ObjectPtr>({doubled, doubled}));
     auto const bounded = support::dump(*doubled);
     EXPECT_NE(bounded.find("..."), std::string::npos);
     EXPECT_LT(std::count(bounded.begin(), bounded.end(), '{'), 11000);
@@ -177,9 +151,9 @@ TEST(DebugDump, TheGlobalLocaleChangesNothing)
         std::string do_grouping() const override { return "\3"; }
     };
     auto const former = std::locale::global(std::locale(std::locale::classic(), new Grouping));
-    auto const text = written(support::array<double>({1234567.5, 1e4, 2, 3}));
+    auto const text = written(support::array<double>({1234567.5, 1e4}));
     std::locale::global(former);
-    EXPECT_EQ(text, "[ 1.23457e+06, 10000, 2, ... ] 4 elements (array<double>)");
+    EXPECT_EQ(text, "[ 1.23457e+06, 10000 ] 2 elements (array<double>)");
 }
 
 } // namespace

@@ -31,10 +31,7 @@ TEST(LibraryLoad, WritesOneVersionLineWhenAskedByANonZeroInteger)
             << yes;
     for (char const* no : {"", "0", "-0", "yes", "1x"})
         EXPECT_EQ(errorsOfChildWith(no), "") << no;
-}
-
-TEST(LibraryLoad, SaysNothingWhereStandardErrorIsClosed)
-{
+    // Nor where there is nowhere to write to.
     EXPECT_THAT(errorsOfChildWith("1", "2>&-"), testing::Not(testing::HasSubstr(": 0.")));
 }
 

@@ -2,6 +2,7 @@
 
 #include <gmock/gmock.h>
 
+#include <algorithm>
 #include <cmath>
 #include <limits>
 #include <map>
@@ -86,15 +87,12 @@ TEST(FCurve, KeysKeepTheirValuesAndSegmentsTheirShape)
     EXPECT_EQ(curveOf({{1, 5}, {2, kInfinity}}).evaluate(1), 5);
 
     // Far from time 0 a curve is the same one.
-    Key const from{0, 0, {}, {0.25, 2}, Interpolation::Bezier};
-    Key const to{1, 1, {-0.5, 0}, {}};
     constexpr double shift = 1 << 30;
-    Key movedFrom = from;
-    Key movedTo = to;
-    movedFrom.time += shift;
-    movedTo.time += shift;
+    auto const movedBy = [](double start) {
+        return curveOf({{start, 0, {}, {0.25, 2}, Interpolation::Bezier}, {start + 1, 1, {-0.5, 0}, {}}});
+    };
     for (double time = 0; time <= 1; time += 1.0 / 64)
-        EXPECT_EQ(curveOf({from, to}).evaluate(time), curveOf({movedFrom, movedTo}).evaluate(time + shift)) << time;
+        EXPECT_EQ(movedBy(0).evaluate(time), movedBy(shift).evaluate(time + shift)) << time;
 
     FCurve single;
     EXPECT_EQ(single.evaluate(3), 0);
@@ -183,13 +181,9 @@ TEST(FCurve, KeysStandInTimeOrderAndReplaceEqualTimes)
         }
         ASSERT_EQ(curve.keys().size(), model.size());
     }
-    std::size_t index = 0;
-    for (auto const& [time, value] : model) {
-        EXPECT_EQ(curve.keys()[index].time, time);
-        EXPECT_EQ(curve.keys()[index].value, value);
-        EXPECT_EQ(curve.evaluate(time), value);
-        ++index;
-    }
+    EXPECT_TRUE(std::ranges::equal(curve.keys(), model, [](Key const& key, auto const& expected) {
+        return key.time == expected.first && key.value == expected.second;
+    }));
     FCurve const before = curve;
     for (double const time : {kNaN, kInfinity, -kInfinity})
         EXPECT_FALSE(curve.setKey({time, 1}));
@@ -257,37 +251,38 @@ TEST(FCurve, BrokenTreesAreRefusedAndChangeNothing)
         auto const list = listOf({first, keys[1]});
         return changed(tree, "keys", &list);
     };
-    ASSERT_TRUE(withFirstKey(keys[0]) == tree);
-
-    SerializationData const nothing;
-    SerializationData const composite{CompositeSerializationData()};
-    std::vector<SerializationData> broken = {
-        nothing, 1u, composite, listOf({}), withFirstKey(1.0), withFirstKey(keys[1])};
-    auto const pair = listOf({0.0, 0.0});
-    std::pair<char const*, std::vector<SerializationData>> const wrongValues[] = {
-        {"pre_extrapolation", {nothing, composite, pair, 5u, 1.0}},
-        {"post_extrapolation", {nothing, composite, pair, 5u, 1.0}},
-        {"keys", {nothing, composite, 0u, pair}},
-        {"time", {nothing, composite, pair, kNaN, kInfinity, 3.0, 4u}},
-        {"value", {nothing, composite, pair}},
-        {"in_tangent", {nothing, composite, 0.0, listOf({0.0}), listOf({0.0, 0.0, 0.0}), listOf({0.0, nothing})}},
-        {"out_tangent", {nothing, composite, 0.0, listOf({0.0}), listOf({0.0, 0.0, 0.0}), listOf({nothing, 0.0})}},
-        {"interpolation", {nothing, composite, pair, 3u, 1.0}},
-    };
-    for (auto const& [name, values] : wrongValues) {
-        auto const put = [&, member = name](SerializationData const* replacement) {
-            return keys->asComposite()->find(member) ? withFirstKey(changed(keys[0], member, replacement))
-                                                     : changed(tree, member, replacement);
-        };
-        broken.push_back(put(nullptr));
-        for (auto const& value : values)
-            broken.push_back(put(&value));
-    }
-    for (std::size_t i = 0; i < broken.size(); ++i) {
+    auto const isRead = [&](SerializationData const& data) {
         FCurve back = curve;
-        EXPECT_FALSE(Nexil::deserializeFCurve(broken[i], back)) << i;
-        EXPECT_TRUE(back == curve) << i;
+        bool const result = Nexil::deserializeFCurve(data, back);
+        EXPECT_TRUE(result || back == curve);
+        return result;
+    };
+    SerializationData const nothing;
+    // One letter for each.
+    std::string const letters = "135htxoncpsmlr";
+    std::vector<SerializationData> values = {
+        1u, 3u, 5u, 0.5, 3.0, kNaN, kInfinity, nothing, CompositeSerializationData()};
+    for (auto const& list :
+         {listOf({0.0, 0.0}), listOf({0.0}), listOf({0.0, 0.0, 0.0}), listOf({nothing, 0.0}), listOf({0.0, nothing})})
+        values.push_back(list);
+    std::pair<char const*, std::string> const takenValues[] = {
+        {"pre_extrapolation", "13"}, {"post_extrapolation", "13"}, {"keys", ""},         {"time", "1h"},
+        {"value", "135htxo"},        {"in_tangent", "p"},          {"out_tangent", "p"}, {"interpolation", "1"}};
+    for (auto const& [name, taken] : takenValues) {
+        auto const put = [&, member = name](SerializationData const* value) {
+            return keys->asComposite()->find(member) ? withFirstKey(changed(keys[0], member, value))
+                                                     : changed(tree, member, value);
+        };
+        EXPECT_FALSE(isRead(put(nullptr))) << name;
+        std::string found;
+        for (std::size_t i = 0; i < letters.size(); ++i)
+            if (isRead(put(&values[i])))
+                found += letters[i];
+        EXPECT_EQ(found, taken) << name;
     }
+    EXPECT_TRUE(isRead(withFirstKey(keys[0])));
+    for (auto const& broken : {nothing, SerializationData(1u), listOf({}), withFirstKey(1.0), withFirstKey(keys[1])})
+        EXPECT_FALSE(isRead(broken));
 }
 
 } // namespace

@@ -1,13 +1,12 @@
 #include "Foreign.h"
 #include "Tracked.h"
 
-#include <geometry/AllocationCount.h>
 #include <nexil/Any.h>
+#include <support/FailingMemory.h>
 
 #include <gmock/gmock.h>
 
 #include <array>
-#include <memory>
 #include <vector>
 
 namespace {
@@ -45,29 +44,27 @@ int typesFoundIn(Any const& any)
 
 TEST(Any, OnlyTheExactTypeIsFound)
 {
-    std::pair<Any, Nexil::TypeId> const cases[] = {
-        {3, Nexil::TypeId::of<int>()},
-        {3u, Nexil::TypeId::of<unsigned int>()},
-        {3ll, Nexil::TypeId::of<long long>()},
-        {static_cast<signed char>(3), Nexil::TypeId::of<signed char>()},
-        {true, Nexil::TypeId::of<bool>()},
-        {String("3"), Nexil::TypeId::of<String>()},
-        {Ptr<Base>(Nexil::makePtr<Derived>()), Nexil::TypeId::of<Ptr<Base>>()},
-        {Nexil::makePtr<Derived>(), Nexil::TypeId::of<Ptr<Derived>>()},
+    struct {
+        Any value;
+        Nexil::TypeId type;
+        char const* text;
+    } const cases[] = {
+        {3u, Nexil::TypeId::of<unsigned int>(), "unsigned int"},
+        {3ll, Nexil::TypeId::of<long long>(), "long long"},
+        {String("3"), Nexil::TypeId::of<String>(), "Nexil::String"},
+        {Ptr<Base>(Nexil::makePtr<Derived>()), Nexil::TypeId::of<Ptr<Base>>(), nullptr},
+        {Nexil::makePtr<Derived>(), Nexil::TypeId::of<Ptr<Derived>>(), nullptr},
     };
-    for (auto const& [value, type] : cases) {
+    for (auto const& [value, type, text] : cases) {
         EXPECT_TRUE(value.type() == type) << Nexil::anyToTypeString(value);
-        int const foundCount =
-            typesFoundIn<int, unsigned int, long, long long, char, signed char, unsigned char, bool, float, double,
-                         String, Ptr<Base>, Ptr<Derived>, Nexil::MutablePtr<Base>, Nexil::MutablePtr<Derived>, Any>(
-                value);
+        int const foundCount = typesFoundIn<int, unsigned int, long, long long, String, Ptr<Base>, Ptr<Derived>,
+                                            Nexil::MutablePtr<Base>, Nexil::MutablePtr<Derived>, Any>(value);
         EXPECT_EQ(foundCount, 1) << Nexil::anyToTypeString(value);
+        EXPECT_TRUE(!text || Nexil::anyToTypeString(value) == text) << Nexil::anyToTypeString(value);
     }
     EXPECT_EQ((typesFoundIn<int, String, Ptr<Base>>(Any())), 0);
     EXPECT_FALSE(Any().type());
     EXPECT_EQ(Nexil::anyToTypeString(Any()), "");
-    EXPECT_EQ(Nexil::anyToTypeString(3u), "unsigned int");
-    EXPECT_EQ(Nexil::anyToTypeString(String()), "Nexil::String");
 }
 
 template <class T>
@@ -78,21 +75,16 @@ std::uint64_t allocationsOfMakingCopyingAndMoving(T value)
     Any copy(made);
     Any moved(std::move(made));
     made = std::move(copy);
-    copy = std::move(moved);
-    EXPECT_TRUE(moved.empty());
-    EXPECT_TRUE(made.holds<T>() && copy.holds<T>());
+    EXPECT_TRUE(made.holds<T>() && copy.empty() && moved.holds<T>());
     return support::allocationCount() - before;
 }
 
 TEST(Any, SmallValuesNeedNoHeapAndLargeOnesOneBlockForEachCopy)
 {
     EXPECT_EQ(allocationsOfMakingCopyingAndMoving(Nexil::makePtr<Array<int>>()), 0u);
-    EXPECT_EQ(allocationsOfMakingCopyingAndMoving(Ptr<Derived>()), 0u);
     EXPECT_EQ(allocationsOfMakingCopyingAndMoving(String("up to 15 bytes.")), 0u);
     EXPECT_EQ(allocationsOfMakingCopyingAndMoving(std::array<double, 4>()), 0u);
-    EXPECT_EQ(allocationsOfMakingCopyingAndMoving(std::array<char, 32>()), 0u);
     EXPECT_EQ(allocationsOfMakingCopyingAndMoving(std::array<char, 33>()), 2u);
-    EXPECT_EQ(allocationsOfMakingCopyingAndMoving(Large()), 2u);
     struct alignas(64) Aligned {
         char byte;
     };
@@ -104,36 +96,30 @@ template <class T>
 void copyMoveAndFail()
 {
     SCOPED_TRACE(Nexil::Internal::DebugTypeId::getTypeNameForDebugOnly(Nexil::TypeId::of<T>()));
-    int const before = Tracked::alive;
     {
         T const value{5};
         Any any(value);
-        EXPECT_EQ(Tracked::alive, before + 2);
         Any copy(any);
-        EXPECT_EQ(Tracked::alive, before + 3);
+        EXPECT_EQ(Tracked::alive, 3);
         EXPECT_NE(any.get<T>(), copy.get<T>());
         auto& self = any;
         any = self;
         any = std::move(self);
-        ASSERT_TRUE(any.get<T>());
-        EXPECT_EQ(any.get<T>()->tracked.value, 5);
         Any moved(std::move(any));
         EXPECT_TRUE(any.empty());
         any = std::move(moved);
-        EXPECT_EQ(Tracked::alive, before + 3);
+        ASSERT_TRUE(any.get<T>());
         EXPECT_EQ(any.get<T>()->tracked.value, 5);
 
         Any target(std::vector<int>{1, 2});
         support::FailingCopies const fail(0);
         EXPECT_THROW(target = any, std::runtime_error);
         EXPECT_THAT(*target.get<std::vector<int>>(), testing::ElementsAre(1, 2));
-        EXPECT_THROW(Any{value}, std::runtime_error);
-        EXPECT_EQ(Tracked::alive, before + 3);
+        EXPECT_EQ(Tracked::alive, 3);
         any = std::move(target);
-        EXPECT_EQ(Tracked::alive, before + 2);
-        copy.reset();
+        EXPECT_EQ(Tracked::alive, 2);
     }
-    EXPECT_EQ(Tracked::alive, before);
+    EXPECT_EQ(Tracked::alive, 0);
 }
 
 TEST(Any, ValuesAreDestroyedOnceAndAFailedCopyLeavesTheTarget)
@@ -149,26 +135,24 @@ TEST(Any, ValuesAreDestroyedOnceAndAFailedCopyLeavesTheTarget)
 TEST(Any, CanBecomeAPartOfItsOwnValue)
 {
     using List = std::vector<Any>;
-    Any inner = List{String("another text that needs a block of its own")};
+    String const text("a text that needs a block of its own");
+    Any inner = List{text};
     inner = (*inner.get<List>())[0];
-    EXPECT_EQ(*inner.get<String>(), "another text that needs a block of its own");
-
-    Any moved = List{List{String("and yet another text with a block of its own")}};
+    EXPECT_EQ(*inner.get<String>(), text);
+    Any moved = List{List{text}};
     for (int level = 0; level < 2; ++level)
         moved = std::move((*moved.get<List>())[0]);
-    EXPECT_EQ(*moved.get<String>(), "and yet another text with a block of its own");
+    EXPECT_EQ(*moved.get<String>(), text);
 }
 
 TEST(Any, ArraysOfEveryElementAnswerForTheirSize)
 {
-    using Nested = Array<Ptr<Array<int>>>;
     struct {
         Any value;
         bool isArray;
         std::uint64_t size;
     } const cases[] = {
         {Nexil::makePtr<Array<float>>(std::initializer_list<float>{1, 2, 3}), true, 3},
-        {Nexil::makePtr<Nested>(std::initializer_list<Ptr<Array<int>>>{nullptr, nullptr}), true, 2},
         {Ptr<Array<String>>(), true, 0},
         {foreign::make(foreign::PointerToArray), true, 2},
         {Array<float>{1, 2}, false, 0},
@@ -188,27 +172,23 @@ struct Local {
 TEST(Any, ValuesOfAnotherLibraryAreFoundByTheirType)
 {
     using PairArray = Ptr<Array<foreign::Pair<int>>>;
-    Any const small = foreign::make(foreign::Small);
-    Any const heap = foreign::make(foreign::Heap);
+    Any const pair = foreign::make(foreign::APair);
+    ASSERT_TRUE(pair.get<foreign::Pair<int>>());
+    EXPECT_EQ(pair.get<foreign::Pair<int>>()->second, 2);
+    EXPECT_FALSE(pair.get<foreign::Pair<unsigned int>>());
+    auto const type = Nexil::TypeId::of<foreign::Pair<int>>();
+    EXPECT_TRUE(pair.type() == type);
+    EXPECT_EQ(std::hash<Nexil::TypeId>()(pair.type()), std::hash<Nexil::TypeId>()(type));
+    EXPECT_TRUE(foreign::finds(foreign::APair, foreign::Pair<int>{}));
+    EXPECT_FALSE(foreign::finds(foreign::APair, foreign::Pair<long>{}));
+
     Any array = foreign::make(foreign::PointerToArray);
-    ASSERT_TRUE(small.get<foreign::Pair<int>>());
-    EXPECT_EQ(small.get<foreign::Pair<int>>()->second, 2);
-    EXPECT_FALSE(small.get<foreign::Pair<unsigned int>>());
-    ASSERT_TRUE(heap.get<foreign::Large<double>>());
-    EXPECT_EQ(heap.get<foreign::Large<double>>()->values[2], 3);
     ASSERT_TRUE(array.get<PairArray>());
+    EXPECT_TRUE(foreign::finds(foreign::PointerToArray, PairArray()));
     Any const shared = array;
     Nexil::MutablePtr<Array<foreign::Pair<int>>> own(std::move(*array.get<PairArray>()));
     (*own)[0].first = 9;
     EXPECT_EQ((**shared.get<PairArray>())[0].first, 3);
-
-    EXPECT_TRUE(foreign::finds(foreign::Small, foreign::Pair<int>{}));
-    EXPECT_TRUE(foreign::finds(foreign::Heap, foreign::Large<double>{}));
-    EXPECT_TRUE(foreign::finds(foreign::PointerToArray, PairArray()));
-    EXPECT_FALSE(foreign::finds(foreign::Small, foreign::Pair<long>{}));
-    auto const type = Nexil::TypeId::of<foreign::Pair<int>>();
-    EXPECT_TRUE(small.type() == type);
-    EXPECT_EQ(std::hash<Nexil::TypeId>()(small.type()), std::hash<Nexil::TypeId>()(type));
 
     // Two types that only share a name are two types.
     Any const local = foreign::make(foreign::Hidden);

@@ -11,12 +11,7 @@ struct Pair {
     T second;
 };
 
-template <class T>
-struct Large {
-    T values[8];
-};
-
-enum Kind { Small, Heap, PointerToArray, Hidden };
+enum Kind { APair, PointerToArray, Hidden };
 
 /// A value made inside the library.
 [[nodiscard]] __attribute__((visibility("default"))) Nexil::Any make(Kind kind);

@@ -4,7 +4,6 @@
 #include <gmock/gmock.h>
 
 #include <atomic>
-#include <cmath>
 #include <random>
 #include <stdexcept>
 #include <string>
@@ -68,17 +67,6 @@ TEST(Parallel, AReductionJoinsInOneOrderOnEveryThreadCount)
                 [](std::string const& left, std::string const& right) { return '(' + left + ' ' + right + ')'; });
             EXPECT_EQ(joins, count == 0 ? "" : joinsOf(0, count));
         }
-        // So sums of floats of all magnitudes have one value.
-        auto const sum = parallel::reduceInOrder(
-            20'001, 64, 0.f,
-            [](std::size_t begin, std::size_t end, float part) {
-                for (std::size_t i = begin; i < end; ++i)
-                    part += std::ldexp(1.f, static_cast<int>(i * 7919 % 48));
-                return part;
-            },
-            std::plus());
-        static float const first = sum;
-        EXPECT_EQ(sum, first);
     });
 }
 
@@ -124,10 +112,6 @@ TEST(Parallel, AFailureInsideIsPassedOnAndCutsNothingElseShort)
             }
         });
         EXPECT_THAT(visits, testing::Each(1));
-        int first = 0;
-        int second = 0;
-        parallel::invoke([&] { first = 1; }, [&] { second = 2; });
-        EXPECT_EQ(first + second, 3);
     });
 }
 

@@ -78,12 +78,8 @@ TEST(PtrThreads, WritersThatEachHoldACopyDoNotSeeEachOther)
             turn.arrive_and_wait();
             // The last one takes the original over, and may write to it only when the others have made their copies.
             MutablePtr<Numbers> own(std::move(held[t]));
-            int wrongCount = 0;
-            for (int& number : *own) {
-                wrongCount += number != round;
-                number = -1 - static_cast<int>(t);
-            }
-            EXPECT_EQ(wrongCount, 0);
+            EXPECT_EQ(std::ranges::count(*own, round), kNumberCount);
+            std::ranges::fill(*own, -1 - static_cast<int>(t));
             held[t] = std::move(own);
             turn.arrive_and_wait();
             EXPECT_EQ(std::ranges::count(*held[t], -1 - static_cast<int>(t)), kNumberCount);

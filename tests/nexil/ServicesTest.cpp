@@ -6,7 +6,6 @@
 
 #include <set>
 #include <string>
-#include <vector>
 
 namespace {
 
@@ -16,7 +15,6 @@ TEST(Services, TheHostTakesMessagesAndCancelsJobs)
     // Hosts compare the numbers.
     EXPECT_EQ(RuntimeMessageCategory(1), RuntimeMessageCategory::Error);
     EXPECT_EQ(RuntimeMessageCategory(2), RuntimeMessageCategory::Warning);
-    Nexil::RuntimeServices().logMessage({RuntimeMessageCategory::Info, "dropped"});
 
     static bool isCancelled = false;
     Nexil::setJobCancelHook([] { return isCancelled; });
@@ -44,13 +42,6 @@ TEST(Services, HashesTellNamesApartByEveryByteAndTheirLength)
             ++nameCount;
         }
     EXPECT_EQ(hashes.size(), nameCount);
-
-    // Each bit is set in about half of many names that count up: eight standard deviations to each side.
-    std::vector<int> setCounts(64);
-    for (int i = 0; i < 4096; ++i)
-        for (std::size_t bit = 0; bit < 64; ++bit)
-            setCounts[bit] += static_cast<int>(Nexil::Internal::seededHash("name_" + std::to_string(i)) >> bit & 1);
-    EXPECT_THAT(setCounts, testing::Each(testing::AllOf(testing::Gt(2048 - 256), testing::Lt(2048 + 256))));
 }
 
 } // namespace

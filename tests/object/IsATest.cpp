@@ -64,11 +64,9 @@ TEST(IsA, TableOfKinds)
         Properties object, prototype;
         bool isA;
     } const cases[] = {
-        {"equal", {{"a", 1}, {"b", 2.f}}, {{"b", 7.f}, {"a", 0}}, true},
         {"more than asked", {{"a", 1}, {"b", 2.f}}, {{"b", 7.f}}, true},
         {"another type", {{"a", 1}}, {{"a", 1u}}, false},
         {"nothing for something", {{"a", Any()}}, {{"a", 1}}, false},
-        {"any value", {{"a", 1}}, {{"a", anyValue}}, true},
         {"any value: nothing", {{"a", Any()}}, {{"a", anyValue}}, true},
         {"any value: missing", {{"b", 1}}, {{"a", anyValue}}, false},
         {"any array", {{"a", arrayOf<float>({1})}}, {{"a", anyArray}}, true},
@@ -79,7 +77,6 @@ TEST(IsA, TableOfKinds)
         {"nested", {{"a", inner}}, {{"a", objectOf({{"count", 0u}})}}, true},
         {"nested: less", {{"a", inner}}, {{"a", objectOf({{"count", 0u}, {"other", 1}})}}, false},
         {"nested: no object", {{"a", 1}}, {{"a", inner}}, false},
-        {"nested: null", {{"a", nullObject}}, {{"a", inner}}, false},
         {"nested: null for an empty one", {{"a", nullObject}}, {{"a", objectOf({})}}, false},
         {"null prototype", {{"a", inner}}, {{"a", nullObject}}, true},
         {"null for null", {{"a", nullObject}}, {{"a", nullObject}}, true},

@@ -8,21 +8,27 @@
 #include <veldrin/geometry/Population.h>
 #include <veldrin/object/Properties.h>
 
+#include <algorithm>
 #include <cstdint>
-#include <initializer_list>
 #include <string>
+#include <type_traits>
 #include <vector>
 
 /// Builders and readers of geometry for tests.
 namespace support {
 
+/// Without spare capacity, so that a read just beyond the array is one beyond its memory.
 template <class T>
 Nexil::Ptr<Nexil::Array<T>> array(std::vector<T> const& values)
 {
-    Nexil::Array<T> made;
-    for (auto const& value : values)
-        made.push_back(value);
-    return Nexil::makePtr<Nexil::Array<T>>(std::move(made));
+    if constexpr (std::is_same_v<T, bool>) {
+        Nexil::Array<bool> made;
+        made.resize(values.size());
+        std::ranges::copy(values, made.begin());
+        return Nexil::makePtr<Nexil::Array<bool>>(std::move(made));
+    } else {
+        return Nexil::makePtr<Nexil::Array<T>>(values.data(), values.size());
+    }
 }
 
 using Polygons = std::vector<std::vector<unsigned int>>;

@@ -1,5 +1,5 @@
-#include "../geometry/AllocationCount.h"
 #include "../volume/Samples.h"
+#include <support/FailingMemory.h>
 
 #include <support/Geometry.h>
 

@@ -1,6 +1,6 @@
 #include "Samples.h"
 
-#include <geometry/AllocationCount.h>
+#include <support/FailingMemory.h>
 #include <support/Geometry.h>
 
 #include <nexil/JobCancel.h>

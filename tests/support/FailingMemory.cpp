@@ -1,4 +1,4 @@
-#include "FailingMemory.h"
+#include <support/FailingMemory.h>
 
 #include <link.h>
 
@@ -21,6 +21,7 @@
 namespace {
 
 // Plain values only: they are used where nothing may be allocated.
+thread_local std::uint64_t takenCount = 0;
 thread_local std::uint64_t untilFailure = 0; // 0: nothing fails any more
 thread_local bool isArmed = false;
 thread_local bool hasFailedOnce = false;
@@ -71,6 +72,7 @@ void* allocate(void const* caller, Allocate const& take) noexcept
 {
     if (isArmed && isOwnCode(caller) && failsNow())
         return nullptr;
+    ++takenCount;
     void* const block = take();
     if (isArmed && block)
         ++held;
@@ -80,6 +82,11 @@ void* allocate(void const* caller, Allocate const& take) noexcept
 #endif
 
 } // namespace
+
+std::uint64_t support::allocationCount() noexcept
+{
+    return takenCount;
+}
 
 support::FailingAllocation::FailingAllocation(std::uint64_t number) noexcept
 {
@@ -160,6 +167,7 @@ void free(void* block)
 
 void* operator new(std::size_t size)
 {
+    ++takenCount;
     void* const block = failsNow() ? nullptr : std::malloc(size);
     if (block)
         return block;
