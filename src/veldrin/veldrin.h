@@ -64,6 +64,7 @@
 #include <veldrin/volume/VldProxyComponentChannel.h>
 #include <veldrin/volume/VldProxyComponentContainer.h>
 #include <veldrin/volume/VldProxyComponentTopology.h>
+#include <veldrin/volume/VldProxyDescription.h>
 #include <veldrin/volume/VldProxyFactory.h>
 #include <veldrin/volume/VolumeBounds.h>
 #include <veldrin/volume/VolumeConversion.h>

@@ -6,8 +6,8 @@
 #include <veldrin/volume/VldProxyAccess.h>
 #include <veldrin/volume/VldProxyComponentChannel.h>
 #include <veldrin/volume/VldProxyComponentTopology.h>
+#include <veldrin/volume/VldProxyDescription.h>
 #include <veldrin/volume/VolumeConversion.h>
-#include <veldrin/volume/internal/ProxyDescription.h>
 #include <vld/BuildFromValues.h>
 
 #include <functional>
@@ -61,8 +61,7 @@ std::map<std::string, Object> plainVolume()
     auto const geometry = Geometry::move_vld_volume_to_object(*volume);
     std::map<std::string, Object> plain;
     for (auto const& key : geometry->keys())
-        EXPECT_TRUE(
-            Geometry::Internal::describeProxy(*support::part(*geometry, key.c_str()), plain[std::string(key.view())]));
+        EXPECT_TRUE(Geometry::describeVldProxy(*support::part(*geometry, key.c_str()), plain[std::string(key.view())]));
     return plain;
 }
 
@@ -204,7 +203,7 @@ TEST(VolumeStream, ArraysThatManyTopologiesReferToAreLookedAtOnce)
             continue;
         // The same with one array of their own is refused, as that would have to be looked at anew.
         Object plain;
-        ASSERT_TRUE(Geometry::Internal::describeProxy(*support::part(*geometry, name.c_str()), plain));
+        ASSERT_TRUE(Geometry::describeVldProxy(*support::part(*geometry, name.c_str()), plain));
         setProperty(plain, "offsets", Nexil::makePtr<UIntArray>(UIntArray{0}));
         setProperty(*geometry, name.c_str(), ObjectPtr(Nexil::makePtr<Object>(std::move(plain))));
     }

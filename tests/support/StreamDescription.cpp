@@ -5,7 +5,7 @@
 #include <veldrin/geometry/GeoLocation.h>
 #include <veldrin/geometry/internal/ValueTypes.h>
 #include <veldrin/math/FCurve.h>
-#include <veldrin/volume/internal/ProxyDescription.h>
+#include <veldrin/volume/VldProxyDescription.h>
 
 #include <xxhash.h>
 
@@ -171,7 +171,7 @@ namespace {
         Veldrin::Object const& contentOf(Veldrin::Object const& object)
         {
             auto const [place, isNew] = proxies_.try_emplace(&object);
-            if (isNew && !Veldrin::Geometry::Internal::describeProxy(object, place->second)) {
+            if (isNew && !Veldrin::Geometry::describeVldProxy(object, place->second)) {
                 proxies_.erase(place);
                 return object;
             }

@@ -7,6 +7,7 @@
 #include <veldrin/geometry/GeoLocation.h>
 #include <veldrin/math/FCurve.h>
 #include <veldrin/object/Object.h>
+#include <veldrin/volume/VldProxyDescription.h>
 
 #include <fmt/format.h>
 #include <fmt/ranges.h>
@@ -101,6 +102,15 @@ namespace {
             return hash(pair.first) * 31 + hash(pair.second);
         }
     };
+
+    /// What a proxy of a volume holds in a file: as an object it shows neither tiles nor the size of voxels, and the indices
+    /// of a container would have to be made.
+    ObjectPtr described(ObjectPtr const& object)
+    {
+        Object description;
+        return Geometry::describeVldProxy(*object, description) ? Nexil::makePtr<Object>(std::move(description))
+                                                                : object;
+    }
 
     ValueRow const& row(ScalarKind kind)
     {
@@ -296,8 +306,12 @@ namespace {
 
         void compareObjects(ObjectPtr const& first, ObjectPtr const& second, std::size_t place)
         {
-            if (!mustCompare(first.get(), second.get(), place))
-                return;
+            if (mustCompare(first.get(), second.get(), place))
+                compareProperties(described(first), described(second), place);
+        }
+
+        void compareProperties(ObjectPtr const& first, ObjectPtr const& second, std::size_t place)
+        {
             auto const firstKeys = first->keys();
             auto const secondKeys = second->keys();
             std::vector<std::string_view> firstCommon;

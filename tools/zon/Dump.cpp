@@ -3,6 +3,8 @@
 #include "ZonFile.h"
 
 #include <veldrin/geometry/DebugDump.h>
+#include <veldrin/object/Object.h>
+#include <veldrin/volume/VldProxyDescription.h>
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
@@ -28,6 +30,23 @@ namespace {
         }
     };
 
+    /// The object with proxies of volumes as what a file holds of them: the indices of a container would have to be made.
+    Veldrin::Object described(Veldrin::Object const& object)
+    {
+        Veldrin::Object result;
+        if (Veldrin::Geometry::describeVldProxy(object, result))
+            return result;
+        for (auto const& key : object.keys()) {
+            auto value = object.getProperty(key);
+            auto const* const part = value.get<Nexil::Ptr<Veldrin::Object>>();
+            Veldrin::Object description;
+            if (part && *part && Veldrin::Geometry::describeVldProxy(**part, description))
+                value = Nexil::Ptr<Veldrin::Object>(Nexil::makePtr<Veldrin::Object>(std::move(description)));
+            result.setPropertyAny(key, std::move(value));
+        }
+        return result;
+    }
+
     ExitCode runDump(Options const& options)
     {
         auto const objects = readZon(options.input);
@@ -35,7 +54,7 @@ namespace {
         for (std::uint64_t i = 0; i < objects.size(); ++i) {
             fmt::print("object {}:\n", i);
             if (objects[i])
-                Veldrin::Geometry::Internal::debugDumpToStream(output, *objects[i], options.maxElements);
+                Veldrin::Geometry::Internal::debugDumpToStream(output, described(*objects[i]), options.maxElements);
             else
                 fmt::print("(null)");
             fmt::print("\n");

@@ -3,7 +3,7 @@
 #include <nexil/JobCancel.h>
 #include <nexil/String.h>
 #include <veldrin/geometry/GeoLocation.h>
-#include <veldrin/volume/internal/ProxyDescription.h>
+#include <veldrin/volume/VldProxyDescription.h>
 
 #include <typeinfo>
 
@@ -127,7 +127,7 @@ Object const& ObjectGraph::takeContent(Object const& object)
     if (isPlain(object))
         return object;
     auto const [place, isNew] = contents_.try_emplace(&object);
-    if (isNew && !Geometry::Internal::describeProxy(object, place->second))
+    if (isNew && !Geometry::describeVldProxy(object, place->second))
         for (Nexil::String const& key : object.keys())
             place->second.setPropertyAny(key, object.getProperty(key));
     return place->second;

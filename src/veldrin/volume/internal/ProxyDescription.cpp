@@ -9,6 +9,7 @@
 #include <veldrin/volume/VldProxyComponentTopology.h>
 #include <veldrin/volume/VolumeInterpolation.h>
 #include <veldrin/volume/internal/Configurations.h>
+#include <veldrin/volume/internal/ProxyKeys.h>
 #include <vld/Container.h>
 #include <vld/PointTopology.h>
 
@@ -26,41 +27,6 @@ namespace {
     using ArrayPtr = Nexil::Ptr<Nexil::Array<T>>;
     using namespace VLD::TileTree3D;
 
-    // These texts are in files.
-    constexpr char kKind[] = "vld_component";
-    constexpr char kName[] = "name";
-    constexpr char kTileWidth[] = "voxelTileWidth";
-    constexpr char kTileDataWidth[] = "voxelTileDataWidth";
-    constexpr char kOffsetType[] = "voxelOffsetType";
-    constexpr char kInnerLevels[] = "voxelInnerLevels";
-    constexpr char kLeafOrigins[] = "leaf_origins";
-    constexpr char kLeafParents[] = "leaf_parents";
-    constexpr char kInnerOrigins[] = "inner_origins";
-    constexpr char kInnerChildren[] = "inner_children";
-    constexpr char kOffsets[] = "offsets";
-    constexpr char kTopology[] = "topology";
-    constexpr char kVoxelSize[] = "voxelSize";
-    constexpr char kContainer[] = "container";
-
-    constexpr char kVoxelTopologyKind[] = "voxel_topology";
-    constexpr char kPointTopologyKind[] = "point_topology";
-    constexpr char kContainerKind[] = "container";
-    constexpr char kChannelKind[] = "channel";
-
-    void setKind(Object& description, char const* kind, VLD::Component const& component)
-    {
-        setProperty(description, kKind, kind);
-        setProperty(description, kName, component.name());
-    }
-
-    void setParameters(Object& description, TileParameters const& parameters)
-    {
-        setProperty(description, kTileWidth, parameters.tileWidth);
-        setProperty(description, kTileDataWidth, parameters.dataWidth);
-        setProperty(description, kOffsetType, parameters.offsetType);
-        setProperty(description, kInnerLevels, parameters.innerLevels);
-    }
-
     TileParameters parametersOf(Object const& description)
     {
         return {getPropertyAs<unsigned int>(description, kTileWidth),
@@ -69,73 +35,7 @@ namespace {
                 getPropertyAs<unsigned int>(description, kInnerLevels)};
     }
 
-    bool describeTopology(VldProxyComponentTopology const& proxy, Object& description)
-    {
-        auto const component = proxy.getVldComponent();
-        bool isDescribed = false;
-        forEachConfiguration([&]<class Traits>() {
-            if (auto const voxels = Nexil::dynamicPtrCast<VoxelTopology<Traits>>(component)) {
-                description.setPropertyAny(sCount, proxy.getProperty(sCount));
-                setKind(description, kVoxelTopologyKind, *voxels);
-                setParameters(description, Traits::parameters());
-                setProperty(description, kLeafOrigins, voxels->levels().leafOrigins);
-                setProperty(description, kLeafParents, voxels->levels().leafParents);
-                setProperty(description, kInnerOrigins, voxels->levels().innerOrigins);
-                setProperty(description, kInnerChildren, voxels->levels().innerChildren);
-                isDescribed = true;
-            } else if (auto const points = Nexil::dynamicPtrCast<PointTopology<Traits>>(component)) {
-                setKind(description, kPointTopologyKind, *points);
-                setParameters(description, Traits::parameters());
-                setProperty(description, kLeafOrigins, points->sharedLeafOrigins());
-                setProperty(description, kOffsets, points->sharedOffsets());
-                isDescribed = true;
-            }
-        });
-        return isDescribed;
-    }
-
-    bool describeContainer(VldProxyComponentContainer const& proxy, Object& description)
-    {
-        bool isDescribed = false;
-        forEachConfiguration([&]<class Traits>() {
-            auto const container = Nexil::dynamicPtrCast<Container<Traits>>(proxy.getVldComponent());
-            if (!container)
-                return;
-            setProperty(description, sIndices, Nexil::makePtr<Nexil::Array<unsigned int>>());
-            description.setPropertyAny(sTarget, proxy.getProperty(sTarget));
-            description.setPropertyAny(sDependsOn, proxy.getProperty(sDependsOn));
-            setKind(description, kContainerKind, *container);
-            setProperty(description, kTopology, container->topologyName());
-            setProperty(description, kVoxelSize, container->voxelSize());
-            isDescribed = true;
-        });
-        return isDescribed;
-    }
-
-    bool describeChannel(VldProxyComponentChannel const& proxy, Object& description)
-    {
-        auto const channel = proxy.getVldComponent();
-        if (!channel)
-            return false;
-        for (Nexil::String const& key : proxy.keys())
-            description.setPropertyAny(key, proxy.getProperty(key));
-        setKind(description, kChannelKind, *channel);
-        setParameters(description, channel->tileParameters());
-        setProperty(description, kContainer, channel->containerName());
-        return true;
-    }
-
 } // namespace
-
-bool describeProxy(Object const& proxy, Object& description)
-{
-    if (auto const* const topology = dynamic_cast<VldProxyComponentTopology const*>(&proxy))
-        return describeTopology(*topology, description);
-    if (auto const* const container = dynamic_cast<VldProxyComponentContainer const*>(&proxy))
-        return describeContainer(*container, description);
-    auto const* const channel = dynamic_cast<VldProxyComponentChannel const*>(&proxy);
-    return channel && describeChannel(*channel, description);
-}
 
 bool isProxyDescription(Object const& object)
 {

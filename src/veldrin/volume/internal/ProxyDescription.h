@@ -10,18 +10,8 @@
 #include <unordered_map>
 #include <vector>
 
-/// Proxies as plain objects, the form in which a file holds them.
-///
-/// A description is a geo property of the kind that the proxy plays, so that what cannot be rebuilt is still geometry. Besides
-/// it has the component's kind under "vld_component", and what the component holds beyond that: the tile arrays of a
-/// topology, the voxel size of a container. "indices" of a container are left empty: they are numbers that count up.
+/// From descriptions of proxies, as `describeVldProxy` makes them and files hold them, back to proxies.
 namespace Veldrin::Geometry::Internal {
-
-/// Fills `description`, which is empty, for a proxy; false, and nothing filled, for any other object and for a proxy without
-/// a component of its kind.
-///
-/// Arrays of voxels and tiles are shared, not copied.
-[[nodiscard]] bool describeProxy(Object const& proxy, Object& description);
 
 /// True for an object that claims to be a description.
 [[nodiscard]] bool isProxyDescription(Object const& object);
