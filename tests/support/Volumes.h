@@ -41,6 +41,16 @@ inline bool sameTiles(VLD::TileTree3D::SharedTileLevels const& a, VLD::TileTree3
            sameBytes(*a.innerOrigins, *b.innerOrigins) && sameBytes(*a.innerChildren, *b.innerChildren);
 }
 
+/// Tiles of more elements than 32 bits count, in memory that nobody writes and that is therefore never taken.
+inline Nexil::Ptr<VLD::TileTree3D::VoxelTopology<VLD::TileTree3D::WideTiles>> hugeTopology()
+{
+    using namespace VLD::TileTree3D;
+    TileLevels levels;
+    Nexil::Internal::resizeUninitialized(levels.leafOrigins, kNoElement / WideTiles::kLeafVoxels + 1);
+    Nexil::Internal::resizeUninitialized(levels.leafParents, levels.leafOrigins.size());
+    return Nexil::makePtr<VoxelTopology<WideTiles>>("huge", std::move(levels));
+}
+
 /// The tiles of a topology, copied, so that they can be changed.
 template <class Traits>
 VLD::TileTree3D::TileLevels tilesOf(VLD::TileTree3D::VoxelTopology<Traits> const& topology)

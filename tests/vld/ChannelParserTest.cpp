@@ -43,16 +43,14 @@ TEST(ChannelParser, AcceptsWhatTheEqualRegularExpressionAccepts)
     }
 }
 
-TEST(ChannelParser, ANameEqualToThePatternMatchesAndAnEmptyPatternEndsTheFormerOne)
+TEST(ChannelParser, OtherSignsStandForThemselvesAndAnEmptyPatternEndsTheFormerOne)
 {
     ChannelParser parser;
     EXPECT_FALSE(parser.accepts("voxel_fuel"));
-    for (char const* text : {"voxel_fuel", "a*b", "?", "[a-z]+", "a\nb", "*"}) {
-        EXPECT_TRUE(parser.parses(text));
-        EXPECT_TRUE(parser.accepts(text)) << text;
-    }
+    EXPECT_TRUE(parser.parses("[a-z]+\n"));
+    EXPECT_TRUE(parser.accepts("[a-z]+\n"));
+    EXPECT_FALSE(parser.accepts("ab\n"));
     EXPECT_FALSE(parser.parses(""));
-    EXPECT_FALSE(parser.accepts("voxel_fuel"));
     EXPECT_FALSE(parser.accepts(""));
 }
 

@@ -29,7 +29,6 @@ TEST(VolumeObject, FindsComponentsByNameAndKind)
     EXPECT_EQ(volume->component<Channel<SmallTiles>>("b"), first);
     EXPECT_EQ(volume->component<ChannelBase>("b").get(), static_cast<ChannelBase const*>(first.get()));
     EXPECT_EQ(volume->component<Channel<WideTiles>>("b"), nullptr);
-    EXPECT_EQ(volume->component<Container<SmallTiles>>("b"), nullptr);
     EXPECT_EQ(volume->component<ChannelBase>("c"), nullptr);
     EXPECT_TRUE(volume->hasComponentFromName("a"));
 

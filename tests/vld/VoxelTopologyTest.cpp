@@ -4,8 +4,11 @@
 #include <vld/Container.h>
 #include <vld/PointTopology.h>
 
+#include <cmath>
 #include <functional>
+#include <map>
 #include <random>
+#include <tuple>
 
 namespace {
 
@@ -27,6 +30,14 @@ public:
 };
 TYPED_TEST_SUITE(Topology, support::BothConfigurations);
 
+template <class Traits>
+std::string reportOf(Container<Traits> const& container)
+{
+    ::testing::internal::CaptureStdout();
+    static_cast<void>(container.checkConsistency(true));
+    return ::testing::internal::GetCapturedStdout();
+}
+
 TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
 {
     using Traits = TypeParam;
@@ -43,8 +54,12 @@ TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
         return *std::find_if(levels.innerChildren.begin(), levels.innerChildren.end(),
                              [](unsigned int child) { return child != kNoTile; });
     };
+    auto addInner = [](TileLevels& levels, Coordinate const& origin) {
+        levels.innerOrigins.push_back(origin);
+        for (unsigned int cell = 0; cell < Traits::kInnerCells; ++cell)
+            levels.innerChildren.push_back(kNoTile);
+    };
     std::vector<Damage> const damages{
-        {"leaf origins not increasing", [&](TileLevels& l) { swap(l.leafOrigins, 0, 1); }},
         {"leaf tiles in another order, with all that points at them",
          [&](TileLevels& l) {
              swap(l.leafOrigins, 0, 1);
@@ -52,25 +67,27 @@ TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
              for (unsigned int& child : l.innerChildren)
                  child = child < 2 ? 1 - child : child;
          }},
-        {"an inner tile twice, once without leaf tiles",
-         [&](TileLevels& l) {
-             l.innerOrigins.push_back(l.innerOrigins[l.innerOrigins.size() - 1]);
-             for (unsigned int cell = 0; cell < Traits::kInnerCells; ++cell)
-                 l.innerChildren.push_back(kNoTile);
-         }},
         {"a leaf origin twice", [&](TileLevels& l) { l.leafOrigins[1] = l.leafOrigins[0]; }},
         {"a leaf origin not aligned", [&](TileLevels& l) { l.leafOrigins[0].z += 1; }},
         {"a leaf origin elsewhere", [&](TileLevels& l) { l.leafOrigins[0].x -= 100 * kWidth; }},
-        {"a leaf origin beyond the limits", [&](TileLevels& l) { l.leafOrigins[0].x = -2147483647 - 1; }},
         {"inner origins not increasing", [&](TileLevels& l) { swap(l.innerOrigins, 0, 1); }},
-        {"an inner origin not aligned", [&](TileLevels& l) { l.innerOrigins[0].x -= kWidth; }},
-        {"an inner origin beyond the limits", [&](TileLevels& l) { l.innerOrigins[0].x = -2147483647 - 1; }},
+        {"an inner tile twice, once without leaf tiles",
+         [&](TileLevels& l) { addInner(l, l.innerOrigins[l.innerOrigins.size() - 1]); }},
+        {"an inner tile beyond the limits",
+         [&](TileLevels& l) {
+             addInner(l, {kCoordinateLimit, 0, 0});
+         }},
+        {"an inner tile not aligned",
+         [&](TileLevels& l) {
+             addInner(l, {kCoordinateLimit - kWidth, 0, 0});
+         }},
         {"a parent missing", [&](TileLevels& l) { l.leafParents.resize(l.leafParents.size() - 1); }},
-        {"a parent out of range", [&](TileLevels& l) { l.leafParents[2] = l.leafParents[2] + 1000; }},
-        {"no parent", [&](TileLevels& l) { l.leafParents[2] = kNoTile; }},
+        {"a parent too many", [&](TileLevels& l) { l.leafParents.push_back(0); }},
+        {"a parent out of range", [&](TileLevels& l) { l.leafParents[2] = unsigned(l.innerOrigins.size()); }},
         {"another parent", [&](TileLevels& l) { l.leafParents[0] = l.leafParents[8]; }},
         {"children missing", [&](TileLevels& l) { l.innerChildren.resize(l.innerChildren.size() - 1); }},
-        {"a child out of range", [&](TileLevels& l) { firstFree(l) = 1000; }},
+        {"children too many", [&](TileLevels& l) { l.innerChildren.push_back(kNoTile); }},
+        {"a child out of range", [&](TileLevels& l) { firstFree(l) = unsigned(l.leafOrigins.size()); }},
         {"a child in a second cell", [&](TileLevels& l) { firstFree(l) = 0; }},
         {"a child lost", [&](TileLevels& l) { firstUsed(l) = kNoTile; }},
         {"leaf tiles without inner ones",
@@ -90,15 +107,20 @@ TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
         auto const topology = Nexil::makePtr<VoxelTopology<Traits>>("t", levels);
         Container<Traits> const container("c", topology, 1);
         EXPECT_FALSE(container.checkConsistency(false));
-        ::testing::internal::CaptureStdout();
-        EXPECT_FALSE(container.checkConsistency(true));
-        EXPECT_EQ(::testing::internal::GetCapturedStdout().rfind("topology t: ", 0), 0u);
+        EXPECT_EQ(reportOf(container).rfind("topology t: ", 0), 0u);
     }
     auto const good = Nexil::makePtr<VoxelTopology<Traits>>("t", this->sound());
     EXPECT_TRUE(Container<Traits>("c", good, 0.5f).checkConsistency(true));
     EXPECT_FALSE(Container<Traits>("c", nullptr, 0.5f).checkConsistency(false));
     for (float const size : {0.0f, -1.0f, std::numeric_limits<float>::infinity(), std::nanf("")})
         EXPECT_FALSE(Container<Traits>("c", good, size).checkConsistency(false));
+}
+
+TEST(HugeTopology, OfMoreElementsThan32BitsCountIsNotConsistent)
+{
+    auto const topology = support::hugeTopology();
+    EXPECT_EQ(reportOf(Container<WideTiles>("c", topology, 1)), "topology huge: more elements than 32 bits count\n");
+    EXPECT_TRUE(topology->elementIndices()->empty());
 }
 
 /// Writes down which tiles it saw, in the order in which parts were joined.
@@ -151,38 +173,50 @@ TYPED_TEST(Topology, PointsAreSortedIntoTheirTilesAndKeepTheirOrderThere)
     std::mt19937 random(5);
     std::uniform_real_distribution<float> place(-30, 30);
     Nexil::Array<Veldrin::Math::float3> positions;
-    for (int i = 0; i < 20000; ++i)
+    std::map<std::tuple<int, int, int>, std::vector<unsigned int>> pointsOfTile;
+    auto voxel = [](float v) { return static_cast<int>(std::floor(double(v) / 0.5)); };
+    for (unsigned int i = 0; i < 20000; ++i) {
         positions.push_back({place(random), place(random), place(random)});
-    auto tileOf = [&](std::uint64_t i) {
-        auto voxel = [](float v) { return static_cast<int>(std::floor(double(v) / 0.5)); };
-        return tileOrigin<TypeParam::kDataWidth>({voxel(positions[i].x), voxel(positions[i].y), voxel(positions[i].z)});
-    };
+        auto const& p = positions[i];
+        auto const tile = tileOrigin<TypeParam::kDataWidth>({voxel(p.x), voxel(p.y), voxel(p.z)});
+        pointsOfTile[{tile.x, tile.y, tile.z}].push_back(i);
+    }
     support::onThreadCounts([&] {
         Nexil::Array<unsigned int> order;
         auto const topology = PointTopology<TypeParam>::build("p", positions, 0.5f, order);
         ASSERT_TRUE(topology);
         EXPECT_TRUE(topology->isConsistent());
-        ASSERT_EQ(topology->elementCount(), positions.size());
-        std::vector<bool> isSeen(positions.size());
-        for (std::uint64_t tile = 0; tile < topology->leafOrigins().size(); ++tile)
-            for (std::uint64_t i = topology->offsets()[tile]; i < topology->offsets()[tile + 1]; ++i) {
-                EXPECT_EQ(tileOf(order[i]), topology->leafOrigins()[tile]);
-                EXPECT_TRUE(i == topology->offsets()[tile] || order[i - 1] < order[i]);
-                EXPECT_FALSE(isSeen[order[i]]);
-                isSeen[order[i]] = true;
-            }
+        ASSERT_EQ(topology->leafOrigins().size(), pointsOfTile.size());
+        EXPECT_EQ(topology->elementCount(), positions.size());
+        std::uint64_t tile = 0, element = 0;
+        for (auto const& [origin, points] : pointsOfTile) {
+            Coordinate const& c = topology->leafOrigins()[tile];
+            EXPECT_EQ(std::tuple(c.x, c.y, c.z), origin);
+            EXPECT_EQ(topology->offsets()[tile++], element);
+            for (unsigned int const point : points)
+                ASSERT_EQ(order[element++], point);
+        }
     });
     Nexil::Array<unsigned int> order{7};
     EXPECT_FALSE(PointTopology<TypeParam>::build("p", {{0, 0, 0}, {0, 0, 1e10f}}, 0.5f, order));
-    EXPECT_FALSE(PointTopology<TypeParam>::build("p", positions, 0, order));
+    EXPECT_FALSE(PointTopology<TypeParam>::build("p", {{0, 0, 2147483648.0f}}, 1, order));
+    for (float const size : {0.0f, std::numeric_limits<float>::infinity()})
+        EXPECT_FALSE(PointTopology<TypeParam>::build("p", positions, size, order));
     EXPECT_EQ(order.size(), 1u);
-    int const w = TypeParam::kDataWidth;
-    EXPECT_TRUE(PointTopology<TypeParam>::create("p", {{0, 0, 0}, {0, w, 0}}, {0, 0, 3}));
-    EXPECT_FALSE(PointTopology<TypeParam>::create("p", {{0, w, 0}, {0, 0, 0}}, {0, 0, 3}));
-    EXPECT_FALSE(PointTopology<TypeParam>::create("p", {{0, 0, 0}, {0, w + 1, 0}}, {0, 0, 3}));
-    EXPECT_FALSE(PointTopology<TypeParam>::create("p", {{0, 0, 0}, {0, w, 0}}, {0, 4, 3}));
-    EXPECT_FALSE(PointTopology<TypeParam>::create("p", {{0, 0, 0}, {0, w, 0}}, {0, 3}));
-    EXPECT_FALSE(PointTopology<TypeParam>::create("p", {{0, 0, 0}, {0, w, 0}}, {1, 2, 3}));
+
+    constexpr int w = TypeParam::kDataWidth;
+    struct Case {
+        bool isSound;
+        Nexil::Array<Coordinate> origins;
+        Nexil::Array<unsigned int> offsets;
+    };
+    for (Case const& c : {Case{true, {{0, 0, 0}, {0, w, 0}}, {0, 0, 3}}, Case{false, {{0, w, 0}, {0, 0, 0}}, {0, 0, 3}},
+                          Case{false, {{0, w, 0}, {0, w, 0}}, {0, 0, 3}}, Case{false, {{0, w + 1, 0}}, {0, 3}},
+                          Case{false, {{0, 0, kCoordinateLimit}}, {0, 3}},
+                          Case{false, {{0, 0, 0}, {0, w, 0}}, {0, 4, 3}}, Case{false, {{0, 0, 0}, {0, w, 0}}, {0, 3}},
+                          Case{false, {{0, 0, 0}}, {0, 0, 3}}, Case{false, {{0, 0, 0}}, {1, 2}}})
+        EXPECT_EQ(bool(PointTopology<TypeParam>::create("p", c.origins, c.offsets)), c.isSound);
+    EXPECT_FALSE(PointTopology<TypeParam>::create("", {}, Nexil::Array<unsigned int>{0}));
 }
 
 } // namespace

@@ -7,7 +7,6 @@
 #include <vld/BuildFromValues.h>
 
 #include <cmath>
-#include <functional>
 #include <random>
 
 namespace {
@@ -37,81 +36,51 @@ void growByEveryElement(Grid<Traits> const& grid, IsContent const& isContent, Bo
     }
 }
 
-template <class T>
-struct Contents {
-    char const* name;
-    Coordinate centre;
-    int spread;
-    float voxelSize;
-    T background;
-    /// A number from 0 to 99 to a value.
-    T (*value)(unsigned int);
-};
-
+/// Volumes of any size anywhere, of few values or many, which are mostly one and sometimes any of `values`.
 template <class Traits, class T, class IsContent>
-void expectBounds(char const* channelName, std::vector<Contents<T>> const& table, IsContent const& isContent)
+void expectBounds(char const* channelName, std::vector<T> const& values, IsContent const& isContent)
 {
-    for (Contents<T> const& c : table) {
-        SCOPED_TRACE(c.name);
-        for (unsigned int seed = 0; seed < 5; ++seed) {
-            std::mt19937 random(seed);
-            std::uniform_int_distribution<int> offset(-c.spread, c.spread);
-            Nexil::Array<Coordinate> voxels;
-            Nexil::Array<T> values;
-            for (int i = 0; i < 3000; ++i) {
-                voxels.push_back(c.centre + Coordinate{offset(random), offset(random), offset(random)});
-                values.push_back(c.value(static_cast<unsigned int>(random() % 100)));
-            }
-            auto const grid = buildFromVoxels<Traits>({.channelName = channelName, .voxelSize = c.voxelSize}, voxels,
-                                                      values, c.background);
-            Box expected;
-            growByEveryElement<Traits, T>(grid, isContent, expected);
-            auto volume = VLD::createObject();
-            ASSERT_TRUE(grid.addTo(*volume));
-            support::onThreadCounts([&] {
-                Box box;
-                EXPECT_TRUE(GeometryAlgorithms::volumeBounds(*volume, *grid.container, *grid.topology, box));
-                EXPECT_EQ(box, expected);
-            });
-            auto const object = Geometry::move_vld_volume_to_object(*volume);
-            Box box;
-            GeometryAlgorithms::getVolumeBounds(*object, box);
-            EXPECT_EQ(box, expected);
+    for (unsigned int seed = 0; seed < 40; ++seed) {
+        SCOPED_TRACE(seed);
+        std::mt19937 random(seed);
+        auto oneOf = [&](auto const& choices) { return choices[random() % std::size(choices)]; };
+        int const starts[] = {0, -57, 1 << 30, -(1 << 30)}, spreads[] = {2, 20, 60, 500};
+        Coordinate const centre{oneOf(starts), oneOf(starts), oneOf(starts)};
+        std::uniform_int_distribution<int> offset(-oneOf(spreads), 0);
+        float const voxelSizes[] = {0.1f, 1, 2};
+        T const mostly = oneOf(values);
+        Nexil::Array<Coordinate> voxels;
+        Nexil::Array<T> voxelValues;
+        for (int i = 0; i < 2000; ++i) {
+            voxels.push_back(centre + Coordinate{offset(random), offset(random), offset(random)});
+            voxelValues.push_back(random() % 100 == 0 ? oneOf(values) : mostly);
         }
+        auto const grid = buildFromVoxels<Traits>({.channelName = channelName, .voxelSize = oneOf(voxelSizes)}, voxels,
+                                                  voxelValues, oneOf(values));
+        Box expected;
+        growByEveryElement<Traits, T>(grid, isContent, expected);
+        auto volume = VLD::createObject();
+        ASSERT_TRUE(grid.addTo(*volume));
+        support::onThreadCounts([&] {
+            Box box;
+            EXPECT_TRUE(GeometryAlgorithms::volumeBounds(*volume, *grid.container, *grid.topology, box));
+            EXPECT_EQ(box, expected);
+        });
+        Box box;
+        GeometryAlgorithms::getVolumeBounds(*Geometry::move_vld_volume_to_object(*volume), box);
+        EXPECT_EQ(box, expected);
     }
 }
 
 TYPED_TEST(VolumeBounds, AreThoseOfALoopOverAllElements)
 {
-    expectBounds<TypeParam, float>(
-        "voxel_signed_distance",
-        std::vector<Contents<float>>{
-            {"one in a hundred inside", {0, 0, 0}, 60, 0.1f, 3, [](unsigned int i) { return i == 0 ? -1.0f : 2.0f; }},
-            {"on the surface", {-9, 2, 5}, 20, 1, 3, [](unsigned int i) { return i == 0 ? 0.0f : 1e-30f; }},
-            {"no numbers", {0, 0, 0}, 20, 1, std::nanf(""), [](unsigned int) { return std::nanf(""); }},
-            {"some numbers",
-             {7, 7, 7},
-             30,
-             2,
-             std::nanf(""),
-             [](unsigned int i) { return i < 3 ? -std::numeric_limits<float>::infinity() : std::nanf(""); }},
-            {"everything inside", {0, 0, 0}, 40, 1, -1, [](unsigned int) { return -2.0f; }},
-            {"at 2^30",
-             {1 << 30, -(1 << 30), 1 << 30},
-             500,
-             1,
-             1,
-             [](unsigned int i) { return i == 7 ? -1.0f : 1.0f; }},
-        },
-        [](float v) { return v <= 0; });
-    expectBounds<TypeParam, double>(
-        "voxel_fog_density",
-        std::vector<Contents<double>>{
-            {"one in a hundred", {-50, 0, 90}, 60, 0.1f, 0, [](unsigned int i) { return i == 0 ? 0.5 : 0.0; }},
-            {"negative density", {0, 0, 0}, 60, 1, 0, [](unsigned int i) { return i == 0 ? -0.0 : -1.0; }},
-            {"beyond all floats", {0, 0, 0}, 9, 1, -1, [](unsigned int i) { return i == 0 ? 1e-300 : std::nan(""); }},
-        },
-        [](double v) { return v > 0; });
+    float const infinity = std::numeric_limits<float>::infinity();
+    expectBounds<TypeParam, float>("voxel_signed_distance",
+                                   std::vector<float>{3, -1, -0.0f, 1e-30f, std::nanf(""), -infinity},
+                                   [](float v) { return v <= 0; });
+    expectBounds<TypeParam, double>("voxel_fog_density",
+                                    std::vector<double>{0.5, -0.0, -1, 1e-300, std::nan(""), infinity},
+                                    [](double v) { return v > 0; });
 }
 
 TYPED_TEST(VolumeBounds, UniteBothChannelsAndGrowTheBoxThatIsGiven)
@@ -137,33 +106,40 @@ TYPED_TEST(VolumeBounds, UniteBothChannelsAndGrowTheBoxThatIsGiven)
 TYPED_TEST(VolumeBounds, PassOverWhatDoesNotBelongToTheContainer)
 {
     using Traits = TypeParam;
+    using Other = std::conditional_t<std::is_same_v<Traits, SmallTiles>, WideTiles, SmallTiles>;
     auto const grid = support::sphere<Traits>({.channelName = "voxel_signed_distance"}, 5);
-    auto put = [&](auto const& channel) {
-        auto volume = VLD::createObject();
-        volume->addComponent(grid.topology);
-        volume->addComponent(grid.container);
-        volume->addComponent(channel);
-        return volume;
-    };
-    Nexil::Array<float> few{-1};
+    auto const values = grid.channel->template values<float>();
+    auto const few = Nexil::makePtr<Nexil::Array<float>>(Nexil::Array<float>{-1});
     Nexil::Array<int> integers;
     integers.resize(grid.topology->elementCount());
+    auto channel = [](char const* name, char const* container, auto const& data) {
+        return Nexil::makePtr<Channel<Traits>>(name, container, data, std::decay_t<decltype((*data)[0])>());
+    };
+    Nexil::Ptr<VLD::Component> const channels[] = {
+        channel("voxel_signed_distance", "voxel_tile_tree", few), channel("voxel_signed_distance", "elsewhere", values),
+        channel("voxel_signed_distance", "voxel_tile_tree", Nexil::makePtr<Nexil::Array<int>>(std::move(integers))),
+        channel("voxel_depth", "voxel_tile_tree", values),
+        Nexil::makePtr<Channel<Other>>("voxel_signed_distance", "voxel_tile_tree", values, 0.0f)};
     Box const before{{1, 2, 3}, {4, 5, 6}};
-    for (auto const& channel : {Nexil::makePtr<Channel<Traits>>("voxel_signed_distance", "voxel_tile_tree",
-                                                                Nexil::makePtr<Nexil::Array<float>>(few), 0.0f),
-                                Nexil::makePtr<Channel<Traits>>("voxel_signed_distance", "elsewhere",
-                                                                grid.channel->template values<float>(), 0.0f),
-                                Nexil::makePtr<Channel<Traits>>("voxel_signed_distance", "voxel_tile_tree",
-                                                                Nexil::makePtr<Nexil::Array<int>>(integers), 0),
-                                Nexil::makePtr<Channel<Traits>>("voxel_depth", "voxel_tile_tree",
-                                                                grid.channel->template values<float>(), 0.0f)}) {
+    auto expectNothing = [&](Container<Traits> const& container, auto const& component) {
+        auto volume = VLD::createObject();
+        volume->addComponent(component);
         Box box = before;
-        EXPECT_FALSE(GeometryAlgorithms::volumeBounds(*put(channel), *grid.container, *grid.topology, box));
+        EXPECT_FALSE(GeometryAlgorithms::volumeBounds(*volume, container, *grid.topology, box));
         EXPECT_EQ(box, before);
-    }
+    };
+    for (auto const& component : channels)
+        expectNothing(*grid.container, component);
+    // A container of other tiles than it is said, of tiles that lack cells, of none.
+    TileLevels tiles = support::tilesOf(*grid.topology);
+    tiles.innerChildren.clear();
+    expectNothing(Container<Traits>("voxel_tile_tree", Nexil::makePtr<VoxelTopology<Traits>>("t", tiles), 1.0f),
+                  grid.channel);
+    expectNothing(Container<Traits>("voxel_tile_tree", Nexil::makePtr<VoxelTopology<Traits>>("t", TileLevels()), 1.0f),
+                  grid.channel);
+    expectNothing(Container<Traits>("voxel_tile_tree", nullptr, 1.0f), grid.channel);
     Box box = before;
-    auto const mesh = support::filled([](Object& o) { Geometry::populateCubeMesh(9, o); });
-    GeometryAlgorithms::getVolumeBounds(*mesh, box);
+    GeometryAlgorithms::getVolumeBounds(*support::filled([](Object& o) { Geometry::populateCubeMesh(9, o); }), box);
     EXPECT_EQ(box, before);
 }
 

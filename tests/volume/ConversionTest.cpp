@@ -12,8 +12,8 @@
 #include <veldrin/volume/VldProxyComponentTopology.h>
 #include <veldrin/volume/VolumeConversion.h>
 
-#include <functional>
 #include <map>
+#include <vector>
 
 namespace {
 
@@ -39,47 +39,39 @@ Nexil::Ptr<Channel<Traits>> channel(char const* name, char const* container, std
     return Nexil::makePtr<Channel<Traits>>(name, container, Nexil::makePtr<FloatArray>(std::move(values)), 0.0f);
 }
 
-struct Sample {
-    char const* name;
-    std::function<void(VLD::Object&)> fill;
-};
+using Components = std::vector<Nexil::Ptr<VLD::Component>>;
 
-std::vector<Sample> const kVolumes{
-    {"small tiles", [](VLD::Object& v) { support::sphere<SmallTiles>({.channelName = "d"}).addTo(v); }},
-    {"wide tiles", [](VLD::Object& v) { support::sphere<WideTiles>({.channelName = "d"}).addTo(v); }},
-    {"both configurations",
-     [](VLD::Object& v) {
-         support::sphere<WideTiles>({.channelName = "d"}).addTo(v);
-         support::sphere<SmallTiles>({.channelName = "e", .topologyName = "t", .containerName = "c"}).addTo(v);
-     }},
-    {"a topology without a container",
-     [](VLD::Object& v) { v.addComponent(support::sphere<WideTiles>({.channelName = "d"}).topology); }},
-    {"two containers of one topology, in any order",
-     [](VLD::Object& v) {
-         auto const grid = support::sphere<SmallTiles>({.channelName = "d"});
-         v.addComponent(grid.channel);
-         v.addComponent(Nexil::makePtr<Container<SmallTiles>>("other", grid.topology, 3.0f));
-         v.addComponent(grid.container);
-         v.addComponent(channel<SmallTiles>("e", "other", grid.topology->elementCount()));
-         v.addComponent(grid.topology);
-     }},
-    {"points beside voxels",
-     [](VLD::Object& v) {
-         support::addPoints<WideTiles>(v);
-         support::sphere<WideTiles>({.channelName = "d"}).addTo(v);
-     }},
-    {"points alone", [](VLD::Object& v) { support::addPoints<SmallTiles>(v); }},
-};
+Nexil::MutablePtr<VLD::Object> volumeOf(Components const& components)
+{
+    auto volume = VLD::createObject();
+    for (auto const& component : components)
+        EXPECT_TRUE(volume->addComponent(component));
+    return volume;
+}
+
+std::map<char const*, Components> volumes()
+{
+    auto const small = support::sphere<SmallTiles>({.channelName = "e", .topologyName = "t", .containerName = "c"});
+    auto const wide = support::sphere<WideTiles>({.channelName = "d"});
+    auto const points = support::points<WideTiles>();
+    auto const sizes = channel<WideTiles>("sizes", "points", 3);
+    return {{"small tiles", {small.topology, small.container, small.channel}},
+            {"both configurations",
+             {wide.topology, wide.container, wide.channel, small.topology, small.container, small.channel}},
+            {"a topology without a container", {wide.topology}},
+            {"two containers of one topology, in any order",
+             {small.channel, Nexil::makePtr<Container<SmallTiles>>("other", small.topology, 3.0f), small.container,
+              channel<SmallTiles>("f", "other", small.topology->elementCount()), small.topology}},
+            {"points beside voxels", {points, sizes, wide.topology, wide.container, wide.channel}},
+            {"points alone", {points, sizes}}};
+}
 
 TEST(VolumeConversion, ThereAndBackGivesTheSameComponents)
 {
-    for (Sample const& sample : kVolumes) {
-        SCOPED_TRACE(sample.name);
-        auto volume = VLD::createObject();
-        sample.fill(*volume);
+    for (auto const& [name, components] : volumes()) {
+        SCOPED_TRACE(name);
+        auto volume = volumeOf(components);
         auto const before = componentsOf(*volume);
-        ASSERT_FALSE(before.empty());
-
         auto object = Geometry::move_vld_volume_to_object(*volume);
         ASSERT_TRUE(object);
         EXPECT_TRUE(volume->empty());
@@ -107,33 +99,23 @@ TEST(VolumeConversion, EveryReaderOfGeometryReadsAVolume)
 {
     using namespace Veldrin::Geometry;
     auto volume = support::sphereVolume<WideTiles>();
-    auto const topology = volume->component<VoxelTopology<WideTiles>>("voxel_component");
     auto const values = volume->component<ChannelBase>("voxel_signed_distance")->values<float>();
     auto const object = move_vld_volume_to_object(*volume);
 
     EXPECT_TRUE(Object::isA(*object, *getVolumePrototype()));
     EXPECT_TRUE(Object::isA(*object, *getLevelSetPrototype()));
     EXPECT_FALSE(Object::isA(*object, *getFogVolumePrototype()));
-    EXPECT_FALSE(Object::isA(*object, *getMeshPrototype()));
     EXPECT_EQ(getTargetChain(*object, sVoxelSignedDistance),
               (Nexil::Array<Nexil::String>{"voxel_signed_distance", "voxel_tile_tree", "voxel_component"}));
-    EXPECT_EQ(getTargetComponent(*object, sVoxelSignedDistance), "voxel_component");
-    EXPECT_EQ(getElementCount(*object, sVoxelComp), topology->elementCount());
-    EXPECT_EQ(getGeoPropNamesByPrototype(*object, *getComponentGeoPropPrototype()),
-              (Nexil::Array<Nexil::String>{"voxel_component"}));
+    EXPECT_EQ(getElementCount(*object, sVoxelComp), values->size());
     EXPECT_EQ(getGeoPropsByName(*object, "voxel_s*"), (Nexil::Array<Nexil::String>{"voxel_signed_distance"}));
-
-    auto const data = getDataGeoProperty(*object, sVoxelSignedDistance);
-    ASSERT_TRUE(data);
-    EXPECT_EQ(getPropertyAs<Nexil::Ptr<FloatArray>>(*data, sData), values) << "the channel's own array";
-    EXPECT_EQ(getPropertyAs<float>(*data, sDefault), 1.0f);
-    EXPECT_EQ(getPropertyAs<Common::DataInterpolationMode>(*data, sInterp), Common::DataInterpolationMode::Linear);
+    EXPECT_EQ(support::arrayIn<float>(*object, sVoxelSignedDistance), values) << "the channel's own array";
     auto const indices = getRangeGeoPropIndices(*object, sVoxelTileTree);
-    ASSERT_EQ(indices->size(), topology->elementCount());
+    ASSERT_EQ(indices->size(), values->size());
     for (std::uint64_t i = 0; i < indices->size(); ++i)
         ASSERT_EQ((*indices)[i], i);
     EXPECT_EQ(getRangeGeoPropIndices(*object, sVoxelTileTree), indices) << "made once";
-    EXPECT_NE(support::dump(*object).find("voxel_tile_tree"), std::string::npos);
+    EXPECT_NE(support::dump(*object).find("default: 1 (float)"), std::string::npos);
 }
 
 TEST(VolumeConversion, CostsTheSameForAnyNumberOfVoxels)
@@ -166,27 +148,21 @@ TEST(VolumeConversion, AnEmptyOrOutdatedVolumeIsClearedAndGivesAnEmptyObject)
 
 TEST(VolumeConversion, AVolumeWithAComponentThatHasNoPlaceStaysWhole)
 {
-    std::vector<Sample> const misfits{
-        {"a channel of no container", [](VLD::Object& v) { v.addComponent(channel<SmallTiles>("x", "nothing", 0)); }},
-        {"a channel of a topology",
-         [](VLD::Object& v) { v.addComponent(channel<SmallTiles>("x", "voxel_component", 0)); }},
+    auto const grid = support::sphere<SmallTiles>({.channelName = "d"});
+    auto const empty = Nexil::makePtr<Container<SmallTiles>>("x", nullptr, 1.0f);
+    std::map<char const*, Components> const misfits{
+        {"a channel of no container", {channel<SmallTiles>("x", "nothing", 0)}},
+        {"a channel of a topology", {channel<SmallTiles>("x", "voxel_component", 0)}},
         {"a channel of the other configuration",
-         [](VLD::Object& v) {
-             auto const count = v.component<ChannelBase>("voxel_signed_distance")->elementCount();
-             v.addComponent(channel<WideTiles>("x", "voxel_tile_tree", count));
-         }},
-        {"a second container, without a topology",
-         [](VLD::Object& v) { v.addComponent(Nexil::makePtr<Container<SmallTiles>>("x", nullptr, 1.0f)); }},
-        {"a channel of that",
-         [](VLD::Object& v) {
-             v.addComponent(channel<SmallTiles>("y", "x", 0));
-             v.addComponent(Nexil::makePtr<Container<SmallTiles>>("x", nullptr, 1.0f));
-         }},
+         {channel<WideTiles>("x", "voxel_tile_tree", grid.topology->elementCount())}},
+        {"a second container, without a topology", {empty}},
+        {"a channel of that", {channel<SmallTiles>("y", "x", 0), empty}},
     };
-    for (Sample const& misfit : misfits) {
-        SCOPED_TRACE(misfit.name);
-        auto volume = support::sphereVolume<SmallTiles>();
-        misfit.fill(*volume);
+    for (auto const& [name, components] : misfits) {
+        SCOPED_TRACE(name);
+        auto volume = volumeOf({grid.topology, grid.container, grid.channel});
+        for (auto const& component : components)
+            volume->addComponent(component);
         auto const before = componentsOf(*volume);
         EXPECT_FALSE(Geometry::move_vld_volume_to_object(*volume));
         EXPECT_EQ(componentsOf(*volume), before);
@@ -195,71 +171,57 @@ TEST(VolumeConversion, AVolumeWithAComponentThatHasNoPlaceStaysWhole)
 
 TEST(VolumeConversion, AnObjectThatIsNoVolumeStaysWhole)
 {
-    struct Case {
-        char const* name;
-        std::function<void(Object&)> change;
+    using namespace Veldrin::Geometry;
+    auto expectRefused = [](Object& object) {
+        std::string const before = support::dump(object);
+        EXPECT_FALSE(move_object_to_vld_volume(object));
+        EXPECT_FALSE(shallow_copy_object_to_vld_volume(object));
+        EXPECT_EQ(support::dump(object), before);
     };
-    auto topology = [] { return support::sphere<WideTiles>({.channelName = "d"}).topology; };
-    auto put = [](Object& object, char const* name, auto proxy) {
-        setProperty(object, name, Nexil::makePtr<decltype(proxy)>(std::move(proxy)));
-    };
-    std::vector<Case> const cases{
-        {"a mesh",
-         [](Object& o) {
-             o.eraseAllProperties();
-             Geometry::populateCubeMesh(1, o);
-         }},
-        {"a mesh that is also an empty volume",
-         [](Object& o) {
-             o.eraseAllProperties();
-             Geometry::populateMesh(o);
-             Geometry::populateVolume(o);
-         }},
-        {"an ordinary level set with values",
-         [](Object& o) {
-             o.eraseAllProperties();
-             Geometry::populateLevelSet(o);
-             auto data = Nexil::MutablePtr<Object>(support::part(o, Geometry::sVoxelSignedDistance));
-             setProperty(*data, Geometry::sData, Nexil::makePtr<FloatArray>(FloatArray{1}));
-             setProperty(o, Geometry::sVoxelSignedDistance, std::move(data));
-         }},
-        {"a topology proxy of nothing", [&](Object& o) { put(o, "x", Geometry::VldProxyComponentTopology(nullptr)); }},
-        {"a topology proxy of a channel",
-         [&](Object& o) { put(o, "x", Geometry::VldProxyComponentTopology(channel<WideTiles>("x", "c", 1))); }},
-        {"a container proxy of nothing",
-         [&](Object& o) { put(o, "x", Geometry::VldProxyComponentContainer(nullptr, "voxel_component")); }},
+    auto const one = channel<SmallTiles>("x", "c", 1);
+    auto const other = support::sphere<WideTiles>({.channelName = "d"});
+    auto proxy = [](auto value) { return ObjectPtr(Nexil::makePtr<decltype(value)>(std::move(value))); };
+    std::map<char const*, ObjectPtr> const misfits{
+        {"a topology proxy of nothing", proxy(VldProxyComponentTopology(nullptr))},
+        {"a topology proxy of a channel", proxy(VldProxyComponentTopology(one))},
+        {"a container proxy of nothing", proxy(VldProxyComponentContainer(nullptr, "voxel_component"))},
         {"a container of the other configuration",
-         [&](Object& o) {
-             put(o, "x",
-                 Geometry::VldProxyComponentContainer(Nexil::makePtr<Container<WideTiles>>("x", topology(), 1.0f),
-                                                      "voxel_component"));
-         }},
-        {"a channel of the other configuration",
-         [&](Object& o) {
-             put(o, "x", Geometry::VldProxyComponentChannel(channel<WideTiles>("x", "c", 1), "voxel_tile_tree"));
-         }},
-        {"a channel proxy of nothing",
-         [&](Object& o) { put(o, "x", Geometry::VldProxyComponentChannel(nullptr, "voxel_tile_tree")); }},
-        {"a channel whose target is not there",
-         [&](Object& o) {
-             put(o, "x", Geometry::VldProxyComponentChannel(channel<SmallTiles>("x", "c", 1), "nothing"));
-         }},
+         proxy(VldProxyComponentContainer(other.container, "voxel_component"))},
+        {"a channel of the other configuration", proxy(VldProxyComponentChannel(other.channel, "voxel_tile_tree"))},
+        {"a channel proxy of nothing", proxy(VldProxyComponentChannel(nullptr, "voxel_tile_tree"))},
+        {"a channel whose target is not there", proxy(VldProxyComponentChannel(one, "nothing"))},
         {"two components of one name",
-         [&](Object& o) {
-             put(o, "x",
-                 Geometry::VldProxyComponentChannel(channel<SmallTiles>("voxel_component", "c", 1), "voxel_tile_tree"));
-         }},
+         proxy(VldProxyComponentChannel(channel<SmallTiles>("voxel_component", "c", 1), "voxel_tile_tree"))},
     };
-    for (Case const& c : cases) {
-        SCOPED_TRACE(c.name);
-        auto volume = support::sphereVolume<SmallTiles>();
-        auto object = Geometry::move_vld_volume_to_object(*volume);
-        c.change(*object);
-        std::string const before = support::dump(*object);
-        EXPECT_FALSE(Geometry::move_object_to_vld_volume(*object));
-        EXPECT_FALSE(Geometry::shallow_copy_object_to_vld_volume(*object));
-        EXPECT_EQ(support::dump(*object), before);
+    for (auto const& [name, misfit] : misfits) {
+        SCOPED_TRACE(name);
+        auto object = move_vld_volume_to_object(*support::sphereVolume<SmallTiles>());
+        setProperty(*object, "misfit", misfit);
+        expectRefused(*object);
     }
+    auto without = [&](auto const& populate) {
+        SCOPED_TRACE("without a topology proxy");
+        expectRefused(*support::filled(populate));
+    };
+    without([](Object& o) { populateCubeMesh(1, o); });
+    without([](Object& o) { // a mesh that is also an empty volume
+        populateMesh(o);
+        populateVolume(o);
+    });
+    without([](Object& o) {
+        populateVolume(o);
+        setElementCount(sVoxelComp, 3, o);
+    });
+    auto withArray = [&](char const* name, char const* key, Nexil::Any const& array) {
+        without([&](Object& o) {
+            populateLevelSet(o);
+            Nexil::MutablePtr<Object> part(support::part(o, name));
+            part->setPropertyAny(key, Nexil::Any(array));
+            setProperty(o, name, std::move(part));
+        });
+    };
+    withArray(sVoxelSignedDistance, "data", Nexil::makePtr<FloatArray>(FloatArray{1}));
+    withArray(sVoxelTileTree, "indices", Nexil::makePtr<Nexil::Array<unsigned int>>(Nexil::Array<unsigned int>{1}));
 }
 
 TEST(VolumeConversion, WhatWasOnlyPopulatedGivesAnEmptyVolume)
@@ -299,7 +261,7 @@ TEST(VolumeConversion, AnUpdatedVolumeIsToldByItsSizesAndItsDifferencesArePrinte
     struct Case {
         bool isValid;
         std::string printed;
-        std::vector<Nexil::Ptr<VLD::Component>> components;
+        Components components;
     };
     auto const stray = Nexil::makePtr<Container<WideTiles>>("stray", nullptr, 1.0f);
     std::vector<Case> const cases{
@@ -318,9 +280,7 @@ TEST(VolumeConversion, AnUpdatedVolumeIsToldByItsSizesAndItsDifferencesArePrinte
          {grid.topology, grid.container, channel<SmallTiles>("c", "voxel_tile_tree", 3), grid.channel}},
     };
     for (Case const& c : cases) {
-        auto volume = VLD::createObject();
-        for (auto const& component : c.components)
-            ASSERT_TRUE(volume->addComponent(component));
+        auto const volume = volumeOf(c.components);
         ::testing::internal::CaptureStdout();
         EXPECT_EQ(Geometry::validUpdatedVolume(*volume), c.isValid);
         EXPECT_EQ(::testing::internal::GetCapturedStdout(), "");

@@ -27,9 +27,7 @@ TEST(VolumeNames, ExchangeThePrefixOfOneSideForThatOfTheOther)
         {"voxel_fog_density",
          {"voxel_voxel_fog_density", "voxel_fog_density"},
          {"point_fog_density", "voxel_fog_density"}},
-        {"density", {"voxel_density", "voxel_density"}, {"point_density", "voxel_density"}},
         {"", {"voxel_", "voxel_"}, {"point_", "voxel_"}},
-        {"voxel_", {"voxel_voxel_", "voxel_"}, {"point_", "voxel_"}},
     };
     for (Case const& c : cases) {
         EXPECT_EQ(mapGeoPropertyNameToVLDVolume(c.name, *points), c.toVolume[0]) << c.name;

@@ -20,6 +20,7 @@ using Geometry::VldProxyComponentChannel;
 using Geometry::VldProxyComponentContainer;
 using Geometry::VldProxyComponentTopology;
 using Geometry::Common::DataInterpolationMode;
+using ObjectPtr = Nexil::Ptr<Object>;
 using FloatArray = Nexil::Array<float>;
 
 Nexil::Ptr<ChannelBase> channel()
@@ -77,12 +78,13 @@ TEST(VolumeProxies, PlayTheGeoPropertiesThatTheyStandFor)
     // Without a component there is nothing to read, and nothing breaks.
     EXPECT_TRUE(VldProxyComponentTopology(nullptr).getProperty("count").empty());
     EXPECT_TRUE(VldProxyComponentTopology(grid.channel).getProperty("count").empty());
-    EXPECT_EQ(
-        getPropertyAs<Nexil::Ptr<Nexil::Array<unsigned int>>>(VldProxyComponentContainer(nullptr), "indices")->size(),
-        0u);
-    EXPECT_EQ(getPropertyAs<Nexil::String>(VldProxyComponentChannel(nullptr, "t"), "target"), "t");
-    EXPECT_TRUE(VldProxyComponentChannel(nullptr).getProperty("data").empty());
-    EXPECT_FALSE(VldProxyComponentChannel(nullptr).propertyInfo("data").type);
+    EXPECT_TRUE(VldProxyComponentTopology(support::hugeTopology()).getProperty("count").empty());
+    VldProxyComponentContainer const noContainer(nullptr);
+    EXPECT_TRUE(getPropertyAs<Nexil::Ptr<Nexil::Array<unsigned int>>>(noContainer, "indices")->empty());
+    VldProxyComponentChannel const noChannel(nullptr, "t");
+    EXPECT_EQ(getPropertyAs<Nexil::String>(noChannel, "target"), "t");
+    EXPECT_TRUE(noChannel.getProperty("data").empty());
+    EXPECT_FALSE(noChannel.propertyInfo("data").type);
 }
 
 TEST(VolumeProxies, AWriteReachesAChannelThatNobodyElseHoldsAndACopyOfOneThatOthersHold)
@@ -138,7 +140,7 @@ TEST(VolumeProxies, ATargetThatIsSetIsTheContainersTopologyFromThenOn)
 TEST(VolumeProxies, ObjectsThatShareChannelsAreWrittenOnManyThreadsAtOnce)
 {
     auto volume = support::sphereVolume<SmallTiles>(6);
-    Nexil::Ptr<Object> const shared = Geometry::move_vld_volume_to_object(*volume);
+    ObjectPtr const shared = Geometry::move_vld_volume_to_object(*volume);
     auto const before = support::arrayIn<float>(*shared, Geometry::sVoxelSignedDistance);
     FloatArray const copy = *before;
     std::vector<std::thread> threads;
@@ -146,8 +148,8 @@ TEST(VolumeProxies, ObjectsThatShareChannelsAreWrittenOnManyThreadsAtOnce)
     for (std::size_t t = 0; t < read.size(); ++t)
         threads.emplace_back([&, t] {
             for (int round = 0; round < 50; ++round) {
-                Nexil::MutablePtr<Object> own(Nexil::Ptr<Object>{shared});
-                Nexil::MutablePtr<Object> data(getPropertyAs<Nexil::Ptr<Object>>(*own, Geometry::sVoxelSignedDistance));
+                Nexil::MutablePtr<Object> own(ObjectPtr{shared});
+                Nexil::MutablePtr<Object> data(getPropertyAs<ObjectPtr>(*own, Geometry::sVoxelSignedDistance));
                 EXPECT_TRUE(data->setPropertyAny("default", float(t)));
                 EXPECT_TRUE(data->setPropertyAny("data", Nexil::makePtr<FloatArray>(*before)));
                 setProperty(*own, Geometry::sVoxelSignedDistance, std::move(data));
@@ -166,14 +168,9 @@ TEST(VolumeProxies, ObjectsThatShareChannelsAreWrittenOnManyThreadsAtOnce)
 TEST(VolumeProxies, WhatIsTakenOutOfTheWrongObjectNamesItsType)
 {
     auto const grid = support::sphere<SmallTiles>({.channelName = "d"});
-    Nexil::Ptr<Object> const topology = Nexil::makePtr<VldProxyComponentTopology>(grid.topology);
-    Nexil::Ptr<Object> const container = Nexil::makePtr<VldProxyComponentContainer>(grid.container);
-    Nexil::Ptr<Object> const data = Nexil::makePtr<VldProxyComponentChannel>(grid.channel);
+    ObjectPtr const topology = Nexil::makePtr<VldProxyComponentTopology>(grid.topology);
     EXPECT_EQ(Geometry::getVldTopologyFromProxy(topology).get(), grid.topology.get());
-    EXPECT_EQ(Geometry::getVldContainerFromProxy(container).get(), grid.container.get());
-    EXPECT_EQ(Geometry::getVldChannelFromProxy(data).get(), grid.channel.get());
-
-    auto message = [](auto const& take, Nexil::Ptr<Object> const& from) {
+    auto message = [](auto const& take, ObjectPtr const& from) {
         try {
             static_cast<void>(take(from));
         } catch (std::runtime_error const& error) {
@@ -183,7 +180,7 @@ TEST(VolumeProxies, WhatIsTakenOutOfTheWrongObjectNamesItsType)
     };
     EXPECT_EQ(message(Geometry::getVldTopologyFromProxy, nullptr),
               "Could not find VLD component topology from proxy of type: null");
-    EXPECT_EQ(message(Geometry::getVldContainerFromProxy, Nexil::Ptr<Object>(createObject())),
+    EXPECT_EQ(message(Geometry::getVldContainerFromProxy, ObjectPtr(createObject())),
               "Could not find VLD component container from proxy of type: Veldrin::Object");
     EXPECT_EQ(message(Geometry::getVldChannelFromProxy, topology),
               "Could not find VLD component channel from proxy of type: Veldrin::Geometry::VldProxyComponentTopology");
@@ -218,46 +215,58 @@ TEST(VolumeProxies, TheFactoryMakesWhatADescriptionAsksFor)
     });
     auto destination = createObject();
     Geometry::vldProxyFactory(*source, *destination);
-    EXPECT_EQ(support::names(destination->keys()), (std::vector<std::string>{"comp", "tree", "dens"}));
     auto const volume = Geometry::move_object_to_vld_volume(*destination);
     ASSERT_TRUE(volume);
-    EXPECT_EQ(volume->component<VoxelTopology<SmallTiles>>("comp")->elementCount(), 0u);
     auto const container = volume->component<Container<SmallTiles>>("tree");
     ASSERT_TRUE(container);
     EXPECT_EQ(container->voxelSize(), 0.125f);
-    EXPECT_TRUE(container->checkConsistency(true));
+    EXPECT_EQ(container->topology(), volume->component<VoxelTopology<SmallTiles>>("comp"));
     auto const made = volume->component<Channel<SmallTiles>>("dens");
     ASSERT_TRUE(made);
     EXPECT_EQ(*made->defaultValue().get<Math::float3>(), (Math::float3{1, 2, 3}));
     EXPECT_NE(made->values<Math::float3>(), nullptr);
     EXPECT_EQ(made->initializer(), DataElementInitializerType::Nearest);
-    EXPECT_EQ(made->containerName(), "tree");
+
+    // What is not given is read as wide tiles of voxels of size 1.
+    auto plain = createObject();
+    Geometry::vldProxyFactory(*description([](Object&, Object&, Object&) {}), *plain);
+    EXPECT_EQ(support::names(plain->keys()), (std::vector<std::string>{"comp", "tree", "dens"}));
+    auto const wide = Geometry::move_object_to_vld_volume(*plain)->component<Container<WideTiles>>("tree");
+    EXPECT_TRUE(wide && wide->voxelSize() == 1);
 }
 
 TEST(VolumeProxies, TheFactoryPassesOverWhatItCannotMakeAndWhatHangsOnThat)
 {
+    enum Part { Component, Range, Data };
     struct Case {
-        char const* name;
-        std::vector<std::string> made;
-        void (*change)(Object& component, Object& range, Object& data);
+        std::size_t madeCount; // of component, range and data
+        Part part;
+        char const* key;
+        Nexil::Any value;
     };
-    std::vector<std::string> const all{"comp", "tree", "dens"};
     std::vector<Case> const cases{
-        {"nothing given", all, [](Object&, Object&, Object&) {}},
-        {"another width", {}, [](Object& c, Object&, Object&) { setProperty(c, "voxelTileWidth", 2u); }},
-        {"a width that is no number", {}, [](Object& c, Object&, Object&) { setProperty(c, "voxelTileWidth", "5"); }},
-        {"another offset", {}, [](Object& c, Object&, Object&) { setProperty(c, "voxelOffsetType", 1u); }},
-        {"no voxel size", {"comp"}, [](Object&, Object& r, Object&) { setProperty(r, "voxelSize", 0.0f); }},
-        {"an endless voxel size", {"comp"}, [](Object&, Object& r, Object&) { setProperty(r, "voxelSize", 1e300); }},
-        {"a text as default", {"comp", "tree"}, [](Object&, Object&, Object& d) { setProperty(d, "default", "text"); }},
-        {"data that targets the component",
-         {"comp", "tree"},
-         [](Object&, Object&, Object& d) { setProperty(d, "target", Nexil::String("comp")); }},
+        {0, Component, "voxelTileWidth", 2u},
+        {0, Component, "voxelTileWidth", Nexil::String("5")},
+        {0, Component, "voxelOffsetType", 1u},
+        {0, Component, "voxelOffsetType", false},
+        {1, Range, "voxelSize", 0.0f},
+        {1, Range, "voxelSize", 1e300},
+        {2, Data, "default", Nexil::String("text")},
+        {2, Data, "interpolation_mode", 1}, // so that it is no data
+        {2, Data, "target", Nexil::String("comp")},
     };
     for (Case const& c : cases) {
+        auto const source = description([&](Object& component, Object& range, Object& data) {
+            (c.part == Component ? component
+             : c.part == Range   ? range
+                                 : data)
+                .setPropertyAny(c.key, Nexil::Any(c.value));
+        });
         auto destination = createObject();
-        Geometry::vldProxyFactory(*description(c.change), *destination);
-        EXPECT_EQ(support::names(destination->keys()), c.made) << c.name;
+        Geometry::vldProxyFactory(*source, *destination);
+        std::vector<std::string> expected{"comp", "tree", "dens"};
+        expected.resize(c.madeCount);
+        EXPECT_EQ(support::names(destination->keys()), expected) << c.key;
     }
 }
 

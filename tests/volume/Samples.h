@@ -33,13 +33,19 @@ Nexil::MutablePtr<VLD::Object> sphereVolume(int radius = 12)
     return volume;
 }
 
-/// Three points in two tiles, and a channel over them.
+/// Three points in two tiles, named "points".
+template <class Traits>
+auto points()
+{
+    Nexil::Array<unsigned int> order;
+    return VLD::TileTree3D::PointTopology<Traits>::build("points", {{0, 0, 0}, {40, 0, 0}, {0, 0, 1}}, 1, order);
+}
+
+/// The same with a channel over them.
 template <class Traits>
 void addPoints(VLD::Object& volume)
 {
-    Nexil::Array<unsigned int> order;
-    volume.addComponent(
-        VLD::TileTree3D::PointTopology<Traits>::build("points", {{0, 0, 0}, {40, 0, 0}, {0, 0, 1}}, 1, order));
+    volume.addComponent(points<Traits>());
     volume.addComponent(Nexil::makePtr<VLD::TileTree3D::Channel<Traits>>(
         "sizes", "points", Nexil::makePtr<Nexil::Array<float>>(Nexil::Array<float>{1, 2, 3}), 0.0f));
 }
