@@ -150,12 +150,13 @@ TYPED_TEST(Builders, ALevelSetSamplesADistanceAtEveryVoxelOfItsBox)
         float voxelSize, band;
         VoxelBox box;
     };
-    constexpr int kFar = 1 << 30;
+    constexpr int kFar = 1 << 30, kEnd = kCoordinateLimit;
     std::vector<Case> const cases{
         {"a sphere with a hollow of cells", {0.1, -0.2, 0.3}, 31, 1, 3, {{-40, -40, -40}, {80, 80, 80}}},
         {"cut by its box", {0, 0, 0}, 29, 1, 2, {{-7, -33, -9}, {50, 21, 44}}},
         {"small voxels", {1, 1, 1}, 0.5, 0.03f, 0.1f, {{10, 10, 10}, {47, 47, 47}}},
         {"far from zero", {-kFar, kFar, -kFar}, 11, 1, 3, {{-kFar - 16, kFar - 16, -kFar - 16}, {32, 32, 32}}},
+        {"at the limits", {kEnd - 9, kEnd - 9, 9 - kEnd}, 11, 1, 3, {{kEnd - 30, kEnd - 30, -kEnd}, {30, 30, 30}}},
         {"nothing in the box", {0, 0, 0}, 3, 1, 1, {{100, 100, 100}, {20, 20, 20}}},
         {"all of the box inside", {0, 0, 0}, 500, 1, 1, {{-20, -20, -20}, {50, 50, 50}}},
     };

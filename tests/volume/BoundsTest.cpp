@@ -19,88 +19,81 @@ template <class Traits>
 class VolumeBounds : public ::testing::Test {};
 TYPED_TEST_SUITE(VolumeBounds, support::BothConfigurations);
 
-/// Grows a box by each element's cube on its own.
-template <class Traits, class T, class IsContent>
-void growByEveryElement(Grid<Traits> const& grid, IsContent const& isContent, Box& box)
-{
-    auto const values = grid.channel->template values<T>();
-    double const s = grid.container->voxelSize();
-    for (unsigned int element = 0; element < values->size(); ++element) {
-        if (grid.topology->isCellWithLeaf(element) || !isContent((*values)[element]))
-            continue;
-        VoxelCube const cube = grid.topology->elementCube(element);
-        for (int const step : {0, cube.width}) {
-            auto at = [&](int v) { return static_cast<float>((double(v) + step) * s); };
-            box.extend({at(cube.origin.x), at(cube.origin.y), at(cube.origin.z)});
-        }
-    }
-}
-
-/// Volumes of any size anywhere, of few values or many, which are mostly one and sometimes any of `values`.
-template <class Traits, class T, class IsContent>
-void expectBounds(char const* channelName, std::vector<T> const& values, IsContent const& isContent)
-{
-    for (unsigned int seed = 0; seed < 40; ++seed) {
-        SCOPED_TRACE(seed);
-        std::mt19937 random(seed);
-        auto oneOf = [&](auto const& choices) { return choices[random() % std::size(choices)]; };
+/// A volume of few or many voxels anywhere, and the box that a loop over its elements finds.
+template <class Traits>
+class DrawnVolume {
+public:
+    explicit DrawnVolume(unsigned int seed) : random_(seed)
+    {
         int const starts[] = {0, -57, 1 << 30, -(1 << 30)}, spreads[] = {2, 20, 60, 500};
-        Coordinate const centre{oneOf(starts), oneOf(starts), oneOf(starts)};
+        Coordinate const start{oneOf(starts), oneOf(starts), oneOf(starts)};
         std::uniform_int_distribution<int> offset(-oneOf(spreads), 0);
-        float const voxelSizes[] = {0.1f, 1, 2};
-        T const mostly = oneOf(values);
-        Nexil::Array<Coordinate> voxels;
-        Nexil::Array<T> voxelValues;
-        for (int i = 0; i < 2000; ++i) {
-            voxels.push_back(centre + Coordinate{offset(random), offset(random), offset(random)});
-            voxelValues.push_back(random() % 100 == 0 ? oneOf(values) : mostly);
-        }
-        auto const grid = buildFromVoxels<Traits>({.channelName = channelName, .voxelSize = oneOf(voxelSizes)}, voxels,
-                                                  voxelValues, oneOf(values));
-        Box expected;
-        growByEveryElement<Traits, T>(grid, isContent, expected);
-        auto volume = VLD::createObject();
-        ASSERT_TRUE(grid.addTo(*volume));
-        support::onThreadCounts([&] {
-            Box box;
-            EXPECT_TRUE(GeometryAlgorithms::volumeBounds(*volume, *grid.container, *grid.topology, box));
-            EXPECT_EQ(box, expected);
-        });
-        Box box;
-        GeometryAlgorithms::getVolumeBounds(*Geometry::move_vld_volume_to_object(*volume), box);
-        EXPECT_EQ(box, expected);
+        for (int i = 0; i < 2000; ++i)
+            voxels_.push_back(start + Coordinate{offset(random_), offset(random_), offset(random_)});
     }
-}
 
-TYPED_TEST(VolumeBounds, AreThoseOfALoopOverAllElements)
+    /// Adds a channel of what is mostly one and sometimes any of the values.
+    template <class T, class IsContent>
+    void add(char const* channelName, std::vector<T> const& values, IsContent const& isContent)
+    {
+        T const mostly = oneOf(values);
+        Nexil::Array<T> drawn;
+        for (std::uint64_t i = 0; i < voxels_.size(); ++i)
+            drawn.push_back(random_() % 100 == 0 ? oneOf(values) : mostly);
+        auto const grid =
+            buildFromVoxels<Traits>({.channelName = channelName, .voxelSize = 0.1f}, voxels_, drawn, oneOf(values));
+        volume->addComponent(grid.topology);
+        volume->addComponent(grid.container);
+        volume->addComponent(grid.channel);
+        auto const elements = grid.channel->template values<T>();
+        for (unsigned int element = 0; element < elements->size(); ++element) {
+            if (grid.topology->isCellWithLeaf(element) || !isContent((*elements)[element]))
+                continue;
+            VoxelCube const cube = grid.topology->elementCube(element);
+            for (int const step : {0, cube.width}) {
+                auto at = [&](int v) { return static_cast<float>((double(v) + step) * double(0.1f)); };
+                box.extend({at(cube.origin.x), at(cube.origin.y), at(cube.origin.z)});
+            }
+        }
+    }
+
+    Nexil::MutablePtr<VLD::Object> volume = VLD::createObject();
+    Box box{{-9, 0, 0}, {0, 0, 2}};
+
+private:
+    template <class Choices>
+    auto oneOf(Choices const& choices)
+    {
+        return choices[random_() % std::size(choices)];
+    }
+
+    std::mt19937 random_;
+    Nexil::Array<Coordinate> voxels_;
+};
+
+TYPED_TEST(VolumeBounds, GrowABoxLikeALoopOverAllElements)
 {
     float const infinity = std::numeric_limits<float>::infinity();
-    expectBounds<TypeParam, float>("voxel_signed_distance",
-                                   std::vector<float>{3, -1, -0.0f, 1e-30f, std::nanf(""), -infinity},
-                                   [](float v) { return v <= 0; });
-    expectBounds<TypeParam, double>("voxel_fog_density",
-                                    std::vector<double>{0.5, -0.0, -1, 1e-300, std::nan(""), infinity},
-                                    [](double v) { return v > 0; });
-}
-
-TYPED_TEST(VolumeBounds, UniteBothChannelsAndGrowTheBoxThatIsGiven)
-{
-    using Traits = TypeParam;
-    auto volume = VLD::createObject();
-    auto const grid = support::sphere<Traits>({.channelName = "voxel_signed_distance"}, 5);
-    grid.addTo(*volume);
-    Nexil::Array<float> fog;
-    fog.resize(grid.topology->elementCount());
-    unsigned int const element = grid.topology->findElement({5, 5, 5});
-    ASSERT_NE(element, kNoElement);
-    fog[element] = 1;
-    VoxelCube const cube = grid.topology->elementCube(element);
-    auto const high = static_cast<float>(cube.origin.x + cube.width);
-    volume->addComponent(Nexil::makePtr<Channel<Traits>>("voxel_fog_density", "voxel_tile_tree",
-                                                         Nexil::makePtr<Nexil::Array<float>>(std::move(fog)), 0.0f));
-    Box box{{-9, 0, 0}, {0, 0, 2}};
-    EXPECT_TRUE(GeometryAlgorithms::volumeBounds(*volume, *grid.container, *grid.topology, box));
-    EXPECT_EQ(box, (Box{{-9, -5, -5}, {high, high, high}}));
+    for (unsigned int seed = 0; seed < 60; ++seed) {
+        SCOPED_TRACE(seed);
+        DrawnVolume<TypeParam> drawn(seed);
+        Box const before = drawn.box;
+        if (seed % 3 != 0)
+            drawn.add("voxel_signed_distance", std::vector<float>{3, -1, -0.0f, 1e-30f, std::nanf(""), -infinity},
+                      [](float v) { return v <= 0; });
+        if (seed % 3 != 1)
+            drawn.add("voxel_fog_density", std::vector{0.5, -0.0, -1.0, 1e-300, std::nan(""), double(infinity)},
+                      [](double v) { return v > 0; });
+        auto const container = drawn.volume->template component<Container<TypeParam>>("voxel_tile_tree");
+        support::onThreadCounts([&] {
+            Box box = before;
+            EXPECT_TRUE(GeometryAlgorithms::volumeBounds(*drawn.volume, *container, *container->topology(), box));
+            EXPECT_EQ(box, drawn.box);
+        });
+        Box box = before;
+        GeometryAlgorithms::getVolumeBounds(*Geometry::move_vld_volume_to_object(*drawn.volume), box);
+        EXPECT_EQ(box, drawn.box);
+    }
 }
 
 TYPED_TEST(VolumeBounds, PassOverWhatDoesNotBelongToTheContainer)

@@ -188,85 +188,75 @@ TEST(VolumeProxies, WhatIsTakenOutOfTheWrongObjectNamesItsType)
               "Could not find VLD component channel from proxy of type: Veldrin::Geometry::VldProxyComponentChannel");
 }
 
-/// "comp" with a range "tree" and data "dens" over it, changed by `change(component, range, data)`.
-template <class Change>
-Nexil::MutablePtr<Object> description(Change const& change)
+enum Part { Component, Range, Data };
+
+struct Change {
+    Part part;
+    char const* key;
+    Nexil::Any value;
+};
+
+/// What the factory makes of "comp" with a range "tree" and data "dens" over it, with the changes.
+Nexil::MutablePtr<Object> made(std::vector<Change> const& changes)
 {
-    auto component = createObject(), range = createObject(), data = createObject(), source = createObject();
-    Geometry::populateComponentGeoProperty(7, *component);
-    Geometry::populateRangeGeoProperty(nullptr, "comp", *range);
-    Geometry::createDataGeoProperty<float>(0.25f, "tree", nullptr, *data);
-    change(*component, *range, *data);
-    setProperty(*source, "comp", std::move(component));
-    setProperty(*source, "tree", std::move(range));
-    setProperty(*source, "dens", std::move(data));
-    return source;
+    auto source = createObject(), destination = createObject();
+    Nexil::MutablePtr<Object> parts[] = {createObject(), createObject(), createObject()};
+    Geometry::populateComponentGeoProperty(7, *parts[Component]);
+    Geometry::populateRangeGeoProperty(nullptr, "comp", *parts[Range]);
+    Geometry::createDataGeoProperty<float>(0.25f, "tree", nullptr, *parts[Data]);
+    for (Change const& change : changes)
+        parts[change.part]->setPropertyAny(change.key, Nexil::Any(change.value));
+    setProperty(*source, "comp", std::move(parts[Component]));
+    setProperty(*source, "tree", std::move(parts[Range]));
+    setProperty(*source, "dens", std::move(parts[Data]));
+    Geometry::vldProxyFactory(*source, *destination);
+    return destination;
 }
 
 TEST(VolumeProxies, TheFactoryMakesWhatADescriptionAsksFor)
 {
-    auto const source = description([](Object& component, Object& range, Object& data) {
-        setProperty(component, "voxelTileWidth", 2u);
-        setProperty(component, "voxelTileDataWidth", 4);
-        setProperty(component, "voxelOffsetType", 0ull);
-        setProperty(range, "voxelSize", 0.125);
-        setProperty(data, "default", Math::float3{1, 2, 3});
-        setProperty(data, "interpolation_mode", DataInterpolationMode::Nearest);
-    });
-    auto destination = createObject();
-    Geometry::vldProxyFactory(*source, *destination);
-    auto const volume = Geometry::move_object_to_vld_volume(*destination);
+    auto const volume =
+        Geometry::move_object_to_vld_volume(*made({{Component, "voxelTileWidth", 2u},
+                                                   {Component, "voxelTileDataWidth", 4},
+                                                   {Component, "voxelOffsetType", 0ull},
+                                                   {Range, "voxelSize", 0.125},
+                                                   {Data, "default", Math::float3{1, 2, 3}},
+                                                   {Data, "interpolation_mode", DataInterpolationMode::Nearest}}));
     ASSERT_TRUE(volume);
     auto const container = volume->component<Container<SmallTiles>>("tree");
     ASSERT_TRUE(container);
     EXPECT_EQ(container->voxelSize(), 0.125f);
     EXPECT_EQ(container->topology(), volume->component<VoxelTopology<SmallTiles>>("comp"));
-    auto const made = volume->component<Channel<SmallTiles>>("dens");
-    ASSERT_TRUE(made);
-    EXPECT_EQ(*made->defaultValue().get<Math::float3>(), (Math::float3{1, 2, 3}));
-    EXPECT_NE(made->values<Math::float3>(), nullptr);
-    EXPECT_EQ(made->initializer(), DataElementInitializerType::Nearest);
+    auto const channel = volume->component<Channel<SmallTiles>>("dens");
+    ASSERT_TRUE(channel);
+    EXPECT_EQ(*channel->defaultValue().get<Math::float3>(), (Math::float3{1, 2, 3}));
+    EXPECT_NE(channel->values<Math::float3>(), nullptr);
+    EXPECT_EQ(channel->initializer(), DataElementInitializerType::Nearest);
 
     // What is not given is read as wide tiles of voxels of size 1.
-    auto plain = createObject();
-    Geometry::vldProxyFactory(*description([](Object&, Object&, Object&) {}), *plain);
-    EXPECT_EQ(support::names(plain->keys()), (std::vector<std::string>{"comp", "tree", "dens"}));
-    auto const wide = Geometry::move_object_to_vld_volume(*plain)->component<Container<WideTiles>>("tree");
+    auto const wide = Geometry::move_object_to_vld_volume(*made({}))->component<Container<WideTiles>>("tree");
     EXPECT_TRUE(wide && wide->voxelSize() == 1);
 }
 
 TEST(VolumeProxies, TheFactoryPassesOverWhatItCannotMakeAndWhatHangsOnThat)
 {
-    enum Part { Component, Range, Data };
-    struct Case {
-        std::size_t madeCount; // of component, range and data
-        Part part;
-        char const* key;
-        Nexil::Any value;
+    std::vector<std::pair<std::size_t, Change>> const cases{
+        // how many of the three are made
+        {0, {Component, "voxelTileWidth", 2u}},
+        {0, {Component, "voxelTileWidth", Nexil::String("5")}},
+        {0, {Component, "voxelOffsetType", 1u}},
+        {0, {Component, "voxelOffsetType", false}},
+        {1, {Range, "voxelSize", 0.0f}},
+        {1, {Range, "voxelSize", 1e300}},
+        {2, {Data, "default", Nexil::String("text")}},
+        {2, {Data, "interpolation_mode", 1}}, // so that it is no data
+        {2, {Data, "target", Nexil::String("comp")}},
+        {3, {Data, "default", 1u}},
     };
-    std::vector<Case> const cases{
-        {0, Component, "voxelTileWidth", 2u},
-        {0, Component, "voxelTileWidth", Nexil::String("5")},
-        {0, Component, "voxelOffsetType", 1u},
-        {0, Component, "voxelOffsetType", false},
-        {1, Range, "voxelSize", 0.0f},
-        {1, Range, "voxelSize", 1e300},
-        {2, Data, "default", Nexil::String("text")},
-        {2, Data, "interpolation_mode", 1}, // so that it is no data
-        {2, Data, "target", Nexil::String("comp")},
-    };
-    for (Case const& c : cases) {
-        auto const source = description([&](Object& component, Object& range, Object& data) {
-            (c.part == Component ? component
-             : c.part == Range   ? range
-                                 : data)
-                .setPropertyAny(c.key, Nexil::Any(c.value));
-        });
-        auto destination = createObject();
-        Geometry::vldProxyFactory(*source, *destination);
+    for (auto const& [count, change] : cases) {
         std::vector<std::string> expected{"comp", "tree", "dens"};
-        expected.resize(c.madeCount);
-        EXPECT_EQ(support::names(destination->keys()), expected) << c.key;
+        expected.resize(count);
+        EXPECT_EQ(support::names(made({change})->keys()), expected) << change.key;
     }
 }
 

@@ -55,9 +55,8 @@ namespace {
             if (!channel)
                 continue;
             Nexil::String const target = channel->containerName();
-            // A container that found no place above has no proxy to be targeted.
-            if (!volume.component<PointTopology<Traits>>(target) &&
-                (!volume.component<Container<Traits>>(target) || !object.hasProperty(target)))
+            // Where that container found no place above, nothing is made of the volume at all.
+            if (!volume.component<PointTopology<Traits>>(target) && !volume.component<Container<Traits>>(target))
                 continue;
             store<VldProxyComponentChannel>(object, name, Nexil::Ptr<ChannelBase>(std::move(channel)), target);
             ++stored;
