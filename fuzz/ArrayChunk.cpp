@@ -5,13 +5,14 @@
 #include <support/Streams.h>
 
 #include <blosc.h>
+#include <msgpack.hpp>
 
 #include <algorithm>
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
+#include <sstream>
 #include <string>
-#include <vector>
 
 extern "C" std::size_t LLVMFuzzerMutate(std::uint8_t* data, std::size_t size, std::size_t maxSize);
 
@@ -28,45 +29,27 @@ void check(bool condition)
         std::abort();
 }
 
-void putNumber(std::string& item, std::uint64_t number, int byteCount)
+/// What write(packer) packs.
+template <class Write>
+std::string packed(Write const& write)
 {
-    for (int shift = 8 * (byteCount - 1); shift >= 0; shift -= 8)
-        item += static_cast<char>(number >> shift);
+    std::ostringstream stream;
+    msgpack::packer<std::ostream> packer(stream);
+    write(packer);
+    return stream.str();
 }
 
-std::string number(std::uint64_t value)
+template <class Packer>
+void packBytes(Packer& packer, std::string const& bytes)
 {
-    std::string item = "\xcf";
-    putNumber(item, value, 8);
-    return item;
+    packer.pack_bin(static_cast<std::uint32_t>(bytes.size()));
+    packer.pack_bin_body(bytes.data(), static_cast<std::uint32_t>(bytes.size()));
 }
 
-std::string text(std::string const& value)
+template <class Packer>
+void packFrame(Packer& packer, unsigned int code, std::uint64_t value)
 {
-    std::string item = "\xdb";
-    putNumber(item, value.size(), 4);
-    return item + value;
-}
-
-std::string binary(std::string const& value)
-{
-    std::string item = "\xc6";
-    putNumber(item, value.size(), 4);
-    return item + value;
-}
-
-std::string list(std::vector<std::string> const& items)
-{
-    std::string item = "\xdd";
-    putNumber(item, items.size(), 4);
-    for (auto const& each : items)
-        item += each;
-    return item;
-}
-
-std::string numberFrame(unsigned int code, std::uint64_t value)
-{
-    return list({number(code), number(value)});
+    packer.pack_array(2).pack(code).pack(value);
 }
 
 /// The stream whose one array the input describes.
@@ -80,24 +63,30 @@ std::string streamOf(std::uint8_t const* data, std::size_t size)
     std::string const bytes(reinterpret_cast<char const*>(data + kHeadSize), size - kHeadSize);
     // One chunk, or two with the cut anywhere.
     auto const cut = packing & 2 ? bytes.size() * (packing >> 2) / 64 : bytes.size();
-    auto const chunks =
-        cut < bytes.size() ? list({binary(bytes.substr(0, cut)), binary(bytes.substr(cut))}) : list({binary(bytes)});
-    auto const payload = list({number(count), chunks});
     bool const isBare = version < 3 || (code >= 12 && code < 120);
-    auto const object = list({text("p"), list({number(code), isBare ? payload : list({number(0), payload})})});
-
-    std::vector<std::string> head{text("file_identifier"), numberFrame(2, 6611198),   text("file_version"),
-                                  numberFrame(2, version), text("compression_level"), numberFrame(6, packing & 1)};
-    if (version > 3) {
-        head.push_back(text("serialize_handles"));
-        head.push_back(list({number(10), "\xc2"}));
-    }
-    auto const header = list(head);
+    auto const object = packed([&](auto& packer) {
+        packer.pack_array(2).pack("p").pack_array(2).pack(code);
+        if (!isBare)
+            packer.pack_array(2).pack(0);
+        packer.pack_array(2).pack(count).pack_array(cut < bytes.size() ? 2 : 1);
+        packBytes(packer, bytes.substr(0, cut));
+        if (cut < bytes.size())
+            packBytes(packer, bytes.substr(cut));
+    });
+    auto const header = packed([&](auto& packer) {
+        packer.pack_array(version > 3 ? 8 : 6);
+        packFrame(packer.pack("file_identifier"), 2, 6611198);
+        packFrame(packer.pack("file_version"), 2, version);
+        packFrame(packer.pack("compression_level"), 6, packing & 1);
+        if (version > 3)
+            packer.pack("serialize_handles").pack_array(2).pack(10).pack(false);
+    });
     if (version < 5)
         return header + object;
-    auto const item = list({number(362), object});
+    auto const item = packed([](auto& packer) { packer.pack_array(2).pack(362); }) + object;
     auto const position = header.size() + 9;
-    return header + number(position + item.size()) + item + number(position) + number(1);
+    return header + packed([&](auto& packer) { packer.pack_fix_uint64(position + item.size()); }) + item +
+           packed([&](auto& packer) { packer.pack(position).pack(1); });
 }
 
 } // namespace

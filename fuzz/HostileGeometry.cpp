@@ -3,6 +3,9 @@
 
 #include "InputBytes.h"
 
+#include <faults/Operations.h>
+#include <support/Geometry.h>
+
 #include <tbb/global_control.h>
 #include <veldrin/veldrin.h>
 
@@ -102,108 +105,15 @@ Nexil::MutablePtr<Object> geometryFrom(InputBytes& bytes)
     return made;
 }
 
-std::string dumpOf(Object const& object)
+void runOnVolumes(support::Sample const& sample)
 {
-    struct Sink : Geometry::Internal::DebugDumpInterface {
-        void write(char const* text, std::uint64_t length) override { dump.append(text, length); }
-        std::string dump;
-    } sink;
-    Geometry::Internal::debugDumpToStream(sink, object, 1000);
-    return std::move(sink.dump);
-}
-
-void runOnMesh(Object const& mesh, InputBytes& bytes, bool hasSmallCounts)
-{
-    Nexil::Array<Math::float3> normals;
-    GeometryAlgorithms::computeMeshFaceNormals(mesh, normals);
-    for (int weights = 0; weights < 4; ++weights)
-        GeometryAlgorithms::computeMeshVertexNormals(mesh, weights & 1, weights & 2, normals);
-    Nexil::Array<Geometry::Mesh::FaceEdge> edges;
-    Nexil::Array<Geometry::Mesh::FaceEdge> pointFaces;
-    Nexil::Array<unsigned int> offsets;
-    auto const normalIndices = bytes.array([&] { return bytes.index(); });
-    float const maxAngle = bytes.number();
-    if (!hasSmallCounts)
-        return;
-    if (!GeometryAlgorithms::buildFaceVertexAdjacency(mesh, edges, pointFaces, offsets, nullptr))
-        check(edges.empty() && pointFaces.empty() && offsets.empty());
-    Nexil::Array<unsigned int> groups;
-    unsigned int groupCount = 0;
-    GeometryAlgorithms::computeMeshNormalsTopology(mesh, *normalIndices, maxAngle, groups, groupCount, nullptr);
-    for (unsigned int const group : groups)
-        check(group < groupCount || group == Geometry::kInvalidIndex);
-    Geometry::Mesh::HalfEdgeDataStructure const table(mesh);
-    std::uint64_t counted = 0;
-    table.forEachEdge(0, table.pointCount(), [&](Geometry::Mesh::HalfEdgeDataStructure::Edge const& edge) {
-        ++counted;
-        check(table.findEdge(edge.upper, edge.lower).faceCount == edge.faceCount);
-    });
-    check(counted == table.edgeCount());
-    auto const betti = Geometry::Mesh::bettiNumbers(mesh);
-    int const components = Geometry::Mesh::connectedComponents(mesh);
-    check(betti.x == components || components < 0);
-    check(Geometry::Mesh::eulerCharacteristic(mesh, table) == Geometry::Mesh::eulerCharacteristic(mesh));
-    (void)Geometry::Mesh::diagnose(mesh);
-}
-
-void runOnStrands(Object const& strands)
-{
-    Nexil::Array<Math::float3> tangents;
-    Nexil::Array<float> lengths;
-    Nexil::Array<float> segments;
-    Nexil::Array<float> ratios;
-    (void)GeometryAlgorithms::computeStrandTangents(strands, tangents, nullptr);
-    (void)GeometryAlgorithms::computeStrandLength(strands, lengths, segments, nullptr);
-    (void)GeometryAlgorithms::computeStrandRatio(strands, ratios, nullptr);
-}
-
-void convertSelections(Object const& geometry, InputBytes& bytes)
-{
-    using Geometry::TagConversionStyle;
-    auto const mask = bytes.array([&] { return (bytes.byte() & 1) != 0; });
-    bool ok = false;
-    for (auto const style : {TagConversionStyle::AnyElement, TagConversionStyle::AllElements}) {
-        (void)Geometry::faceVerticesToFaces(geometry, *mask, style, &ok);
-        (void)Geometry::pointsToFaces(geometry, *mask, style, &ok);
-        (void)Geometry::pointsToStrands(geometry, *mask, style, &ok);
-        for (auto const* from : {Geometry::sPointComp, Geometry::sFaceComp, Geometry::sFaceVertexComp, "nowhere"})
-            for (auto const* to : {Geometry::sPointComp, Geometry::sFaceComp, Geometry::sStrandComp})
-                (void)Geometry::convertTagData(geometry, mask, from, to, style, &ok);
-    }
-    (void)Geometry::faceVerticesToPoints(geometry, *mask, &ok);
-    (void)Geometry::facesToFaceVertices(geometry, *mask, &ok);
-    (void)Geometry::facesToPoints(geometry, *mask, &ok);
-    (void)Geometry::pointsToFaceVertices(geometry, *mask, &ok);
-    (void)Geometry::strandsToPoints(geometry, *mask, &ok);
-}
-
-void resolveTags(Object const& geometry, std::string_view text)
-{
-    for (auto const* common : {"a", "b ^ !c - d", "f(a) + p(b)", "v(*)", "s(a) - p(d)"}) {
-        Geometry::TagResolver resolver;
-        Nexil::String component;
-        check(resolver.parses(common).ok || !resolver.parses(common).message.empty());
-        check(static_cast<bool>(resolver.resolve(geometry, component)));
-    }
-    Geometry::TagResolver resolver;
-    Nexil::String component;
-    if (resolver.parses(Nexil::String(text)))
-        check(static_cast<bool>(resolver.resolve(geometry, component)));
-}
-
-/// Gives the verdict of the first failure and of all of them, which have to agree.
-template <class Validator>
-void validate(Object const& object)
-{
-    Validator validator;
-    auto const status = validator.validate(object);
-    auto const failures = validator.findFailures(object);
-    check(static_cast<bool>(status) == failures.empty());
-    check(failures.empty() || failures[0].status.message == status.message);
+    for (auto const& operation : support::operations())
+        if (operation.takes == support::Takes::Volumes || operation.takes == support::Takes::Anything)
+            (void)operation.run(sample);
 }
 
 template <class Traits>
-void runOnTiles(InputBytes& bytes)
+void runOnTiles(support::Sample& sample, InputBytes& bytes)
 {
     using namespace VLD::TileTree3D;
     auto const coordinate = [&] {
@@ -232,38 +142,32 @@ void runOnTiles(InputBytes& bytes)
     auto values = bytes.array([&] { return bytes.number(); });
     volume->addComponent(
         Nexil::makePtr<Channel<Traits>>(Geometry::sVoxelFogDensity, Geometry::sVoxelTileTree, std::move(values), 0.0f));
-    auto const geometry = Geometry::move_vld_volume_to_object(*volume);
-    if (!geometry)
-        return;
-    validate<Geometry::VolumeValidator>(*geometry);
-    validate<Geometry::GeoValidator>(*geometry);
-    Math::bbox<Math::float3, float> box;
-    GeometryAlgorithms::getVolumeBounds(*geometry, box);
-    (void)Geometry::move_object_to_vld_volume(*geometry);
+    sample.smallVolume = sample.wideVolume = Geometry::move_vld_volume_to_object(*volume);
+    if (sample.smallVolume)
+        runOnVolumes(sample);
 }
 
-void runOnDescriptions(Object const& geometry)
+/// What takes numbers besides the geometry.
+void runOnNumbersOfTheInput(Object const& geometry, InputBytes& bytes)
 {
-    auto proxies = createObject();
-    Geometry::vldProxyFactory(geometry, *proxies);
-    validate<Geometry::VolumeValidator>(*proxies);
-    Math::bbox<Math::float3, float> box;
-    GeometryAlgorithms::getVolumeBounds(*proxies, box);
-    GeometryAlgorithms::getVolumeBounds(geometry, box);
-    (void)Geometry::shallow_copy_object_to_vld_volume(geometry);
-}
-
-void askAccessors(Object const& geometry)
-{
-    for (auto const& key : geometry.keys()) {
-        (void)Geometry::getTargetChain(geometry, key);
-        (void)Geometry::getTargetComponent(geometry, key);
-        (void)Geometry::getDataGeoProperty(geometry, key);
-        (void)Geometry::getRangeGeoPropIndices(geometry, key);
-        (void)Geometry::getGeoPropsByTarget(geometry, key);
-        (void)Geometry::getUniqueGeoPropName(key, geometry);
-    }
-    (void)Geometry::getGeoPropsByName(geometry, "*_*");
+    auto const normalIndices = bytes.array([&] { return bytes.index(); });
+    Nexil::Array<unsigned int> groups;
+    unsigned int groupCount = 0;
+    GeometryAlgorithms::computeMeshNormalsTopology(geometry, *normalIndices, bytes.number(), groups, groupCount,
+                                                   nullptr);
+    for (unsigned int const group : groups)
+        check(group < groupCount || group == Geometry::kInvalidIndex);
+    bool ok = false;
+    auto const mask = bytes.array([&] { return (bytes.byte() & 1) != 0; });
+    for (auto const* from : {Geometry::sPointComp, Geometry::sFaceComp, Geometry::sFaceVertexComp, "nowhere"})
+        for (auto const* to : {Geometry::sPointComp, Geometry::sFaceComp, Geometry::sStrandComp})
+            for (auto const style :
+                 {Geometry::TagConversionStyle::AnyElement, Geometry::TagConversionStyle::AllElements})
+                (void)Geometry::convertTagData(geometry, mask, from, to, style, &ok);
+    Geometry::TagResolver resolver;
+    Nexil::String component;
+    if (resolver.parses(Nexil::String(bytes.rest())))
+        check(static_cast<bool>(resolver.resolve(geometry, component)));
 }
 
 } // namespace
@@ -272,31 +176,33 @@ extern "C" int LLVMFuzzerTestOneInput(std::uint8_t const* data, std::size_t size
 {
     // One thread: the same input takes the same way at each run, and more of them are tried.
     static tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, 1);
+    static support::Sample const whole;
+    support::Sample sample = whole;
     InputBytes bytes(data, size);
     if (bytes.byte() == 'v') {
-        runOnTiles<VLD::TileTree3D::SmallTiles>(bytes);
-        runOnTiles<VLD::TileTree3D::WideTiles>(bytes);
+        runOnTiles<VLD::TileTree3D::SmallTiles>(sample, bytes);
+        runOnTiles<VLD::TileTree3D::WideTiles>(sample, bytes);
         return 0;
     }
-    auto const geometry = geometryFrom(bytes);
-    auto const before = dumpOf(*geometry);
+    Nexil::Ptr<Object> const geometry = geometryFrom(bytes);
+    auto const before = support::dump(*geometry, 1000);
+    sample.mesh = sample.strands = geometry;
     bool hasSmallCounts = true;
     for (auto const* name :
          {Geometry::sPointComp, Geometry::sFaceComp, Geometry::sFaceVertexComp, Geometry::sStrandComp})
         hasSmallCounts = hasSmallCounts && Geometry::getElementCount(*geometry, name) <= kMostCounted;
-    validate<Geometry::GeoValidator>(*geometry);
-    validate<Geometry::MeshValidator>(*geometry);
-    validate<Geometry::PointCloudValidator>(*geometry);
-    validate<Geometry::StrandValidator>(*geometry);
-    validate<Geometry::VolumeValidator>(*geometry);
-    runOnMesh(*geometry, bytes, hasSmallCounts);
-    if (hasSmallCounts) {
-        runOnStrands(*geometry);
-        convertSelections(*geometry, bytes);
-        resolveTags(*geometry, bytes.rest());
-    }
-    runOnDescriptions(*geometry);
-    askAccessors(*geometry);
-    check(dumpOf(*geometry) == before);
+    for (auto const& operation : support::operations())
+        if (operation.takes == support::Takes::Anything ||
+            (hasSmallCounts && operation.takes == support::Takes::SmallCounts))
+            (void)operation.run(sample);
+    if (hasSmallCounts)
+        runOnNumbersOfTheInput(*geometry, bytes);
+    // What describes volumes, and volumes made after descriptions.
+    auto proxies = createObject();
+    Geometry::vldProxyFactory(*geometry, *proxies);
+    sample.smallVolume = geometry;
+    sample.wideVolume = std::move(proxies);
+    runOnVolumes(sample);
+    check(support::dump(*geometry, 1000) == before);
     return 0;
 }

@@ -2,47 +2,16 @@
 
 #include "StreamRepair.h"
 
+#include <support/Geometry.h>
 #include <support/StreamDescription.h>
 #include <support/Streams.h>
 
-#include <veldrin/geometry/DebugDump.h>
-
 #include <cstdint>
 #include <cstdlib>
-#include <unordered_map>
 
 extern "C" std::size_t LLVMFuzzerMutate(std::uint8_t* data, std::size_t size, std::size_t maxSize);
 
 namespace {
-
-using ObjectPtr = Nexil::Ptr<Veldrin::Object>;
-
-constexpr std::uint64_t kMostDumped = 20000;
-
-/// Number of objects that a dump would show, which follows every path: an object met twice is shown twice.
-std::uint64_t shownObjects(ObjectPtr const& object, std::unordered_map<void const*, std::uint64_t>& known)
-{
-    if (!object)
-        return 1;
-    auto const [place, isNew] = known.try_emplace(object.get(), 0);
-    if (!isNew)
-        return place->second;
-    std::uint64_t count = 1;
-    for (auto const& key : object->keys()) {
-        auto const value = object->getProperty(key);
-        if (auto const* held = value.get<ObjectPtr>())
-            count += shownObjects(*held, known);
-        if (auto const* list = value.get<Nexil::Ptr<Nexil::Array<ObjectPtr>>>(); list && *list)
-            for (auto const& element : **list)
-                count = std::min(kMostDumped + 1, count + shownObjects(element, known));
-    }
-    return known[object.get()] = std::min(kMostDumped + 1, count);
-}
-
-class Discard : public Veldrin::Geometry::Internal::DebugDumpInterface {
-public:
-    void write(char const*, std::uint64_t) override {}
-};
 
 void check(bool condition)
 {
@@ -69,12 +38,9 @@ extern "C" int LLVMFuzzerTestOneInput(std::uint8_t const* data, std::size_t size
     if (!first.isRead)
         return 0;
 
-    Discard sink;
-    std::unordered_map<void const*, std::uint64_t> known;
     for (auto const& object : first.objects)
-        if (object && shownObjects(object, known) <= kMostDumped)
-            Veldrin::Geometry::Internal::debugDumpToStream(sink, *object, 3);
-
+        if (object)
+            (void)support::dump(*object, 3);
     std::string const description = support::describeObjects(first.objects);
     for (int const level : {0, 9}) {
         auto const again = support::read(support::written(first.objects, level));

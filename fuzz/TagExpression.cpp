@@ -1,10 +1,8 @@
 /// Any text as a tag expression: the whole input, and each of its lines. What parses is dumped, parsed again and
 /// resolved, both ways, on a small geometry whose tags must stay as they are.
 
-#include <veldrin/geometry/GeoProperties.h>
-#include <veldrin/geometry/Population.h>
-#include <veldrin/object/Properties.h>
-#include <veldrin/tags/TagData.h>
+#include <tags/TagSample.h>
+
 #include <veldrin/tags/TagParser.h>
 #include <veldrin/tags/TagResolver.h>
 
@@ -12,12 +10,10 @@
 #include <cstdlib>
 #include <sstream>
 #include <string_view>
-#include <vector>
 
 namespace {
 
 using namespace Veldrin;
-using MaskPtr = Nexil::Ptr<Nexil::Array<bool>>;
 
 void check(bool condition)
 {
@@ -25,43 +21,16 @@ void check(bool condition)
         std::abort();
 }
 
-/// A cube with tags of one letter, of all components, one of them too short.
-class TaggedCube {
-public:
-    TaggedCube() : cube_(createObject())
-    {
-        Geometry::populateCubeMesh(1, *cube_);
-        std::pair<char const*, char const*> const tags[] = {
-            {"a", Geometry::sPointComp},  {"b", Geometry::sFaceComp},   {"c", Geometry::sFaceVertexComp},
-            {"d", Geometry::sStrandComp}, {"ab", Geometry::sPointComp}, {"a.b", "other"}};
-        for (auto const& [name, component] : tags) {
-            Nexil::Array<bool> mask;
-            mask.resize(name[1] == 'b' ? 3 : Geometry::getElementCount(*cube_, component));
-            for (std::uint64_t i = 0; i < mask.size(); ++i)
-                mask[i] = (i * i + static_cast<unsigned char>(name[0])) % 3 == 0;
-            original_.push_back(mask);
-            stored_.push_back(Nexil::makePtr<Nexil::Array<bool>>(std::move(mask)));
-            auto tag = createObject();
-            Geometry::populateTag(component, stored_.back(), *tag);
-            setProperty(*cube_, name, std::move(tag));
-        }
-    }
-
-    [[nodiscard]] Object const& object() const { return *cube_; }
-
-    [[nodiscard]] bool isUnchanged() const
-    {
-        for (std::size_t i = 0; i < stored_.size(); ++i)
-            if (!(*stored_[i] == original_[i]))
-                return false;
-        return true;
-    }
-
-private:
-    Nexil::MutablePtr<Object> cube_;
-    std::vector<MaskPtr> stored_;
-    std::vector<Nexil::Array<bool>> original_;
-};
+/// A cube with tags of one letter, of all components, one of them too short and one of none.
+TagSample const kSample{8,
+                        {{0, 1, 2, 3}, {4, 7, 6, 5}, {2, 6, 7, 3}, {0, 4, 5, 1}, {4, 0, 3, 7}, {1, 5, 6, 2}},
+                        {3, 0, 5},
+                        {{"a", "point_component", "01101101"},
+                         {"b", "face_component", "100101"},
+                         {"c", "face_vertex_component", "100100100110111001011001"},
+                         {"d", "strand_component", "101"},
+                         {"ab", "point_component", "110"},
+                         {"a.b", "other", "01"}}};
 
 std::string dumpOf(std::string_view text)
 {
@@ -72,7 +41,7 @@ std::string dumpOf(std::string_view text)
 
 void run(std::string_view text)
 {
-    static TaggedCube const cube;
+    static auto const cube = kSample.build();
     Geometry::TagResolver resolver;
     auto const status = resolver.parses(Nexil::String(text));
     check(status.ok == status.message.empty() && status.byteOffset <= text.size());
@@ -84,10 +53,11 @@ void run(std::string_view text)
     check(again.parses(Nexil::String(std::string_view(dump))).ok);
     Nexil::String component;
     Nexil::String componentAgain;
-    auto const mask = resolver.resolve(cube.object(), component);
-    auto const maskAgain = again.resolve(cube.object(), componentAgain);
+    auto const mask = resolver.resolve(*cube, component);
+    auto const maskAgain = again.resolve(*cube, componentAgain);
     check(mask && maskAgain && *mask == *maskAgain && component == componentAgain);
-    check(cube.isUnchanged());
+    for (auto const& tag : kSample.tags)
+        check(flagsOf(support::arrayIn<bool>(*cube, tag.name.c_str())) == tag.flags);
 }
 
 } // namespace

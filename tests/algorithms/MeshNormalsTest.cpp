@@ -6,8 +6,6 @@
 
 #include <gtest/gtest.h>
 
-#include <array>
-#include <bit>
 #include <cmath>
 #include <cstring>
 #include <limits>
@@ -26,43 +24,12 @@ using Normals = Nexil::Array<float3>;
 // The oracle, in single precision with the promised order of operations, or in double.
 
 template <class Real>
-using Vector = std::array<Real, 3>;
-
-template <class Real>
-Vector<Real> operator-(Vector<Real> const& a, Vector<Real> const& b)
-{
-    return {a[0] - b[0], a[1] - b[1], a[2] - b[2]};
-}
-
-template <class Real>
-Vector<Real> operator*(Vector<Real> const& v, Real factor)
-{
-    return {v[0] * factor, v[1] * factor, v[2] * factor};
-}
-
-template <class Real>
-void add(Vector<Real>& sum, Vector<Real> const& v)
-{
-    sum = {sum[0] + v[0], sum[1] + v[1], sum[2] + v[2]};
-}
-
-template <class Real>
-Vector<Real> crossOf(Vector<Real> const& a, Vector<Real> const& b)
-{
-    return {a[1] * b[2] - a[2] * b[1], a[2] * b[0] - a[0] * b[2], a[0] * b[1] - a[1] * b[0]};
-}
-
-template <class Real>
-Real dotOf(Vector<Real> const& a, Vector<Real> const& b)
-{
-    return a[0] * b[0] + a[1] * b[1] + a[2] * b[2];
-}
+using Vector = Veldrin::Math::Vector<Real, 3>;
 
 template <class Real>
 Vector<Real> unitOr(Vector<Real> const& v, Vector<Real> const& fallback)
 {
-    Real const length = std::sqrt(dotOf(v, v));
-    return length > Real(std::numeric_limits<float>::min()) ? v * (1 / length) : fallback;
+    return length(v) > Real(std::numeric_limits<float>::min()) ? v * (1 / length(v)) : fallback;
 }
 
 template <class Real>
@@ -80,7 +47,7 @@ struct Polygon {
     {
         Vector<Real> fan{};
         for (std::size_t k = 2; k < face.size(); ++k)
-            add(fan, crossOf(at(k - 1) - at(0), at(k) - at(0)));
+            fan = fan + cross(at(k - 1) - at(0), at(k) - at(0));
         return unitOr(fan, {0, 1, 0});
     }
 
@@ -88,14 +55,14 @@ struct Polygon {
     {
         Vector<Real> loop{};
         for (std::size_t k = 0; k < face.size(); ++k)
-            add(loop, crossOf(at(k), at(k + 1)));
-        return Real(0.5) * std::sqrt(dotOf(loop, loop));
+            loop = loop + cross(at(k), at(k + 1));
+        return Real(0.5) * length(loop);
     }
 
     Real angle(std::size_t k) const
     {
         auto const edge = [&](std::size_t to) { return unitOr(at(to) - at(k), at(to) - at(k)); };
-        return std::acos(std::clamp(dotOf(edge(k + face.size() - 1), edge(k + 1)), Real(-1), Real(1)));
+        return std::acos(std::clamp(dot(edge(k + face.size() - 1), edge(k + 1)), Real(-1), Real(1)));
     }
 
     bool isWhole() const { return face.size() > 2 && *std::ranges::max_element(face) < points.size(); }
@@ -117,16 +84,16 @@ struct Sums {
             Real const area = byArea ? polygon.area() : 1;
             for (std::size_t k = 0; k < face.size(); ++k) {
                 Real const angle = byAngle ? polygon.angle(k) : 1;
-                add(normals[face[k]], polygon.normal() * area * angle);
+                normals[face[k]] = normals[face[k]] + polygon.normal() * area * angle;
                 weights[face[k]] += area * (angle + 1); // an angle near 0 is as uncertain as the root of its cosine
             }
         }
     }
 };
 
-bool haveSameBits(float3 const& found, Vector<float> const& expected)
+bool haveSameBits(float3 const& found, float3 const& expected)
 {
-    return std::bit_cast<Vector<unsigned int>>(found) == std::bit_cast<Vector<unsigned int>>(expected);
+    return std::memcmp(&found, &expected, sizeof found) == 0;
 }
 
 /// Leaves what is no number in the memory that is handed out next.
@@ -160,7 +127,7 @@ void expectSums(unsigned int pointCount, unsigned int spread, unsigned int faceS
     computeMeshFaceNormals(*mesh, ofFaces);
     for (std::size_t f = 0; f < faces.size(); ++f) {
         Polygon<float> const polygon{points, faces[f]};
-        ASSERT_TRUE(haveSameBits(ofFaces[f], polygon.isWhole() ? polygon.normal() : Vector<float>{0, 1, 0})) << f;
+        ASSERT_TRUE(haveSameBits(ofFaces[f], polygon.isWhole() ? polygon.normal() : float3{0, 1, 0})) << f;
     }
     auto mixed = faces;
     mixed.push_back({0, 1});
@@ -183,8 +150,8 @@ void expectSums(unsigned int pointCount, unsigned int spread, unsigned int faceS
             if (faceSize == 0 || sums.weights[p] == 0)
                 continue;
             Vector<double> const found{first[p].x, first[p].y, first[p].z};
-            auto const error = found * std::sqrt(dotOf(sums.normals[p], sums.normals[p])) - sums.normals[p];
-            ASSERT_LT(std::sqrt(dotOf(error, error)), 1e-3 * sums.weights[p]) << p;
+            auto const error = found * length(sums.normals[p]) - sums.normals[p];
+            ASSERT_LT(length(error), 1e-3 * sums.weights[p]) << p;
         }
         support::onThreadCounts([&] {
             soilFreeMemory(4 * faces.size());
@@ -344,7 +311,7 @@ TEST(NormalsTopology, GroupsAreThoseThatAFloodAcrossSmoothEdgesFinds)
             FaceEdge const edge{static_cast<unsigned int>(i / 4), static_cast<unsigned int>(i % 4)};
             isSmooth.push_back(across[i].face != kInvalidIndex &&
                                across[4 * across[i].face + across[i].corner] == edge &&
-                               std::acos(std::clamp(dotOf(normalOf(edge.face), normalOf(across[i].face)), -1.0, 1.0)) <
+                               std::acos(std::clamp(dot(normalOf(edge.face), normalOf(across[i].face)), -1.0, 1.0)) <
                                    double(maxAngle));
         }
         auto const expected = floodGroups(across, isSmooth);

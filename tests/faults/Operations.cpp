@@ -11,6 +11,7 @@
 #include <sstream>
 #include <stdexcept>
 #include <thread>
+#include <tuple>
 
 namespace support {
 
@@ -74,31 +75,25 @@ namespace {
         return all;
     }
 
-    /// An array that held something before, as callers' arrays do.
-    template <class T>
-    class Output {
-    public:
-        Output() { values_.resize(3); }
-        Nexil::Array<T>& operator*() noexcept { return values_; }
-        [[nodiscard]] bool isAsBeforeOrEmpty() const noexcept { return values_.empty() || values_.size() == 3; }
-
-    private:
-        Nexil::Array<T> values_;
-    };
-
-    /// Runs compute(), which answers whether the outputs were filled, and gives their digests.
-    template <class Compute, class... T>
-    std::string fill(Compute const& compute, Output<T>&... outputs)
+    /// Runs compute(arrays of T...), which answers whether they were filled, on arrays that held something before, as
+    /// callers' arrays do, and gives their digests.
+    template <class... T, class Compute>
+    std::string fill(Compute const& compute)
     {
-        try {
-            if (!compute())
-                return "";
-        } catch (...) {
-            if (!(outputs.isAsBeforeOrEmpty() && ...))
-                throw std::logic_error("an output was left half changed");
-            throw;
-        }
-        return (digest(*outputs) + ...);
+        auto const run = [&](auto&... outputs) {
+            (outputs.resize(3), ...);
+            try {
+                if (!compute(outputs...))
+                    return std::string();
+            } catch (...) {
+                if (!((outputs.empty() || outputs.size() == 3) && ...))
+                    throw std::logic_error("an output was left half changed");
+                throw;
+            }
+            return (digest(outputs) + ...);
+        };
+        std::tuple<Nexil::Array<T>...> outputs;
+        return std::apply(run, outputs);
     }
 
     /// Runs change(object), which either does all of it or, when memory runs out, nothing.
@@ -115,12 +110,21 @@ namespace {
         }
     }
 
+    void expect(bool agrees)
+    {
+        if (!agrees)
+            throw std::logic_error("two answers contradict each other");
+    }
+
     std::string validate(Sample const& sample)
     {
         std::string result;
         auto const judge = [&](auto validator, Object const& object) {
-            result += validator.validate(object).message.view();
-            for (auto const& failure : validator.findFailures(object))
+            auto const message = validator.validate(object).message;
+            result += message.view();
+            auto const failures = validator.findFailures(object);
+            expect(failures.empty() ? message.empty() : failures[0].status.message == message);
+            for (auto const& failure : failures)
                 result += failure.status.message.view();
             result += ".";
         };
@@ -137,60 +141,57 @@ namespace {
     std::string normals(Sample const& sample)
     {
         std::string result;
-        for (int kind = 0; kind < 5; ++kind) {
-            Output<Math::float3> output;
-            result += fill(
-                [&] {
-                    if (kind == 4)
-                        GeometryAlgorithms::computeMeshFaceNormals(*sample.mesh, *output);
-                    else
-                        GeometryAlgorithms::computeMeshVertexNormals(*sample.mesh, kind & 1, kind & 2, *output);
-                    return true;
-                },
-                output);
-        }
+        for (int kind = 0; kind < 5; ++kind)
+            result += fill<Math::float3>([&](auto& output) {
+                if (kind == 4)
+                    GeometryAlgorithms::computeMeshFaceNormals(*sample.mesh, output);
+                else
+                    GeometryAlgorithms::computeMeshVertexNormals(*sample.mesh, kind & 1, kind & 2, output);
+                return true;
+            });
         return result;
     }
 
     std::string normalsTopology(Sample const& sample)
     {
-        Output<unsigned int> groups;
-        unsigned int count = 0;
-        return fill(
-            [&] {
-                GeometryAlgorithms::computeMeshNormalsTopology(*sample.mesh, {}, 0.5f, *groups, count, nullptr);
-                return true;
-            },
-            groups);
+        return fill<unsigned int>([&](auto& groups) {
+            unsigned int count = 0;
+            GeometryAlgorithms::computeMeshNormalsTopology(*sample.mesh, {}, 0.5f, groups, count, nullptr);
+            for (unsigned int const group : groups)
+                expect(group < count || group == kInvalidIndex || count == 0); // none: left as they were
+            return true;
+        });
     }
 
     std::string adjacency(Sample const& sample)
     {
-        Output<FaceEdge> edges;
-        Output<FaceEdge> pointFaces;
-        Output<unsigned int> offsets;
-        return fill(
-            [&] {
-                return GeometryAlgorithms::buildFaceVertexAdjacency(*sample.mesh, *edges, *pointFaces, *offsets,
-                                                                    nullptr);
-            },
-            edges, pointFaces, offsets);
+        return fill<FaceEdge, FaceEdge, unsigned int>([&](auto&... outputs) {
+            return GeometryAlgorithms::buildFaceVertexAdjacency(*sample.mesh, outputs..., nullptr);
+        });
     }
 
     std::string edges(Sample const& sample)
     {
         Geometry::Mesh::HalfEdgeDataStructure const table(*sample.mesh);
-        unsigned int uses = table.findEdge(0, 1).faceCount;
-        table.forEachEdge(0, table.pointCount(), [&](auto const& edge) { uses += edge.faceCount; });
-        return std::to_string(uses) + " " + std::to_string(Geometry::Mesh::eulerCharacteristic(*sample.mesh, table));
+        std::uint64_t edgeCount = 0;
+        std::uint64_t uses = 0;
+        table.forEachEdge(0, table.pointCount(), [&](auto const& edge) {
+            ++edgeCount;
+            uses += edge.faceCount;
+            expect(table.findEdge(edge.upper, edge.lower).faceCount == edge.faceCount);
+        });
+        expect(edgeCount == table.edgeCount());
+        int const euler = Geometry::Mesh::eulerCharacteristic(*sample.mesh, table);
+        expect(euler == Geometry::Mesh::eulerCharacteristic(*sample.mesh));
+        return std::to_string(uses) + " " + std::to_string(euler);
     }
 
     std::string invariants(Sample const& sample)
     {
         auto const betti = Geometry::Mesh::bettiNumbers(*sample.mesh);
-        return std::to_string(Geometry::Mesh::eulerCharacteristic(*sample.mesh)) +
-               std::to_string(Geometry::Mesh::connectedComponents(*sample.mesh)) +
-               std::to_string(betti.x + 10 * betti.z);
+        int const components = Geometry::Mesh::connectedComponents(*sample.mesh);
+        expect(betti.x == components || components < 0);
+        return std::to_string(components) + " " + std::to_string(betti.y) + " " + std::to_string(betti.z);
     }
 
     std::string diagnosis(Sample const& sample)
@@ -200,18 +201,15 @@ namespace {
 
     std::string strandMeasures(Sample const& sample)
     {
-        Output<Math::float3> tangents;
-        Output<float> lengths;
-        Output<float> segments;
-        Output<float> ratios;
-        return fill([&] { return GeometryAlgorithms::computeStrandTangents(*sample.strands, *tangents, nullptr); },
-                    tangents) +
-               fill(
-                   [&] {
-                       return GeometryAlgorithms::computeStrandLength(*sample.strands, *lengths, *segments, nullptr);
-                   },
-                   lengths, segments) +
-               fill([&] { return GeometryAlgorithms::computeStrandRatio(*sample.strands, *ratios, nullptr); }, ratios);
+        auto const& strands = *sample.strands;
+        return fill<Math::float3>([&](auto& tangents) {
+                   return GeometryAlgorithms::computeStrandTangents(strands, tangents, nullptr);
+               }) +
+               fill<float, float>([&](auto&... lengths) {
+                   return GeometryAlgorithms::computeStrandLength(strands, lengths..., nullptr);
+               }) +
+               fill<float>(
+                   [&](auto& ratios) { return GeometryAlgorithms::computeStrandRatio(strands, ratios, nullptr); });
     }
 
     std::string conversions(Sample const& sample)
@@ -509,24 +507,24 @@ std::string Sample::description() const
 std::vector<Operation> const& operations()
 {
     static std::vector<Operation> const all{
-        {"validate", validate},
-        {"normals", normals},
-        {"normals topology", normalsTopology},
-        {"adjacency", adjacency},
-        {"edges", edges},
-        {"invariants", invariants},
-        {"diagnosis", diagnosis},
-        {"strand measures", strandMeasures},
-        {"conversions", conversions},
-        {"tags", tags},
-        {"volume to object", volumeToObject},
-        {"object to volume", objectToVolume},
-        {"volume bounds", volumeBounds},
+        {"validate", validate, Takes::Anything},
+        {"normals", normals, Takes::Anything},
+        {"normals topology", normalsTopology, Takes::SmallCounts},
+        {"adjacency", adjacency, Takes::SmallCounts},
+        {"edges", edges, Takes::SmallCounts},
+        {"invariants", invariants, Takes::SmallCounts},
+        {"diagnosis", diagnosis, Takes::SmallCounts},
+        {"strand measures", strandMeasures, Takes::SmallCounts},
+        {"conversions", conversions, Takes::SmallCounts},
+        {"tags", tags, Takes::SmallCounts},
+        {"volume to object", volumeToObject, Takes::Volumes},
+        {"object to volume", objectToVolume, Takes::Volumes},
+        {"volume bounds", volumeBounds, Takes::Volumes},
         {"volumes made", volumesMade},
         {"proxies", proxies},
-        {"accessors", accessors},
+        {"accessors", accessors, Takes::Anything},
         {"population", population},
-        {"dumps", dumps},
+        {"dumps", dumps, Takes::Anything},
         {"save at level 0", save<0>},
         {"save at level 9", save<9>},
         {"save of handles", saveHandles},

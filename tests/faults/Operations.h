@@ -29,11 +29,17 @@ struct Sample {
     [[nodiscard]] std::string description() const;
 };
 
+/// What an operation may be run on besides a sample as it was made: any volumes, a mesh and strands of any numbers at all, or
+/// of element counts that are not huge, where outputs are as large as these say.
+enum class Takes { Sample, Volumes, SmallCounts, Anything };
+
 struct Operation {
     char const* name;
     /// Runs it and tells the result: the same at each run. Whatever it allocates it gives back. "" where the function says
-    /// that it failed. Outputs that are left neither as before nor empty, when it throws, are told by std::logic_error.
+    /// that it failed. Outputs that are left neither as before nor empty, when it throws, and answers that contradict each
+    /// other are told by std::logic_error.
     std::function<std::string(Sample const&)> run;
+    Takes takes = Takes::Sample;
 };
 
 [[nodiscard]] std::vector<Operation> const& operations();

@@ -101,11 +101,6 @@ Objects objectsOf(Sample const& sample)
     return objects;
 }
 
-std::string dumpOf(Nexil::Ptr<Object> const& object)
-{
-    return object ? support::dump(*object) : "null";
-}
-
 TEST(StreamFailure, AtAnyReadOrSeekGivesOneMessageAndNoObject)
 {
     Sample const sample;
@@ -125,7 +120,8 @@ TEST(StreamFailure, AtAnyReadOrSeekGivesOneMessageAndNoObject)
             EXPECT_EQ(objects.size(), isRead ? whole.objects.size() : 0u);
             // A stream that refuses to seek may still be read from front to back.
             for (std::uint64_t i = 0; i < objects.size(); ++i)
-                EXPECT_EQ(dumpOf(objects[i]), dumpOf(whole.objects[i]));
+                EXPECT_TRUE(objects[i] ? support::dump(*objects[i]) == support::dump(*whole.objects[i])
+                                       : !whole.objects[i]);
             return isRead;
         });
         failEachOperation(stream, [&](FailingBuf& buffer) {

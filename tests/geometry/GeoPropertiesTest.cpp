@@ -111,24 +111,21 @@ TEST(GeoProperties, SettersCopyOnlyWhatIsShared)
         }
 }
 
-/// An object that never takes a property, and one that fails while it does.
+/// An object that never takes a property, or fails while it does.
 struct Stubborn : Object {
+    explicit Stubborn(bool fails) : isOutOfMemory(fails) {}
     bool setPropertyAny(Nexil::String const&, Nexil::Any&&) override
     {
-        if (isOutOfMemory)
-            throw std::bad_alloc();
-        return false;
+        return isOutOfMemory ? throw std::bad_alloc() : false;
     }
-    bool isOutOfMemory = false;
+    bool isOutOfMemory;
 };
 
 TEST(GeoProperties, ARefusedWritePutsTheOriginalBack)
 {
     for (bool const isOutOfMemory : {false, true})
         for (bool const isShared : {false, true}) {
-            auto stubborn = Nexil::makeMutable<Stubborn>();
-            stubborn->isOutOfMemory = isOutOfMemory;
-            ObjectPtr shared(std::move(stubborn));
+            ObjectPtr shared = Nexil::makePtr<Stubborn>(isOutOfMemory);
             auto const* const address = shared.get();
             auto const obj = createObject();
             setProperty(*obj, "part", shared);
@@ -140,7 +137,7 @@ TEST(GeoProperties, ARefusedWritePutsTheOriginalBack)
             else
                 EXPECT_FALSE(setElementCount("part", 1, *obj));
             EXPECT_EQ(support::part(*obj, "part").get(), address);
-            EXPECT_EQ(support::names(obj->keys()), (std::vector<std::string>{"part", "last"}));
+            EXPECT_THAT(support::names(obj->keys()), ElementsAre("part", "last"));
         }
 }
 
@@ -167,9 +164,7 @@ TEST(GeoProperties, ListingsKeepTheOrderOfTheKeys)
     EXPECT_EQ(support::names(getGeoPropNamesByTarget(*obj, sPointComp)),
               (std::vector<std::string>{"point_position", "misfit"}));
     EXPECT_THAT(support::names(getGeoPropNamesByTarget(*obj, "")), IsEmpty());
-    auto const parts = getGeoPropsByTarget(*obj, sFaceVertexComp);
-    ASSERT_EQ(parts.size(), 2u);
-    EXPECT_EQ(parts[1], support::part(*obj, "face_vertex_normal_index"));
+    EXPECT_EQ(getGeoPropsByTarget(*obj, sFaceVertexComp)[1], support::part(*obj, "face_vertex_normal_index"));
 
     auto const byName = [&](char const* pattern) { return support::names(getGeoPropsByName(*obj, pattern)); };
     EXPECT_THAT(byName("face*"), ElementsAre("face_vertex", "face_offset", "face_vertex_normal"));
@@ -238,12 +233,11 @@ TEST(GeoProperties, ChainsEndAtComponentsCyclesAndDanglingTargets)
     for (char const* name : {"lost", "fresh", "typed", "wrong", "c"})
         EXPECT_FALSE(getGeoPropTarget(*obj, *support::part(*obj, name))) << name;
 
-    auto const longObj = createObject();
     constexpr int length = 20000;
     for (int i = 0; i < length; ++i)
-        setProperty(*longObj, std::to_string(i).c_str(), targeting(std::to_string((i + 1) % length).c_str()));
-    EXPECT_EQ(getTargetChain(*longObj, "5").size(), static_cast<std::uint64_t>(length));
-    EXPECT_EQ(getTargetComponent(*longObj, "5"), "4");
+        setProperty(*obj, std::to_string(i).c_str(), targeting(std::to_string((i + 1) % length).c_str()));
+    EXPECT_EQ(getTargetChain(*obj, "5").size(), static_cast<std::uint64_t>(length));
+    EXPECT_EQ(getTargetComponent(*obj, "5"), "4");
 }
 
 TEST(GeoProperties, UniqueNamesStripTheDigitsThatTheRegularExpressionStrips)

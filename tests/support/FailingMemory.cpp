@@ -7,14 +7,13 @@
 #include <cstring>
 #include <new>
 
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-#    define HAS_OWN_MEMORY_FUNCTIONS 0
-#elif defined(__has_feature)
-#    if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer)
-#        define HAS_OWN_MEMORY_FUNCTIONS 0
-#    endif
+#if !defined(__has_feature)
+#    define __has_feature(feature) 0
 #endif
-#if !defined(HAS_OWN_MEMORY_FUNCTIONS)
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__) || __has_feature(address_sanitizer) || \
+    __has_feature(thread_sanitizer)
+#    define HAS_OWN_MEMORY_FUNCTIONS 0
+#else
 #    define HAS_OWN_MEMORY_FUNCTIONS 1
 #endif
 

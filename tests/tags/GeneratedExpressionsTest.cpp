@@ -216,8 +216,20 @@ private:
     std::mt19937 random_;
 };
 
+void expectSelected(Node const& node, std::string const& spelling, Object const& geometry, Selected const& expected)
+{
+    EXPECT_EQ(trees::treeOf(*trees::parseTagExpression(spelling)), treeOf(node)) << spelling;
+    Geometry::TagResolver resolver;
+    ASSERT_TRUE(resolver.parses(Nexil::String(std::string_view(spelling)))) << spelling;
+    Nexil::String component;
+    auto const mask = resolver.resolve(geometry, component);
+    EXPECT_EQ(component, kComponents[expected.rank]) << spelling;
+    EXPECT_TRUE(flagsOf(mask) == expected.flags) << spelling;
+}
+
 void checkExpressions(unsigned int seed, std::size_t size, int expressionCount)
 {
+    SCOPED_TRACE(seed);
     Generator generator(seed);
     TagSample const sample = generator.sample(size);
     Oracle const oracle(sample);
@@ -229,17 +241,9 @@ void checkExpressions(unsigned int seed, std::size_t size, int expressionCount)
         auto const node = generator.expression(sample, 5);
         auto const text = textOf(*node);
         Selected const expected = oracle.evaluate(*node);
+        expectSelected(*node, text, *geometry, expected);
         // The dump has fewer parentheses and the same tree.
-        auto const shorter = trees::dumpOf(*trees::parseTagExpression(text));
-        for (auto const& spelling : {text, shorter}) {
-            EXPECT_EQ(trees::treeOf(*trees::parseTagExpression(spelling)), treeOf(*node)) << spelling;
-            Geometry::TagResolver resolver;
-            ASSERT_TRUE(resolver.parses(Nexil::String(std::string_view(spelling)))) << spelling;
-            Nexil::String component;
-            auto const mask = resolver.resolve(*geometry, component);
-            EXPECT_EQ(component, kComponents[expected.rank]) << spelling;
-            EXPECT_TRUE(flagsOf(mask) == expected.flags) << "seed " << seed << ": " << spelling;
-        }
+        expectSelected(*node, trees::dumpOf(*trees::parseTagExpression(text)), *geometry, expected);
     }
     for (std::size_t i = 0; i < stored.size(); ++i) {
         EXPECT_EQ(support::arrayIn<bool>(*geometry, sample.tags[i].name.c_str()), stored[i]);
@@ -270,15 +274,9 @@ TEST(GeneratedExpressions, DeepOnesOfManyTasksSelectWhatTheOracleSelects)
         nest = std::make_shared<Node>(
             Node{"^+-"[i % 3], "", leaf(), i % 5 != 0 ? nest : std::make_shared<Node>(Node{'!', "", nest, nullptr})});
     }
-    for (auto const& node : {chain, nest}) {
-        Geometry::TagResolver resolver;
-        ASSERT_TRUE(
-            resolver.parses(Nexil::String(std::string_view(trees::dumpOf(*trees::parseTagExpression(textOf(*node)))))));
-        Nexil::String component;
-        auto const expected = oracle.evaluate(*node);
-        EXPECT_EQ(flagsOf(resolver.resolve(*geometry, component)), expected.flags);
-        EXPECT_EQ(component, kComponents[expected.rank]);
-    }
+    for (auto const& node : {chain, nest})
+        expectSelected(*node, trees::dumpOf(*trees::parseTagExpression(textOf(*node))), *geometry,
+                       oracle.evaluate(*node));
 }
 
 } // namespace
