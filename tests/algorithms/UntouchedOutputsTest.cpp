@@ -139,13 +139,15 @@ void expectCancelledAtAnyQuestion(Algorithm const& algorithm, Object const& obje
             wholeRun = questions;
         }
         EXPECT_GE(wholeRun, static_cast<int>(faceCount / kMostBetween));
-        for (int const questionCount : {0, 1, wholeRun / 2, wholeRun - 1 - static_cast<int>(threadCount)}) {
+        // Several threads cut the work otherwise each time: then only so many questions are certain.
+        int const late = threadCount == 1 ? wholeRun - 1 : static_cast<int>(faceCount / kMostBetween) - 1;
+        for (int const questionCount : {0, 1, late / 2, late}) {
             Outputs out(room);
             Hook const hook(questionCount);
             EXPECT_THROW((void)algorithm.run(object, out), std::runtime_error) << questionCount << " of " << wholeRun;
             EXPECT_EQ(out, Outputs()) << questionCount;
             // Every thread may be in a chunk of its own when the answer comes.
-            EXPECT_LE(questions, questionCount + 2 * static_cast<int>(threadCount));
+            EXPECT_LE(questions, questionCount + 4 * static_cast<int>(threadCount));
         }
     });
 }
