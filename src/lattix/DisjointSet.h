@@ -32,65 +32,27 @@ class VELDRIN_PLATFORM_API DisjointSet {
     static_assert(std::is_unsigned_v<Index>);
 
 public:
+    template <bool isAlone>
+    class Parents;
+
     /// Every element a set of its own. Errors: std::bad_alloc; std::runtime_error when the job is cancelled.
     explicit DisjointSet(std::uint64_t elementCount);
 
     [[nodiscard]] std::uint64_t size() const noexcept { return parents_.size(); }
 
     /// The least element of the set that `element`, below size(), belongs to.
-    [[nodiscard]] Index find(Index element) noexcept
-    {
-        Index parent = load(element);
-        while (parent != element) {
-            Index const grandparent = load(parent);
-            if (grandparent == parent)
-                return parent;
-            // A store that comes late sets an older ancestor: the path gets longer again, and stays right.
-            parentOf(element).store(grandparent, std::memory_order_relaxed);
-            element = grandparent;
-            parent = load(element);
-        }
-        return element;
-    }
+    [[nodiscard]] Index find(Index element) noexcept { return parents().find(element); }
 
     /// Makes the sets of two elements, both below size(), one.
     void unite(Index a, Index b) noexcept
     {
-        for (;;) {
-            a = find(a);
-            b = find(b);
-            if (a == b)
-                return;
-            Index expected = std::max(a, b);
-            if (parentOf(expected).compare_exchange_weak(expected, std::min(a, b), std::memory_order_relaxed))
-                return;
-        }
+        std::uint64_t linkCount = 0;
+        parents().unite(a, b, linkCount);
     }
 
-    /// Makes two sets one with a plain store, several times cheaper than the locked one of `unite`, and calls
-    /// onLink(root, lesserRoot) when they were two. Returns an element at or near the root: handed to the next call in the
-    /// place of `a`, it saves the way there.
-    ///
-    /// Two threads that link the same root at once lose one of the unions. They know it afterwards: no union was lost if
-    /// there have been size() - rootCount() links since the set was made. Otherwise `unite` has to be called for each pair
-    /// that onLink was told, which brings back what was lost. No thread may call `unite` beside this.
-    template <class OnLink>
-    Index uniteLoosely(Index a, Index b, OnLink const& onLink) noexcept(noexcept(onLink(a, b)))
-    {
-        // Most pairs of a mesh hang together already, under one parent.
-        Index const parent = load(a);
-        if (parent == load(b))
-            return parent;
-        a = find(parent);
-        b = find(b);
-        if (a == b)
-            return a;
-        Index const root = std::min(a, b);
-        Index const linked = std::max(a, b);
-        onLink(linked, root);
-        parentOf(linked).store(root, std::memory_order_relaxed);
-        return root;
-    }
+    /// The same operations and some more, for loops: of many threads, or of one that is alone with the set.
+    [[nodiscard]] Parents<false> parents() noexcept { return Parents<false>(parents_.data()); }
+    [[nodiscard]] Parents<true> parentsOfOneThread() noexcept { return Parents<true>(parents_.data()); }
 
     /// The least element of each set, in increasing order; as many as there are sets. In parallel, by ranges of 4096.
     /// No other thread may be uniting. Errors: std::bad_alloc; std::runtime_error when the job is cancelled.
@@ -100,13 +62,80 @@ public:
     [[nodiscard]] std::uint64_t rootCount() const;
 
 private:
-    [[nodiscard]] std::atomic_ref<Index> parentOf(Index element) noexcept
-    {
-        return std::atomic_ref<Index>(parents_.data()[element]);
-    }
-    [[nodiscard]] Index load(Index element) noexcept { return parentOf(element).load(std::memory_order_relaxed); }
-
     Nexil::Array<Index> parents_;
+};
+
+/// The parents of all elements, by their address alone: copied into a loop, it stays in a register. Elements are below the
+/// set's size; the set has to live.
+template <class Index>
+template <bool isAlone>
+class DisjointSet<Index>::Parents {
+public:
+    explicit Parents(Index* parents) noexcept : parents_(parents) {}
+
+    /// What an element hangs under, or itself where it is a root. Two that hang under one parent are in one set: a quick
+    /// question to ask first where that holds for most pairs.
+    [[nodiscard]] Index operator[](Index element) const noexcept { return at(element).load(std::memory_order_relaxed); }
+
+    [[nodiscard]] Index find(Index element) const noexcept
+    {
+        for (;;) {
+            Index const parent = (*this)[element];
+            if (parent == element)
+                return element;
+            Index const grandparent = (*this)[parent];
+            // Who is alone rather stores what is there already than mispredicts the branch; for others the store would take
+            // the cache line away.
+            if (!isAlone && grandparent == parent)
+                return parent;
+            // A store that comes late sets an older ancestor: the path gets longer again, and stays right.
+            at(element).store(grandparent, std::memory_order_relaxed);
+            element = grandparent;
+        }
+    }
+
+    /// Adds one to `linkCount` when there were two sets. Returns the root: handed to the next call in the place of `a`, it
+    /// saves the way there.
+    Index unite(Index a, Index b, std::uint64_t& linkCount) const noexcept
+    {
+        for (;;) {
+            a = find(a);
+            b = find(b);
+            if (a == b)
+                return a;
+            Index const root = std::min(a, b);
+            Index expected = std::max(a, b);
+            if (at(expected).compare_exchange_weak(expected, root, std::memory_order_relaxed)) {
+                ++linkCount;
+                return root;
+            }
+        }
+    }
+
+    /// The same with a plain store, several times cheaper than the locked one.
+    ///
+    /// Two threads that link the same root at once lose one of the unions. They know it afterwards: no union was lost if
+    /// there have been size() - rootCount() links since the set was made. Otherwise `unite` has to be called for all pairs
+    /// once more, which brings back what was lost. No thread may call `unite` beside this.
+    Index uniteLoosely(Index a, Index b, std::uint64_t& linkCount) const noexcept
+    {
+        a = find(a);
+        b = find(b);
+        if (a == b)
+            return a;
+        Index const root = std::min(a, b);
+        at(std::max(a, b)).store(root, std::memory_order_relaxed);
+        ++linkCount;
+        return root;
+    }
+
+private:
+    [[nodiscard]] std::atomic_ref<Index> at(Index element) const noexcept
+    {
+        return std::atomic_ref<Index>(parents_[element]);
+    }
+
+    Index* parents_;
 };
 
 extern template class DisjointSet<unsigned int>;

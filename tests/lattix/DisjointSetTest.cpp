@@ -67,50 +67,38 @@ TEST(DisjointSet, LooseUnionsAreTheSameOnOneThreadAndTellOnSeveralWhetherOneWasL
 {
     auto const pairs = randomPairs(2000, 4000, 3);
     auto const labels = leastLabels(2000, pairs);
-    Sets serial(2000);
+    Sets alone(2000);
     std::uint64_t linkCount = 0;
     for (auto const& [a, b] : pairs) {
-        unsigned int const near = serial.uniteLoosely(a, b, [&](unsigned int, unsigned int) { ++linkCount; });
-        EXPECT_TRUE(serial.find(near) == serial.find(a) && serial.find(near) == serial.find(b));
+        unsigned int const root = alone.parentsOfOneThread().uniteLoosely(a, b, linkCount);
+        EXPECT_TRUE(root == alone.find(a) && root == alone.find(b) && alone.parents()[root] == root);
     }
-    EXPECT_EQ(linkCount, serial.size() - serial.rootCount());
-    expectSets(serial, labels);
-    // Sets that say that nothing was lost must be right as they are, others once all links are made again.
-    for (int round = 0; round < 200; ++round) {
-        Sets sets(2000);
-        Pairs links[2];
-        auto const half = [&](std::size_t part) {
-            auto const onLink = [&](unsigned int a, unsigned int b) { links[part].emplace_back(a, b); };
-            for (std::size_t i = part; i < pairs.size(); i += 2)
-                sets.uniteLoosely(pairs[i].first, pairs[i].second, onLink);
-        };
-        std::thread other(half, 1);
-        half(0);
-        other.join();
-        if (links[0].size() + links[1].size() != sets.size() - sets.rootCount())
-            for (auto const& part : links)
-                for (auto const& [a, b] : part)
+    EXPECT_EQ(linkCount, alone.size() - alone.rootCount());
+    expectSets(alone, labels);
+    // Sets that say that nothing was lost must be right as they are, others once all unions are made again. Locked unions
+    // lose none.
+    for (int round = 0; round < 200; ++round)
+        for (bool const isLocked : {false, true}) {
+            Sets sets(2000);
+            std::uint64_t linkCounts[2] = {0, 0};
+            auto const half = [&](std::size_t part) {
+                std::uint64_t count = 0;
+                for (std::size_t i = part; i < pairs.size(); i += 2) {
+                    auto const [a, b] = pairs[i];
+                    isLocked ? sets.parents().unite(a, b, count) : sets.parents().uniteLoosely(a, b, count);
+                }
+                linkCounts[part] = count;
+            };
+            std::thread other(half, 1);
+            half(0);
+            other.join();
+            bool const isWhole = linkCounts[0] + linkCounts[1] == sets.size() - sets.rootCount();
+            EXPECT_TRUE(isWhole || !isLocked);
+            if (!isWhole)
+                for (auto const& [a, b] : pairs)
                     sets.unite(a, b);
-        expectSets(sets, labels);
-    }
-}
-
-TEST(DisjointSet, ALostUnionIsCountedAndComesBack)
-{
-    Sets sets(10);
-    Pairs links;
-    auto const keep = [&](unsigned int a, unsigned int b) { links.emplace_back(a, b); };
-    // Links the same root between the look at it and the store, as another thread may.
-    sets.uniteLoosely(9, 3, [&](unsigned int a, unsigned int b) {
-        keep(a, b);
-        sets.uniteLoosely(9, 5, keep);
-    });
-    EXPECT_NE(sets.find(9), sets.find(5));
-    EXPECT_NE(links.size(), sets.size() - sets.rootCount());
-    for (auto const& [a, b] : links)
-        sets.unite(a, b);
-    EXPECT_EQ(sets.find(9), 3u);
-    EXPECT_EQ(sets.find(5), 3u);
+            expectSets(sets, labels);
+        }
 }
 
 } // namespace

@@ -2,12 +2,14 @@
 
 #include <lattix/DisjointSet.h>
 #include <nexil/parallel/Parallel.h>
+#include <nexil/parallel/Scan.h>
 #include <veldrin/algorithms/internal/EdgePoints.h>
 #include <veldrin/algorithms/internal/MeshFaces.h>
 #include <veldrin/geometry/Prototypes.h>
 
 #include <algorithm>
-#include <vector>
+#include <cstdint>
+#include <functional>
 
 namespace Veldrin::Geometry::Mesh {
 
@@ -21,6 +23,11 @@ namespace {
         constexpr std::size_t kPoints = 16384;
     } // namespace grain
 
+    // A forest of so many points fits the cache that a core has for itself.
+    constexpr std::uint64_t kCachedPoints = std::uint64_t(1) << 18;
+    // What one thread does in some ten milliseconds, unasked whether the job is cancelled.
+    constexpr std::uint64_t kMostFacesOfOneThread = std::uint64_t(1) << 20;
+
     bool readMesh(Object const& mesh, MeshFaces& faces)
     {
         return Object::isA(mesh, *getMeshPrototype()) && faces.read(mesh);
@@ -32,62 +39,137 @@ namespace {
         return static_cast<int>(cut(faces.faceCount()) + (cut(faces.pointCount()) - cut(edges.edgeCount())));
     }
 
-    struct Link {
-        unsigned int root;
-        unsigned int lesserRoot;
+    /// The number of sets, once uniteLoosely(begin, end) has united [0, count) and told how many links that took. Where two
+    /// threads got into each other's way, uniteSafely(begin, end) does it again.
+    template <class UniteLoosely, class UniteSafely>
+    std::uint64_t countUnited(Sets const& sets, std::uint64_t count, std::size_t grain,
+                              UniteLoosely const& uniteLoosely, UniteSafely const& uniteSafely)
+    {
+        std::uint64_t const linkCount = parallel::reduceInOrder(
+            count, grain, std::uint64_t(0),
+            [&](std::size_t begin, std::size_t end, std::uint64_t) { return uniteLoosely(begin, end); }, std::plus<>());
+        std::uint64_t const rootCount = sets.rootCount();
+        if (linkCount == sets.size() - rootCount)
+            return rootCount;
+        parallel::forRange(count, grain, uniteSafely);
+        return sets.rootCount();
+    }
+
+    /// How the pairs of a face are united.
+    enum class Way {
+        AskFirst, ///< loosely, but looking first whether they hang under one parent: most do where faces are in order
+        Loosely,  ///< without locks
+        Locked    ///< for many threads that want the same roots
     };
 
-    /// Unites all pairs that unitePairs(begin, end, unite) hands to unite(a, b) over [0, count), and returns the number of
-    /// sets. What unite(a, b) returns may stand for either in the next call. Sets are linked without locks; only what was
-    /// linked is united once more, and only where two threads got into each other's way.
-    template <class UnitePairs>
-    std::uint64_t uniteAll(Sets& sets, std::uint64_t count, std::size_t grain, UnitePairs const& unitePairs)
+    template <class Parents>
+    bool hangTogether(Parents parents, unsigned int const* points, std::uint64_t count, std::uint64_t pointCount)
     {
-        std::vector<std::vector<Link>> links(count / grain + 1);
-        parallel::forRange(links.size(), 1, [&](std::size_t firstRange, std::size_t endRange) {
-            for (std::size_t range = firstRange; range < endRange; ++range) {
-                auto const onLink = [&found = links[range]](unsigned int root, unsigned int lesserRoot) {
-                    found.push_back({root, lesserRoot});
-                };
-                unitePairs(range * grain, std::min<std::uint64_t>(count, (range + 1) * grain),
-                           [&](unsigned int a, unsigned int b) { return sets.uniteLoosely(a, b, onLink); });
-            }
-        });
+        if (count == 0 || points[0] >= pointCount)
+            return false;
+        unsigned int const parent = parents[points[0]];
+        for (std::uint64_t i = 1; i < count; ++i)
+            if (points[i] >= pointCount || parents[points[i]] != parent)
+                return false;
+        return true;
+    }
+
+    /// Makes those of a face's points that there are one set, and adds how many links that took.
+    template <Way way, class Parents>
+    void uniteFace(Parents parents, unsigned int const* points, std::uint64_t count, std::uint64_t pointCount,
+                   std::uint64_t& linkCount)
+    {
+        // Every other triangle of a mesh has no point that is new, but hardly a larger polygon has none.
+        if (way == Way::AskFirst && count == 3 && hangTogether(parents, points, count, pointCount))
+            return;
+        std::uint64_t first = 0;
+        while (first < count && points[first] >= pointCount)
+            ++first;
+        if (first == count)
+            return;
+        unsigned int near = way == Way::AskFirst ? parents[points[first]] : points[first];
+        for (std::uint64_t i = first + 1; i < count; ++i) {
+            unsigned int const point = points[i];
+            if (point >= pointCount || (way == Way::AskFirst && parents[point] == near))
+                continue;
+            near = way == Way::Locked ? parents.unite(near, point, linkCount)
+                                      : parents.uniteLoosely(near, point, linkCount);
+        }
+    }
+
+    template <Way way, class Parents, class Ranges>
+    std::uint64_t uniteFaces(Parents parents, unsigned int const* points, std::uint64_t pointCount, Ranges ranges,
+                             std::uint64_t begin, std::uint64_t end)
+    {
         std::uint64_t linkCount = 0;
-        for (auto const& found : links)
-            linkCount += found.size();
-        std::uint64_t const roots = sets.rootCount();
-        if (linkCount == sets.size() - roots)
-            return roots;
-        parallel::forRange(links.size(), 1, [&](std::size_t firstRange, std::size_t endRange) {
-            for (std::size_t range = firstRange; range < endRange; ++range)
-                for (Link const& link : links[range])
-                    sets.unite(link.root, link.lesserRoot);
-        });
-        return sets.rootCount();
+        for (std::uint64_t face = begin; face < end; ++face) {
+            auto const [first, last] = ranges[face];
+            uniteFace<way>(parents, points + first, last - first, pointCount, linkCount);
+        }
+        return linkCount;
+    }
+
+    /// How a mesh lies in memory, judged by a few of its faces.
+    struct Order {
+        bool isByFace = false;  ///< faces share points with the next one more often than chance has it
+        bool isByPoint = false; ///< most faces have points with near numbers
+    };
+
+    template <class Ranges>
+    Order judgeOrder(MeshFaces const& faces, Ranges const& ranges)
+    {
+        constexpr std::uint64_t kLookedAt = 64;
+        constexpr unsigned int kFar = 1024;
+        unsigned int const* const points = faces.points();
+        std::uint64_t sharingCount = 0;
+        std::uint64_t nearCount = 0;
+        for (std::uint64_t i = 0; i < kLookedAt && faces.faceCount() > 1; ++i) {
+            std::uint64_t const face = (faces.faceCount() - 1) * i / kLookedAt;
+            IndexRange const range = ranges[face];
+            IndexRange const next = ranges[face + 1];
+            if (range.end - range.begin < 2 || next.end - next.begin < 2)
+                continue;
+            auto const [lower, upper] = std::minmax(points[range.begin], points[range.begin + 1]);
+            nearCount += upper - lower <= kFar ? 1 : 0;
+            auto const* const end = points + std::min(range.end, range.begin + 4);
+            auto const* const nextEnd = points + std::min(next.end, next.begin + 4);
+            sharingCount += std::find_first_of(points + range.begin, end, points + next.begin, nextEnd) != end ? 1 : 0;
+        }
+        return {sharingCount > kLookedAt / 8, nearCount > kLookedAt / 2};
+    }
+
+    template <class Ranges>
+    std::uint64_t components(MeshFaces const& faces, Ranges const& ranges)
+    {
+        Sets sets(faces.pointCount());
+        Order const order = judgeOrder(faces, ranges);
+        // Threads that want the same cache lines all the time are slower than one that has them all to itself.
+        bool const isAlone = parallel::threadCount() == 1 || (!order.isByPoint && faces.pointCount() <= kCachedPoints &&
+                                                              faces.faceCount() <= kMostFacesOfOneThread);
+        auto const unite = [&]<Way way>(std::integral_constant<Way, way>, auto parents, std::uint64_t begin,
+                                        std::uint64_t end) {
+            return uniteFaces<way>(parents, faces.points(), faces.pointCount(), ranges, begin, end);
+        };
+        auto const askFirst = std::integral_constant<Way, Way::AskFirst>();
+        auto const loosely = std::integral_constant<Way, Way::Loosely>();
+        auto const locked = std::integral_constant<Way, Way::Locked>();
+        auto const uniteAny = [&](std::uint64_t begin, std::uint64_t end) {
+            if (isAlone)
+                return order.isByFace ? unite(askFirst, sets.parentsOfOneThread(), begin, end)
+                                      : unite(loosely, sets.parentsOfOneThread(), begin, end);
+            return order.isByFace ? unite(askFirst, sets.parents(), begin, end)
+                                  : unite(locked, sets.parents(), begin, end);
+        };
+        auto const uniteLocked = [&](std::uint64_t begin, std::uint64_t end) {
+            unite(locked, sets.parents(), begin, end);
+        };
+        return countUnited(sets, faces.faceCount(), isAlone ? kMostFacesOfOneThread : grain::kFaces, uniteAny,
+                           uniteLocked);
     }
 
     int components(MeshFaces const& faces)
     {
-        unsigned int const* const points = faces.points();
-        std::uint64_t const pointCount = faces.pointCount();
-        Sets sets(pointCount);
-        std::uint64_t const count = faces.withRanges([&](auto const& ranges) {
-            return uniteAll(sets, faces.faceCount(), grain::kFaces,
-                            [&](std::size_t begin, std::size_t end, auto const& unite) {
-                                for (std::size_t face = begin; face < end; ++face) {
-                                    IndexRange const range = ranges[face];
-                                    std::uint64_t i = range.begin;
-                                    while (i < range.end && points[i] >= pointCount)
-                                        ++i;
-                                    if (i == range.end)
-                                        continue;
-                                    for (unsigned int first = points[i++]; i < range.end; ++i)
-                                        if (points[i] < pointCount)
-                                            first = unite(first, points[i]);
-                                }
-                            });
-        });
+        std::uint64_t const count = faces.withRanges([&](auto const& ranges) { return components(faces, ranges); });
         return static_cast<int>(static_cast<std::uint32_t>(count));
     }
 
@@ -98,17 +180,27 @@ namespace {
         auto const border = static_cast<unsigned int>(pointCount);
         auto const isOnEdge = pointsOnEdges(edges);
         Sets sets(pointCount + 1);
-        std::uint64_t const count =
-            uniteAll(sets, pointCount, grain::kPoints, [&](std::size_t begin, std::size_t end, auto const& unite) {
-                edges.forEachEdge(begin, end, [&](HalfEdgeDataStructure::Edge const& edge) {
-                    unite(edge.lower, edge.upper);
-                    if (edge.isBoundary())
-                        unite(edge.lower, border);
-                });
-                for (std::size_t point = begin; point < end; ++point)
-                    if (!isOnEdge[point])
-                        unite(static_cast<unsigned int>(point), border);
+        auto const unitePoints = [&](std::uint64_t begin, std::uint64_t end, auto const& unite) {
+            edges.forEachEdge(begin, end, [&](HalfEdgeDataStructure::Edge const& edge) {
+                unite(edge.lower, edge.upper);
+                if (edge.isBoundary())
+                    unite(edge.lower, border);
             });
+            for (std::uint64_t point = begin; point < end; ++point)
+                if (!isOnEdge[point])
+                    unite(static_cast<unsigned int>(point), border);
+        };
+        auto const uniteLoosely = [&](std::uint64_t begin, std::uint64_t end) {
+            std::uint64_t linkCount = 0;
+            unitePoints(begin, end, [&, parents = sets.parents()](unsigned int a, unsigned int b) {
+                parents.uniteLoosely(a, b, linkCount);
+            });
+            return linkCount;
+        };
+        auto const uniteSafely = [&](std::uint64_t begin, std::uint64_t end) {
+            unitePoints(begin, end, [&](unsigned int a, unsigned int b) { sets.unite(a, b); });
+        };
+        std::uint64_t const count = countUnited(sets, pointCount, grain::kPoints, uniteLoosely, uniteSafely);
         return static_cast<int>(static_cast<std::uint32_t>(count - 1));
     }
 
