@@ -38,12 +38,15 @@ namespace {
     /// From one point to a different one.
     inline Use makeUse(unsigned int from, unsigned int to)
     {
-        unsigned int const lower = std::min(from, to);
-        unsigned int const upper = std::max(from, to);
-        unsigned int const distance = upper - lower;
+        // In arithmetic without branches: which point is the lower one is anybody's guess where points lie anywhere.
+        std::int64_t const step = std::int64_t(to) - std::int64_t(from);
+        std::int64_t const isDown = step >> 63; // all bits, or none
+        auto const lower = static_cast<unsigned int>(from + (step & isDown));
+        auto const distance = static_cast<unsigned int>((step ^ isDown) - isDown);
+        auto const isAgainst = static_cast<unsigned int>(isDown & 1);
         if (distance > kHalfCircle) [[unlikely]]
-            return {upper, ~distance << 1 | (from == lower)};
-        return {lower, distance << 1 | (from == upper)};
+            return {lower + distance, ~distance << 1 | (isAgainst ^ 1)};
+        return {lower, distance << 1 | isAgainst};
     }
 
     inline unsigned int otherPoint(unsigned int owner, unsigned int code)
