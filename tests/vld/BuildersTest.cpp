@@ -1,5 +1,6 @@
 #include <support/Volumes.h>
 
+#include <nexil/JobCancel.h>
 #include <vld/Accessor.h>
 #include <vld/BuildFromPoints.h>
 #include <vld/BuildFromValues.h>
@@ -302,6 +303,9 @@ TYPED_TEST(Builders, WhatCannotBeBuiltGivesAnEmptyGrid)
         EXPECT_FALSE(build({.channelName = "c", .topologyName = "t", .containerName = "t"}));
         for (float const size : noSizes)
             EXPECT_FALSE(build({.channelName = "c", .voxelSize = size}));
+        Nexil::setJobCancelHook([] { return true; });
+        EXPECT_THROW(build(good), std::runtime_error);
+        Nexil::setJobCancelHook(nullptr);
     }
     for (float const width : noSizes) {
         EXPECT_FALSE(plane(good, {{0, 0, 0}, {1, 1, 1}}, width));

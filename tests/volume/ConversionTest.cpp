@@ -10,6 +10,7 @@
 #include <veldrin/volume/VldProxyComponentChannel.h>
 #include <veldrin/volume/VldProxyComponentContainer.h>
 #include <veldrin/volume/VldProxyComponentTopology.h>
+#include <veldrin/volume/VolumeBounds.h>
 #include <veldrin/volume/VolumeConversion.h>
 
 #include <map>
@@ -245,7 +246,12 @@ TEST(VolumeConversion, ACancelledJobLeavesItsSourceAlone)
     Nexil::setJobCancelHook([] { return true; });
     auto const converted = Geometry::move_vld_volume_to_object(*volume);
     EXPECT_THROW(static_cast<void>(Geometry::move_object_to_vld_volume(*object)), std::runtime_error);
+    Math::bbox<Math::float3, float> box;
+    auto const container = volume->component<Container<SmallTiles>>("voxel_tile_tree");
+    EXPECT_THROW(GeometryAlgorithms::volumeBounds(*volume, *container, *container->topology(), box),
+                 std::runtime_error);
     Nexil::setJobCancelHook(nullptr);
+    EXPECT_EQ(box, (Math::bbox<Math::float3, float>()));
     ASSERT_TRUE(converted);
     EXPECT_TRUE(converted->empty());
     EXPECT_EQ(componentsOf(*volume), before);

@@ -19,7 +19,8 @@ namespace Veldrin::Geometry {
 /// asking for its type and size makes nothing. "depends_on" is empty.
 /// "target" can be set, and the container, copied first when others hold it, refers to the topology of that name then.
 /// All other writes are refused: extracting gives an empty value, erasing false, erasing everything does nothing.
-/// Copies share the container. Cost: constant but for the first reading of "indices". Threads: as of any object.
+/// Copies share the container. Cost: constant but for the first reading of "indices", which also throws std::runtime_error
+/// when the job is cancelled. Threads: as of any object.
 class VELDRIN_API VldProxyComponentContainer final : public Object {
 public:
     explicit VldProxyComponentContainer(Nexil::Ptr<VLD::Component> component, Nexil::String target = {}) noexcept
