@@ -111,7 +111,7 @@ Polygons facesAlong(unsigned int pointCount, unsigned int spread, unsigned int f
             if (corner < spread)
                 corner = static_cast<unsigned int>((corner + f * (pointCount - spread) / faces.size()) % pointCount);
             else
-                corner += pointCount;
+                corner = corner - spread + pointCount;
     return faces;
 }
 

@@ -45,23 +45,6 @@ TEST(Prototypes, EachKindIsToldFromTheOthers)
         EXPECT_EQ((*types)[i], kKinds[i].prototype()) << i;
 }
 
-TEST(Prototypes, AWrongTypeAnywhereInsideIsNotOfTheKind)
-{
-    auto const spoil = [](char const* part, char const* key, Nexil::Any&& value) {
-        auto const mesh = support::filled([](Object& object) { populateCubeMesh(1, object); });
-        Nexil::MutablePtr<Object> own(support::part(*mesh, part));
-        own->setPropertyAny(key, std::move(value));
-        setProperty(*mesh, part, std::move(own));
-        return Object::isA(*mesh, *getMeshPrototype());
-    };
-    EXPECT_TRUE(spoil(sPointPosition, sDefault, Math::float3{1, 2, 3}));
-    EXPECT_FALSE(spoil(sPointPosition, sData, support::array<Math::float4>({})));
-    EXPECT_FALSE(spoil(sPointPosition, sInterp, 1u));
-    EXPECT_FALSE(spoil(sPointPosition, sTarget, Nexil::Any()));
-    EXPECT_FALSE(spoil(sFaceOffset, sDefault, -1));
-    EXPECT_FALSE(spoil(sFaceComp, sCount, 6));
-}
-
 TEST(Prototypes, DataIsAskedForByName)
 {
     auto const generic = getDataGeoPropPrototype(sGenericDataGeoProp);

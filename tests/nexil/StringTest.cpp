@@ -39,15 +39,4 @@ TEST(String, SearchesPartsAndOrderAreThoseOfTheBytesZeroOnesIncluded)
     EXPECT_NE(String("a\0b", 3), "a");
 }
 
-TEST(String, IsAssignedFromPartsOfItselfAndFromNothing)
-{
-    String text("a text that is long enough for a block of its own");
-    text.assign(text.c_str() + 2, 4);
-    EXPECT_EQ(text, "text");
-    text += text;
-    EXPECT_EQ(text, "texttext");
-    text = {};
-    EXPECT_EQ(text, "");
-}
-
 } // namespace

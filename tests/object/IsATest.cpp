@@ -102,21 +102,6 @@ TEST(IsA, TableOfKinds)
     }
 }
 
-TEST(IsA, AClassThatBreaksItsPromiseIsOfNoKind)
-{
-    struct Liar : Object {
-        PropertyInfo propertyInfo(String const&) const override
-        {
-            return {true, false, Nexil::TypeId::of<ObjectPtr>(), 0};
-        }
-        Any getProperty(String const&) const override { return 1; }
-        Array<String> keys() const override { return {"a"}; }
-    } const liar;
-    auto const honest = objectOf({{"a", objectOf({})}});
-    EXPECT_FALSE(Object::isA(liar, *honest));
-    EXPECT_FALSE(Object::isA(*honest, liar));
-}
-
 /// `depth` levels, each referring to the next `width` times; at the bottom one property.
 ObjectPtr nest(int depth, int width, Any const& bottom)
 {
