@@ -36,7 +36,10 @@ namespace {
     struct Run {
         unsigned int other;
         unsigned int index; ///< of the face-vertex that it starts from
-        FaceEdge edge;
+        unsigned int face;
+        unsigned int corner;
+
+        [[nodiscard]] FaceEdge edge() const noexcept { return {face, corner}; }
     };
 
     /// The first two runs in face order that belong to different faces: whatever a face is looking for across the edge is
@@ -45,8 +48,8 @@ namespace {
     public:
         void add(Run const& run) noexcept
         {
-            if (count_ == 0 || (count_ == 1 && run.edge.face != first_.face))
-                (count_++ == 0 ? first_ : second_) = run.edge;
+            if (count_ == 0 || (count_ == 1 && run.face != first_.face))
+                (count_++ == 0 ? first_ : second_) = run.edge();
         }
 
         [[nodiscard]] FaceEdge across(FaceEdge const& edge) const noexcept
@@ -94,11 +97,11 @@ namespace {
                 unsigned int const before = at.corner == 0 ? last : at.corner - 1;
                 unsigned int const previous = points_[first + before];
                 if (next > point)
-                    leaving(Run{next, first + at.corner, at});
+                    leaving(Run{next, first + at.corner, at.face, at.corner});
                 else if (next == point)
                     adjacentEdges_[first + at.corner] = FaceEdge{};
                 if (previous > point)
-                    arriving(Run{previous, first + before, {at.face, before}});
+                    arriving(Run{previous, first + before, at.face, before});
             }
         }
 
@@ -114,8 +117,8 @@ namespace {
 
         void findInSmallGroup(unsigned int point, std::uint64_t begin, std::uint64_t end)
         {
-            std::array<Run, kSmallGroup> leaving;
-            std::array<Run, kSmallGroup> arriving;
+            auto& leaving = fewLeaving_;
+            auto& arriving = fewArriving_;
             std::size_t leavingCount = 0;
             std::size_t arrivingCount = 0;
             forEachRun(
@@ -126,10 +129,10 @@ namespace {
                     unsigned int lowest = kInvalidIndex;
                     FaceEdge across;
                     for (std::size_t j = 0; j < otherCount; ++j)
-                        if (others[j].other == runs[i].other && others[j].edge.face != runs[i].edge.face &&
+                        if (others[j].other == runs[i].other && others[j].face != runs[i].face &&
                             others[j].index < lowest) {
                             lowest = others[j].index;
-                            across = others[j].edge;
+                            across = others[j].edge();
                         }
                     adjacentEdges_[runs[i].index] = across;
                 }
@@ -174,7 +177,7 @@ namespace {
                 for (; j < others.size() && others[j].other == other; ++j)
                     candidates.add(others[j]);
                 for (; i < runs.size() && runs[i].other == other; ++i)
-                    adjacentEdges_[runs[i].index] = candidates.across(runs[i].edge);
+                    adjacentEdges_[runs[i].index] = candidates.across(runs[i].edge());
             }
         }
 
@@ -183,6 +186,9 @@ namespace {
         Ranges const& ranges_;
         FaceEdge const* pointFaces_;
         FaceEdge* adjacentEdges_;
+        // Kept from point to point: making them takes longer than finding what goes into them.
+        std::array<Run, kSmallGroup> fewLeaving_;
+        std::array<Run, kSmallGroup> fewArriving_;
         std::vector<Run> leaving_;
         std::vector<Run> arriving_;
     };
@@ -237,14 +243,15 @@ bool buildFaceVertexAdjacency(Object const& mesh, Nexil::Array<FaceEdge>& adjace
                                         last = faces.cornerCount()](std::uint64_t begin, std::uint64_t end) {
                 for (std::uint64_t f = begin; f < end; ++f) {
                     Geometry::IndexRange const range = ranges[f];
-                    for (std::uint64_t i = range.begin; i < range.end; ++i) {
-                        if (i + 2 * kPrefetchDistance < last) {
-                            __builtin_prefetch(places + points[i + 2 * kPrefetchDistance], 1);
-                            __builtin_prefetch(target + places[points[i + kPrefetchDistance]], 1);
+                    unsigned int const* const corners = points + range.begin;
+                    auto const count = static_cast<unsigned int>(range.end - range.begin);
+                    if (range.end + 2 * kPrefetchDistance < last)
+                        for (unsigned int k = 0; k < count; ++k) {
+                            __builtin_prefetch(places + corners[k + 2 * kPrefetchDistance], 1);
+                            __builtin_prefetch(target + places[corners[k + kPrefetchDistance]], 1);
                         }
-                        target[places[points[i]]++] = {static_cast<unsigned int>(f),
-                                                       static_cast<unsigned int>(i - range.begin)};
-                    }
+                    for (unsigned int k = 0; k < count; ++k)
+                        target[places[corners[k]]++] = {static_cast<unsigned int>(f), k};
                 }
             });
         });
