@@ -46,20 +46,19 @@ TEST(InputMemoryBuf, AnswersAsTheStandardBufferOfTheSameBytes)
     }
 }
 
-TEST(InputMemoryBuf, DiffersInTheModeInFarSeeksAndInPuttingBackHighBytes)
+TEST(InputMemoryBuf, RefusesFarSeeksAndTakesHighBytesAsSignedCharacters)
 {
     struct Probe : InputMemoryBuf {
         using InputMemoryBuf::InputMemoryBuf;
         using InputMemoryBuf::pbackfail;
     } buffer("a\xF0", 2);
     EXPECT_EQ(std::streamoff(buffer.pubseekpos(2, std::ios_base::out)), 2);
-    for (auto const offset : {std::numeric_limits<std::streamoff>::max(), std::numeric_limits<std::streamoff>::min()})
-        for (auto const direction : {kDirections[0], kDirections[1], kDirections[2], std::ios_base::seekdir(7)})
-            EXPECT_EQ(std::streamoff(buffer.pubseekoff(offset, direction)), -1);
-    EXPECT_EQ(std::streamoff(buffer.pubseekoff(0, std::ios_base::seekdir(7))), -1);
-    EXPECT_EQ(buffer.pbackfail(0xF0), std::char_traits<char>::eof()); // the byte counts as a signed character
+    for (auto const direction : {kDirections[0], kDirections[1], kDirections[2], std::ios_base::seekdir(7)}) {
+        EXPECT_EQ(std::streamoff(buffer.pubseekoff(std::numeric_limits<std::streamoff>::max(), direction)), -1);
+        EXPECT_EQ(std::streamoff(buffer.pubseekoff(std::numeric_limits<std::streamoff>::min(), direction)), -1);
+    }
+    EXPECT_EQ(buffer.pbackfail(0xF0), std::char_traits<char>::eof());
     EXPECT_EQ(buffer.pbackfail(static_cast<signed char>('\xF0')), 0xF0);
-    EXPECT_EQ(buffer.sgetc(), 0xF0);
 }
 
 } // namespace

@@ -186,33 +186,24 @@ TEST(VolumeStream, ProxiesWithoutAComponentAndOutsideOfAGeometryArePlain)
 
 TEST(VolumeStream, ArraysThatManyTopologiesReferToAreLookedAtOnce)
 {
-    // A million tiles under ten thousand names: looked at once each, this would be ten billion tiles.
+    // A million tiles, and ten thousand topologies of their places with offsets of their own: looked at each, this would be
+    // ten billion tiles.
     Coordinates origins;
     for (int i = 0; i < 1000000; ++i)
         origins.push_back({i * 4, 0, 0});
     UIntArray offsets;
     offsets.resize(origins.size() + 1);
-    auto const all = PointTopology<SmallTiles>::create("all", std::move(origins), std::move(offsets));
+    Object all;
+    ASSERT_TRUE(Geometry::describeVldProxy(Geometry::VldProxyComponentTopology(PointTopology<SmallTiles>::create(
+                                               "all", std::move(origins), std::move(offsets))),
+                                           all));
     auto geometry = createObject();
     for (int i = 0; i < 10000; ++i) {
-        std::string const name = "p" + std::to_string(i);
-        setProperty(*geometry, name.c_str(),
-                    ObjectPtr(Nexil::makePtr<Geometry::VldProxyComponentTopology>(
-                        Nexil::makePtr<PointTopology<SmallTiles>>(name.c_str(), *all))));
-        if (i % 2 == 0)
-            continue;
-        // The same with one array of their own is refused, as that would have to be looked at anew.
-        Object plain;
-        ASSERT_TRUE(Geometry::describeVldProxy(*support::part(*geometry, name.c_str()), plain));
-        setProperty(plain, "offsets", Nexil::makePtr<UIntArray>(UIntArray{0}));
-        setProperty(*geometry, name.c_str(), ObjectPtr(Nexil::makePtr<Object>(std::move(plain))));
+        Object other(all);
+        setProperty(other, "offsets", Nexil::makePtr<UIntArray>(UIntArray{0}));
+        setProperty(*geometry, ("p" + std::to_string(i)).c_str(), ObjectPtr(Nexil::makePtr<Object>(std::move(other))));
     }
-    auto const back = writtenAndRead({ObjectPtr(std::move(geometry))});
-    EXPECT_EQ(back.warnings.size(), 5000u);
-    auto const first = Geometry::getVldTopologyFromProxy(support::part(*back.objects[0], "p0"));
-    auto const last = Geometry::getVldTopologyFromProxy(support::part(*back.objects[0], "p9998"));
-    EXPECT_EQ(Nexil::dynamicPtrCast<PointTopology<SmallTiles>>(first)->sharedOffsets(),
-              Nexil::dynamicPtrCast<PointTopology<SmallTiles>>(last)->sharedOffsets());
+    EXPECT_EQ(writtenAndRead({ObjectPtr(std::move(geometry))}).warnings.size(), 10000u);
 }
 
 } // namespace

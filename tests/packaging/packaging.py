@@ -1,10 +1,10 @@
 #!/usr/bin/env python3
-"""Uses the library the way others do, from outside the project, and runs what comes out.
+"""Uses the library the way others do, from outside the project, and runs what comes out: the README's example.
 
 Usage: packaging.py WAY BUILD SOURCE CMAKE COMPILER, where WAY is one of
   find_package   install into an empty prefix, move the prefix, build consumer/ by find_package, run it and zon
-  pkg_config     the same prefix, consumer/main.cpp compiled with the flags of pkg-config
-  subdirectory   consumer/main.cpp in a project that adds the source tree as a subfolder
+  pkg_config     the same prefix, the example compiled with the flags of pkg-config
+  subdirectory   the example in a project that adds the source tree as a subfolder
 """
 import os
 import re
@@ -64,37 +64,35 @@ def settings_of(build, *names):
 
 
 def main():
-    if len(sys.argv) != 6:
+    if len(sys.argv) != 6 or sys.argv[1] not in ("find_package", "pkg_config", "subdirectory"):
         sys.exit(__doc__)
     way, build, source, cmake, compiler = sys.argv[1:]
     here = os.path.join(source, "tests", "packaging")
+    example = os.path.join(source, "examples", "ReadmeExample.cpp")
+    environment = dict(os.environ)
     with tempfile.TemporaryDirectory() as work:
         if way == "subdirectory":
             launcher = shutil.which("ccache")
-            consumer = build_consumer(work, os.path.join(here, "subdirectory"), cmake, compiler,
+            consumer = build_consumer(work, os.path.join(here, way), cmake, compiler, f"-DEXAMPLE={example}",
                                       f"-DVELDRIN_SOURCE={source}",
                                       *settings_of(build, "CMAKE_BUILD_TYPE", "VELDRIN_WARNINGS_AS_ERRORS"),
                                       *([f"-DCMAKE_CXX_COMPILER_LAUNCHER={launcher}"] if launcher else []))
-            environment = None
         else:
             prefix = installed_and_moved(work, build, cmake)
             check_names_no_other_place(prefix, [build, source, os.path.join(work, "first")])
             if way == "find_package":
                 # A consumer may need nothing of what the libraries themselves are built with.
-                consumer = build_consumer(work, os.path.join(here, "consumer"), cmake, compiler,
+                consumer = build_consumer(work, os.path.join(here, "consumer"), cmake, compiler, f"-DEXAMPLE={example}",
                                           f"-DCMAKE_PREFIX_PATH={prefix}", "-DCMAKE_DISABLE_FIND_PACKAGE_TBB=ON")
                 run(os.path.join(prefix, "bin", "zon"), "--help", stdout=subprocess.DEVNULL)
-                environment = None
-            elif way == "pkg_config":
+            else:
                 folder, = [path for path, _, names in os.walk(prefix) if "veldrin-geometry.pc" in names]
                 flags = subprocess.run(["pkg-config", "--cflags", "--libs", "veldrin-geometry"], check=True, text=True,
-                                       capture_output=True, env=os.environ | {"PKG_CONFIG_PATH": folder}).stdout.split()
+                                       capture_output=True, env=environment | {"PKG_CONFIG_PATH": folder}).stdout.split()
                 consumer = os.path.join(work, "consumer")
-                run(compiler, "-std=c++20", os.path.join(here, "consumer", "main.cpp"), "-o", consumer, *flags)
-                environment = os.environ | {"LD_LIBRARY_PATH": os.path.dirname(folder)}
-            else:
-                sys.exit(__doc__)
-        run(consumer, os.path.join(work, "cube.zon"), env=environment)
+                run(compiler, "-std=c++20", example, "-o", consumer, *flags)
+                environment["LD_LIBRARY_PATH"] = os.path.dirname(folder)
+        run(consumer, cwd=work, env=environment)
 
 
 if __name__ == "__main__":

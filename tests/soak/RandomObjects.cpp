@@ -5,7 +5,6 @@
 #include <support/Geometry.h>
 #include <support/Streams.h>
 
-#include <veldrin/math/FCurve.h>
 #include <veldrin/math/Matrix.h>
 #include <veldrin/volume/VolumeConversion.h>
 
@@ -21,6 +20,7 @@ namespace {
 
     using namespace Veldrin;
     using ObjectPtr = Nexil::Ptr<Object>;
+    using Indices = std::vector<unsigned int>;
 
     std::uint64_t below(Random& random, std::uint64_t end)
     {
@@ -40,56 +40,29 @@ namespace {
 
     Nexil::String randomText(Random& random)
     {
-        std::string text;
-        for (auto length = below(random, 30); length > 0; --length)
-            text += static_cast<char>(below(random, 256));
+        std::string text(below(random, 30), ' ');
+        for (char& c : text)
+            c = static_cast<char>(below(random, 256));
         return Nexil::String(std::string_view(text));
     }
 
     /// Any bits, floats that are no numbers among them; arrays of one value over and over among arrays of noise.
-    void fillWithBits(void* memory, std::uint64_t size, bool isFlags, Random& random)
-    {
-        auto* const bytes = static_cast<unsigned char*>(memory);
-        bool const isNoise = below(random, 2) == 0;
-        auto const repeated = below(random, 256);
-        std::uint64_t const step = sizeof(std::uint64_t);
-        for (std::uint64_t at = 0; at < size; at += step) {
-            std::uint64_t const bits = isNoise ? random() : repeated + at / 64;
-            std::memcpy(bytes + at, &bits, std::min(step, size - at));
-        }
-        for (std::uint64_t i = 0; isFlags && i < size; ++i)
-            bytes[i] &= 1;
-    }
-
-    template <class T>
-    void fillWithBits(T* values, std::uint64_t count, Random& random)
-    {
-        fillWithBits(values, count * sizeof(T), std::is_same_v<T, bool>, random);
-    }
-
     template <class T>
     Nexil::Any randomArray(Random& random)
     {
         Nexil::Array<T> values;
         values.resize(randomSize(random));
-        fillWithBits(values.data(), values.size(), random);
+        bool const isNoise = below(random, 2) == 0;
+        auto const repeated = below(random, 256);
+        auto* const bytes = static_cast<char*>(static_cast<void*>(values.data()));
+        std::uint64_t const size = values.size() * sizeof(T);
+        for (std::uint64_t at = 0; at < size; at += sizeof(std::uint64_t)) {
+            std::uint64_t bits = isNoise ? random() : repeated + at / 64;
+            if (std::is_same_v<T, bool>)
+                bits &= 0x0101010101010101u;
+            std::memcpy(bytes + at, &bits, std::min(sizeof(bits), size - at));
+        }
         return Nexil::makePtr<Nexil::Array<T>>(std::move(values));
-    }
-
-    Nexil::Any randomTexts(Random& random)
-    {
-        Nexil::Array<Nexil::String> values;
-        for (auto count = below(random, 20); count > 0; --count)
-            values.push_back(randomText(random));
-        return Nexil::makePtr<Nexil::Array<Nexil::String>>(std::move(values));
-    }
-
-    Nexil::Any randomCurve(Random& random)
-    {
-        Math::FCurve curve;
-        for (auto count = below(random, 6); count > 0; --count)
-            curve.setKey({.time = static_cast<double>(below(random, 1000)) / 8, .value = -0.5});
-        return Nexil::makePtr<Math::FCurve>(std::move(curve));
     }
 
     /// A value of each type that a stream can hold, alone, in arrays, and in arrays of arrays: made once, and kept as files.
@@ -115,12 +88,8 @@ namespace {
         switch (below(random, 12)) {
         case 0: return randomArray<float>(random);
         case 1: return randomArray<unsigned char>(random);
-        case 2: return randomArray<unsigned int>(random);
-        case 3: return randomArray<Math::float4x4>(random);
-        case 4: return randomArray<Math::double3>(random);
-        case 5: return randomArray<bool>(random);
-        case 6: return randomTexts(random);
-        case 7: return randomCurve(random);
+        case 2: return randomArray<Math::float4x4>(random);
+        case 3: return randomArray<bool>(random);
         default: return everyType()[below(random, everyType().size())];
         }
     }
@@ -128,44 +97,42 @@ namespace {
     Nexil::Ptr<Nexil::Array<Math::float3>> randomPositions(Random& random, std::uint64_t count)
     {
         std::uniform_real_distribution<float> coordinate(-10, 10);
-        Nexil::Array<Math::float3> positions;
-        for (std::uint64_t i = 0; i < count; ++i) {
-            float const x = coordinate(random);
-            float const y = coordinate(random);
-            positions.push_back({x, y, coordinate(random)});
-        }
-        return Nexil::makePtr<Nexil::Array<Math::float3>>(std::move(positions));
+        std::vector<Math::float3> positions(count);
+        for (auto& position : positions)
+            for (unsigned int axis = 0; axis < 3; ++axis)
+                position[axis] = coordinate(random);
+        return support::array(positions);
     }
 
-    /// Offsets of `count` ranges of up to `most` elements, or as far as `end` goes.
-    Nexil::Ptr<Nexil::Array<unsigned int>> randomOffsets(Random& random, std::uint64_t count, std::uint64_t most,
-                                                         std::uint64_t end)
+    Indices randomIndices(Random& random, std::uint64_t count, std::uint64_t end)
     {
-        Nexil::Array<unsigned int> offsets{0};
+        Indices indices(count);
+        for (auto& index : indices)
+            index = static_cast<unsigned int>(below(random, end));
+        return indices;
+    }
+
+    /// Offsets of `count` ranges of up to five elements, or as far as `end` goes.
+    Indices randomOffsets(Random& random, std::uint64_t count, std::uint64_t end)
+    {
+        Indices offsets{0};
         for (std::uint64_t i = 0; i < count; ++i)
-            offsets.push_back(
-                static_cast<unsigned int>(std::min<std::uint64_t>(end, offsets[i] + below(random, most + 1))));
-        return Nexil::makePtr<Nexil::Array<unsigned int>>(std::move(offsets));
+            offsets.push_back(static_cast<unsigned int>(std::min(end, offsets[i] + below(random, 6))));
+        return offsets;
     }
 
     ObjectPtr randomMesh(Random& random)
     {
         auto made = createObject();
         std::uint64_t const pointCount = 3 + randomSize(random);
-        auto const offsets = randomOffsets(random, 1 + randomSize(random), 5, ~0u);
-        Nexil::Array<unsigned int> corners;
-        for (std::uint64_t i = 0; i <= (*offsets)[offsets->size() - 1]; ++i)
-            corners.push_back(static_cast<unsigned int>(below(random, pointCount)));
-        auto const cornerCount = corners.size();
-        Geometry::populateMesh(randomPositions(random, pointCount),
-                               Nexil::makePtr<Nexil::Array<unsigned int>>(std::move(corners)), offsets, *made);
+        auto const offsets = randomOffsets(random, 1 + randomSize(random), ~0u);
+        auto const corners = randomIndices(random, offsets.back() + 1, pointCount);
+        Geometry::populateMesh(randomPositions(random, pointCount), support::array(corners), support::array(offsets),
+                               *made);
         // Values shared out, as texture coordinates are.
-        std::uint64_t const valueCount = 1 + below(random, cornerCount);
-        Nexil::Array<unsigned int> indices;
-        for (std::uint64_t i = 0; i < cornerCount; ++i)
-            indices.push_back(static_cast<unsigned int>(below(random, valueCount)));
+        std::uint64_t const valueCount = 1 + below(random, corners.size());
         auto range = createObject();
-        Geometry::populateRangeGeoProperty(Nexil::makePtr<Nexil::Array<unsigned int>>(std::move(indices)),
+        Geometry::populateRangeGeoProperty(support::array(randomIndices(random, corners.size(), valueCount)),
                                            Geometry::sFaceVertexComp, *range);
         setProperty(*made, "face_vertex_color_index", std::move(range));
         auto data = createObject();
@@ -175,36 +142,28 @@ namespace {
         return made;
     }
 
-    ObjectPtr randomStrands(Random& random)
-    {
-        auto made = createObject();
-        std::uint64_t const pointCount = 1 + randomSize(random);
-        Geometry::populateStrand(randomPositions(random, pointCount),
-                                 randomOffsets(random, randomSize(random), 10, pointCount), *made);
-        return made;
-    }
-
-    template <class Traits>
-    ObjectPtr randomVolume(Random& random)
-    {
-        return Veldrin::Geometry::move_vld_volume_to_object(
-            *support::sphereVolume<Traits>(static_cast<int>(1 + below(random, 8))));
-    }
-
 } // namespace
 
 JudgedObject randomGeometry(Random& random)
 {
     using Kind = JudgedObject::Kind;
+    std::uint64_t const pointCount = 1 + randomSize(random);
+    int const radius = static_cast<int>(1 + below(random, 8));
+    auto made = createObject();
     switch (below(random, 6)) {
-    case 0: return {Kind::Strands, randomStrands(random)};
-    case 1: {
-        auto cloud = createObject();
-        Veldrin::Geometry::populatePointCloud(randomPositions(random, 1 + randomSize(random)), *cloud);
-        return {Kind::PointCloud, std::move(cloud)};
-    }
-    case 2: return {Kind::Volume, randomVolume<VLD::TileTree3D::SmallTiles>(random)};
-    case 3: return {Kind::Volume, randomVolume<VLD::TileTree3D::WideTiles>(random)};
+    case 0:
+        Geometry::populateStrand(randomPositions(random, pointCount),
+                                 support::array(randomOffsets(random, randomSize(random), pointCount)), *made);
+        return {Kind::Strands, std::move(made)};
+    case 1:
+        Geometry::populatePointCloud(randomPositions(random, pointCount), *made);
+        return {Kind::PointCloud, std::move(made)};
+    case 2:
+        return {Kind::Volume,
+                Geometry::move_vld_volume_to_object(*support::sphereVolume<VLD::TileTree3D::SmallTiles>(radius))};
+    case 3:
+        return {Kind::Volume,
+                Geometry::move_vld_volume_to_object(*support::sphereVolume<VLD::TileTree3D::WideTiles>(radius))};
     default: return {Kind::Mesh, randomMesh(random)};
     }
 }

@@ -19,6 +19,13 @@ void setField(Veldrin::Object& geometry, char const* name, char const* key, T&& 
     Veldrin::setProperty(geometry, name, std::move(changed));
 }
 
+/// The message of a validator, "" for a valid object.
+template <class Validator>
+std::string verdict(Validator&& validator, Veldrin::Object const& object)
+{
+    return validator.validate(object).message.c_str();
+}
+
 inline void setTarget(Veldrin::Object& geometry, char const* name, char const* target)
 {
     setField(geometry, name, Veldrin::Geometry::sTarget, target);
