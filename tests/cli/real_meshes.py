@@ -32,9 +32,8 @@ def float32(text):
 def content_of_off(path):
     """Points and faces of an OFF file, one point and one face a line."""
     lines = [line.split("#")[0].split() for line in path.read_text(errors="replace").splitlines()]
-    lines = [line for line in lines if line]
-    head = lines[0][1:] or lines[1]
-    body = lines[1:] if lines[0][1:] else lines[2:]
+    first, *rest = [line for line in lines if line]
+    head, body = (first[1:], rest) if first[1:] else (rest[0], rest[1:])
     points, faces = int(head[0]), int(head[1])
     return ([tuple(map(float32, line[:3])) for line in body[:points]],
             [tuple(map(int, line[1:int(line[0]) + 1])) for line in body[points:points + faces]])

@@ -8,7 +8,7 @@ import tool
 
 DOCS = pathlib.Path(__file__).resolve().parents[2] / "docs"
 
-EXACT = tuple(f"zon {name} " for name in ("tag", "normals", "diagnose", "validate", "strands"))
+EXACT = tuple(f"zon {name} " for name in ("tag", "normals", "diagnose", "validate", "strands", "volume bounds"))
 
 
 def words(text):
