@@ -17,13 +17,6 @@ class Validate(tool.ToolTest):
         self.assertEqual(report["valid"], all(each["valid"] for each in objects))
         return [(each["path"], each["kind"], [failure["message"] for failure in each["failures"]]) for each in objects]
 
-    def test_what_the_tool_makes_is_valid(self):
-        for shape in ("cube", "plane", "sphere"):
-            self.zon("make", shape, f"{shape}.zon")
-        self.zon("make", "strands", "cube.zon", "hair.zon")
-        self.assertEqual(self.judged("cube.zon", "plane.zon", "sphere.zon", "hair.zon", "--strict"),
-                         [("0", kind, []) for kind in ("mesh", "mesh", "mesh", "strands")])
-
     def test_the_first_failure_or_all_of_them(self):
         self.store("bad.zon", mesh(TRIANGLE[:2], [0, 1, 3], [0, 4], counts=(3, 3, 1),
                                    point_mass=indices([1], "nowhere"), face_mass=indices([5], "face_component")))
