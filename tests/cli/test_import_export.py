@@ -190,6 +190,7 @@ class Import(tool.ToolTest):
                 ("a.ply", "plx\n", 1, "does not start with"),
                 ("a.ply", "ply\nformat binary_", 2, "'binary_' is no format"),
                 ("a.ply", "ply\nformat ascii 1.0\nelement vertex 1\nproperty quad x\n", 4, "'quad' is no type"),
+                ("a.ply", "ply\nformat ascii 1.0\nelement vertex 1\n" + 2 * "property float x\n", 5, "'x' is named twice"),
                 ("a.ply", "ply\nformat ascii 1.0\nelement vertex 9\nproperty float x\nend_header\n1\n", 5, "lack x, y or z"),
                 ("a.stl", "solid a\nfacet normal 0 0 1\nouter loop\nvertex 0 0\nendloop\n", 5, "'endloop' is no number"),
                 ("a.stl", "solid a\nfacet normal 0 0 1\nloop\n", 3, "'loop' where 'outer' belongs")):

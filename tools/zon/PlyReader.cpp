@@ -112,7 +112,11 @@ namespace {
                 }
                 property.scalar = scalarOf(word, path, lines.number());
                 property.name = takeWord(rest);
-                header.elements.back().properties.push_back(property);
+                auto& properties = header.elements.back().properties;
+                if (std::any_of(properties.begin(), properties.end(),
+                                [&](Property const& other) { return other.name == property.name; }))
+                    fail(fmt::format("{} is named twice", inQuotes(property.name)));
+                properties.push_back(property);
             } else if (!keyword.empty() && keyword != "comment" && keyword != "obj_info") {
                 fail(fmt::format("{} is no keyword of the header", inQuotes(keyword)));
             }

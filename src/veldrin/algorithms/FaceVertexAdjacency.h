@@ -35,7 +35,7 @@ namespace Veldrin::GeometryAlgorithms {
 /// where one of them had room for its result already: then it may hold unfinished values.
 /// Cost: linear in face-vertices and points, n log n in the face-vertices at one point, parallel. Storage that the outputs
 /// already have is used again.
-/// Temporary memory: for each thread 4 bytes a point, but beyond one thread no more than 20 bytes a face-vertex in all; 32
+/// Temporary memory: for each thread 4 bytes a point, but beyond one thread no more than 12 bytes a face-vertex in all; 32
 /// bytes for each face-vertex at one point while that point has more than 16.
 /// Threads: same result for every thread count; safe to run at once on one mesh.
 [[nodiscard]] VELDRIN_API bool buildFaceVertexAdjacency(Object const& mesh,

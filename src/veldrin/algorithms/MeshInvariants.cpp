@@ -23,6 +23,8 @@ namespace {
         constexpr std::size_t kPoints = 16384;
     } // namespace grain
 
+    // One thread unites fewer faces before another has woken up.
+    constexpr std::uint64_t kParallelFaces = std::uint64_t(1) << 16;
     // A forest of so many points fits the cache that a core has for itself.
     constexpr std::uint64_t kCachedPoints = std::uint64_t(1) << 18;
     // What one thread does in some ten milliseconds, unasked whether the job is cancelled.
@@ -144,8 +146,9 @@ namespace {
         Sets sets(faces.pointCount());
         Order const order = judgeOrder(faces, ranges);
         // Threads that want the same cache lines all the time are slower than one that has them all to itself.
-        bool const isAlone = parallel::threadCount() == 1 || (!order.isByPoint && faces.pointCount() <= kCachedPoints &&
-                                                              faces.faceCount() <= kMostFacesOfOneThread);
+        bool const isAlone =
+            parallel::threadCount() == 1 || faces.faceCount() < kParallelFaces ||
+            (!order.isByPoint && faces.pointCount() <= kCachedPoints && faces.faceCount() <= kMostFacesOfOneThread);
         auto const unite = [&]<Way way>(std::integral_constant<Way, way>, auto parents, std::uint64_t begin,
                                         std::uint64_t end) {
             return uniteFaces<way>(parents, faces.points(), faces.pointCount(), ranges, begin, end);

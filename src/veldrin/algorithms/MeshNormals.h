@@ -14,7 +14,8 @@
 ///
 /// Positions and arithmetic are in single precision, each sum in one fixed order. What has no normal gets (0, 1, 0): a
 /// face of fewer than three corners, a face that names a point beyond the positions, and any vector not longer than
-/// 1.1754944e-38.
+/// 1.1754944e-38. Lengths are taken in single precision too: area vectors from 1.8e19 on (edges of some 4e9) overflow, and
+/// such normals, like those of points that are not finite, may be zero or no number.
 /// Outputs are untouched when "face_offset", "face_vertex" or "point_position" is missing or shorter than the counts of
 /// the components ask for. Where offsets fall, which no valid mesh's do, a face begins behind those before it.
 /// Errors: std::runtime_error when the job is cancelled leaves the output as it was, and so does std::bad_alloc but where

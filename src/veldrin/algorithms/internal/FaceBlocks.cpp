@@ -12,7 +12,7 @@ namespace {
     {
         if (faces.cornerCount() < kParallelCorners)
             return 1;
-        std::uint64_t const affordable = 5 * faces.cornerCount() / std::max<std::uint64_t>(1, faces.pointCount());
+        std::uint64_t const affordable = 3 * faces.cornerCount() / std::max<std::uint64_t>(1, faces.pointCount());
         return std::clamp<std::uint64_t>(std::min<std::uint64_t>(affordable, Nexil::parallel::threadCount()), 1,
                                          kMostBlocks);
     }

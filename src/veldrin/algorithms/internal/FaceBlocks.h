@@ -14,7 +14,7 @@ namespace Veldrin::Geometry {
 class FaceBlocks {
 public:
     /// Blocks of whole faces with about as many corners each, one for a thread; a single one for a small mesh. Their
-    /// counts together take at most 20 bytes a corner, or 4 bytes a point.
+    /// counts together take at most 12 bytes a corner, or 4 bytes a point.
     explicit FaceBlocks(MeshFaces const& faces);
 
     [[nodiscard]] std::size_t size() const noexcept { return firstFaces_.size() - 1; }
