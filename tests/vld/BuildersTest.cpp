@@ -196,7 +196,7 @@ Points randomPoints(std::size_t count, float3 const& centre, float largest)
         points.radii.push_back(radius(random));
     }
     // These make nothing.
-    for (float const badRadius : {-5.0f, std::nanf(""), std::numeric_limits<float>::infinity()}) {
+    for (float const badRadius : {-0.5f, std::nanf(""), std::numeric_limits<float>::infinity()}) {
         points.positions.push_back(centre);
         points.radii.push_back(badRadius);
     }

@@ -58,7 +58,7 @@ void expectPlays(Object& proxy, Object const& prototype)
     EXPECT_FALSE(proxy.hasProperty("other"));
     EXPECT_FALSE(proxy.propertyInfo("other").exists);
     EXPECT_TRUE(proxy.getProperty("other").empty());
-    EXPECT_FALSE(proxy.setPropertyAny("other", 1));
+    EXPECT_FALSE(proxy.setPropertyAny("other", DataInterpolationMode::Linear));
     EXPECT_FALSE(proxy.setPropertyAny("depends_on", Nexil::makePtr<Nexil::Array<Nexil::String>>()));
 }
 
