@@ -4,6 +4,7 @@
 #include <vld/internal/TopologyAssembly.h>
 
 #include <cmath>
+#include <limits>
 #include <numbers>
 
 namespace VLD::TileTree3D::Internal {
@@ -200,7 +201,9 @@ namespace {
             if (box.size[axis] <= 0 || box.origin[axis] < -kCoordinateLimit ||
                 static_cast<long long>(box.origin[axis]) + box.size[axis] > kCoordinateLimit)
                 return false;
-        return true;
+        // So that 64 bits count the blocks, whose width the tiles decide.
+        auto const along = [&](int axis) { return static_cast<std::uint64_t>(box.size[axis]) / 64 + 2; };
+        return along(0) * along(1) <= std::numeric_limits<std::uint64_t>::max() / along(2);
     }
 
 } // namespace

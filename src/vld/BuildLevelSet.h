@@ -56,7 +56,8 @@ namespace Internal {
 ///           between two positions, as no true distance does; tiles where it is large are judged by it at their centre.
 ///           Called from several threads at once. A result that is not a number stays one.
 /// Errors: an empty grid for a description with an empty or repeated name or a voxel size that is not finite and positive,
-/// a band that is not, a box without voxels or beyond the coordinate limits, and more elements than 32 bits count.
+/// a band that is not, a box without voxels, beyond the coordinate limits or of more blocks than 64 bits count, and more
+/// elements than 32 bits count.
 /// std::bad_alloc; what `distance` throws; std::runtime_error when the job is cancelled.
 /// Cost: by blocks of some 64 voxels per axis over the box, by tiles near the surface, by cells inside.
 /// Threads: parallel inside; one result, bit for bit, for every number of threads.

@@ -307,6 +307,8 @@ TYPED_TEST(Builders, WhatCannotBeBuiltGivesAnEmptyGrid)
         EXPECT_THROW(build(good), std::runtime_error);
         Nexil::setJobCancelHook(nullptr);
     }
+    constexpr int kHalf = 1 << 30;
+    EXPECT_FALSE(plane(good, {{-kHalf, -kHalf, -kHalf}, {2147483647, 2147483647, 2147483647}}, 1));
     for (float const width : noSizes) {
         EXPECT_FALSE(plane(good, {{0, 0, 0}, {1, 1, 1}}, width));
         EXPECT_FALSE(points(good, {{0, 0, 0}}, {1.0f}, width));
