@@ -200,6 +200,16 @@ TEST(VolumeConversion, AnObjectThatIsNoVolumeStaysWhole)
         setProperty(*object, "misfit", misfit);
         expectRefused(*object);
     }
+    for (auto const& [from, holder] :
+         {std::pair(sVoxelComp, sVoxelTileTree), std::pair(sVoxelTileTree, sVoxelSignedDistance)}) {
+        SCOPED_TRACE(from + std::string(" under another name, which another part targets"));
+        auto object = move_vld_volume_to_object(*support::sphereVolume<SmallTiles>());
+        object->setPropertyAny("renamed", object->extractProperty(from));
+        Nexil::MutablePtr<Object> part(support::part(*object, holder));
+        ASSERT_TRUE(part->setPropertyAny(sTarget, Nexil::String("renamed")));
+        setProperty(*object, holder, std::move(part));
+        expectRefused(*object);
+    }
     auto without = [&](auto const& populate) {
         SCOPED_TRACE("without a topology proxy");
         expectRefused(*support::filled(populate));

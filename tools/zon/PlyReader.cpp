@@ -9,7 +9,9 @@
 #include <bit>
 #include <cmath>
 #include <cstring>
+#include <string_view>
 #include <type_traits>
+#include <unordered_set>
 #include <utility>
 
 namespace Zon {
@@ -68,6 +70,7 @@ namespace {
         Header header;
         Lines lines(bytes);
         bool hasFormat = false;
+        std::unordered_set<std::string_view> names; // of the properties of the last element
         if (!lines.next() || lines.current() != "ply")
             failAtLine(path, 1, "the file does not start with the line 'ply'");
         while (lines.next()) {
@@ -98,6 +101,7 @@ namespace {
                     fail(fmt::format("{} is no number of elements", inQuotes(word)));
                 element.count = static_cast<std::uint64_t>(*count);
                 header.elements.push_back(std::move(element));
+                names.clear();
             } else if (keyword == "property") {
                 if (header.elements.empty())
                     fail("a property before the first element");
@@ -112,11 +116,9 @@ namespace {
                 }
                 property.scalar = scalarOf(word, path, lines.number());
                 property.name = takeWord(rest);
-                auto& properties = header.elements.back().properties;
-                if (std::any_of(properties.begin(), properties.end(),
-                                [&](Property const& other) { return other.name == property.name; }))
+                if (!names.insert(property.name).second)
                     fail(fmt::format("{} is named twice", inQuotes(property.name)));
-                properties.push_back(property);
+                header.elements.back().properties.push_back(property);
             } else if (!keyword.empty() && keyword != "comment" && keyword != "obj_info") {
                 fail(fmt::format("{} is no keyword of the header", inQuotes(keyword)));
             }

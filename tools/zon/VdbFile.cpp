@@ -527,7 +527,9 @@ namespace {
             };
             for (auto const& channel : channels) {
                 auto const name = channel->name().view();
-                if (name.ends_with(kActive) && find(Nexil::String(name.substr(0, name.size() - std::strlen(kActive)))))
+                // The states of another channel's voxels go into its grid.
+                if (name.ends_with(kActive) && channel->template values<bool>() &&
+                    find(Nexil::String(name.substr(0, name.size() - std::strlen(kActive)))))
                     continue;
                 auto const stateChannel = find(channel->name() + kActive);
                 auto const states = stateChannel ? stateChannel->template values<bool>() : nullptr;

@@ -245,7 +245,7 @@ bool buildFaceVertexAdjacency(Object const& mesh, Nexil::Array<FaceEdge>& adjace
                     Geometry::IndexRange const range = ranges[f];
                     unsigned int const* const corners = points + range.begin;
                     auto const count = static_cast<unsigned int>(range.end - range.begin);
-                    if (range.end + 2 * kPrefetchDistance < last)
+                    if (count <= kPrefetchDistance && range.end + 2 * kPrefetchDistance < last)
                         for (unsigned int k = 0; k < count; ++k) {
                             __builtin_prefetch(places + corners[k + 2 * kPrefetchDistance], 1);
                             __builtin_prefetch(target + places[corners[k + kPrefetchDistance]], 1);

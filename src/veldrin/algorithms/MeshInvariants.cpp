@@ -1,6 +1,7 @@
 #include <veldrin/algorithms/MeshInvariants.h>
 
 #include <lattix/DisjointSet.h>
+#include <nexil/JobCancel.h>
 #include <nexil/parallel/Parallel.h>
 #include <nexil/parallel/Scan.h>
 #include <veldrin/algorithms/internal/EdgePoints.h>
@@ -19,16 +20,16 @@ namespace {
     using Sets = Lattix::DisjointSet<unsigned int>;
 
     namespace grain {
-        constexpr std::size_t kFaces = 16384;
+        constexpr std::uint64_t kCorners = 49152;
         constexpr std::size_t kPoints = 16384;
     } // namespace grain
 
-    // One thread unites fewer faces before another has woken up.
-    constexpr std::uint64_t kParallelFaces = std::uint64_t(1) << 16;
-    // A forest of so many points fits the cache that a core has for itself.
+    // One thread unites fewer corners before another has woken up.
+    constexpr std::uint64_t kParallelCorners = std::uint64_t(3) << 16;
+    // A forest of so many points fits the cache that a core has for itself, and pays for other threads that stand by while
+    // no more than so many corners are united.
     constexpr std::uint64_t kCachedPoints = std::uint64_t(1) << 18;
-    // What one thread does in some ten milliseconds, unasked whether the job is cancelled.
-    constexpr std::uint64_t kMostFacesOfOneThread = std::uint64_t(1) << 20;
+    constexpr std::uint64_t kMostCornersAlone = std::uint64_t(3) << 20;
 
     bool readMesh(Object const& mesh, MeshFaces& faces)
     {
@@ -41,19 +42,27 @@ namespace {
         return static_cast<int>(cut(faces.faceCount()) + (cut(faces.pointCount()) - cut(edges.edgeCount())));
     }
 
-    /// The number of sets, once uniteLoosely(begin, end) has united [0, count) and told how many links that took. Where two
-    /// threads got into each other's way, uniteSafely(begin, end) does it again.
-    template <class UniteLoosely, class UniteSafely>
-    std::uint64_t countUnited(Sets const& sets, std::uint64_t count, std::size_t grain,
-                              UniteLoosely const& uniteLoosely, UniteSafely const& uniteSafely)
+    /// The number of sets, once unite(begin, end) has united [0, count) and told how many links that took. Where two threads
+    /// got into each other's way, uniteLocked(begin, end) does it again. Asks for cancellation after each `grain`.
+    template <class Unite, class UniteLocked>
+    std::uint64_t countUnited(Sets const& sets, std::uint64_t count, std::size_t grain, bool isAlone,
+                              Unite const& unite, UniteLocked const& uniteLocked)
     {
-        std::uint64_t const linkCount = parallel::reduceInOrder(
-            count, grain, std::uint64_t(0),
-            [&](std::size_t begin, std::size_t end, std::uint64_t) { return uniteLoosely(begin, end); }, std::plus<>());
+        std::uint64_t linkCount = 0;
+        if (isAlone) {
+            for (std::uint64_t begin = 0; begin < count; begin += grain) {
+                Nexil::Internal::throwIfJobCancelled();
+                linkCount += unite(begin, std::min<std::uint64_t>(count, begin + grain));
+            }
+        } else {
+            linkCount = parallel::reduceInOrder(
+                count, grain, std::uint64_t(0),
+                [&](std::size_t begin, std::size_t end, std::uint64_t) { return unite(begin, end); }, std::plus<>());
+        }
         std::uint64_t const rootCount = sets.rootCount();
         if (linkCount == sets.size() - rootCount)
             return rootCount;
-        parallel::forRange(count, grain, uniteSafely);
+        parallel::forRange(count, grain, uniteLocked);
         return sets.rootCount();
     }
 
@@ -147,27 +156,25 @@ namespace {
         Order const order = judgeOrder(faces, ranges);
         // Threads that want the same cache lines all the time are slower than one that has them all to itself.
         bool const isAlone =
-            parallel::threadCount() == 1 || faces.faceCount() < kParallelFaces ||
-            (!order.isByPoint && faces.pointCount() <= kCachedPoints && faces.faceCount() <= kMostFacesOfOneThread);
-        auto const unite = [&]<Way way>(std::integral_constant<Way, way>, auto parents, std::uint64_t begin,
-                                        std::uint64_t end) {
+            parallel::threadCount() == 1 || faces.cornerCount() < kParallelCorners ||
+            (!order.isByPoint && faces.pointCount() <= kCachedPoints && faces.cornerCount() <= kMostCornersAlone);
+        auto const unite = [&]<Way way>(auto parents, std::uint64_t begin, std::uint64_t end) {
             return uniteFaces<way>(parents, faces.points(), faces.pointCount(), ranges, begin, end);
         };
-        auto const askFirst = std::integral_constant<Way, Way::AskFirst>();
-        auto const loosely = std::integral_constant<Way, Way::Loosely>();
-        auto const locked = std::integral_constant<Way, Way::Locked>();
-        auto const uniteAny = [&](std::uint64_t begin, std::uint64_t end) {
-            if (isAlone)
-                return order.isByFace ? unite(askFirst, sets.parentsOfOneThread(), begin, end)
-                                      : unite(loosely, sets.parentsOfOneThread(), begin, end);
-            return order.isByFace ? unite(askFirst, sets.parents(), begin, end)
-                                  : unite(locked, sets.parents(), begin, end);
-        };
         auto const uniteLocked = [&](std::uint64_t begin, std::uint64_t end) {
-            unite(locked, sets.parents(), begin, end);
+            return unite.template operator()<Way::Locked>(sets.parents(), begin, end);
         };
-        return countUnited(sets, faces.faceCount(), isAlone ? kMostFacesOfOneThread : grain::kFaces, uniteAny,
-                           uniteLocked);
+        auto const uniteBest = [&](std::uint64_t begin, std::uint64_t end) {
+            if (order.isByFace)
+                return isAlone ? unite.template operator()<Way::AskFirst>(sets.parentsOfOneThread(), begin, end)
+                               : unite.template operator()<Way::AskFirst>(sets.parents(), begin, end);
+            return isAlone ? unite.template operator()<Way::Loosely>(sets.parentsOfOneThread(), begin, end)
+                           : uniteLocked(begin, end);
+        };
+        std::uint64_t const cornersOfFace = faces.cornerCount() / std::max<std::uint64_t>(1, faces.faceCount());
+        return countUnited(sets, faces.faceCount(),
+                           grain::kCorners / std::clamp<std::uint64_t>(cornersOfFace, 3, grain::kCorners), isAlone,
+                           uniteBest, uniteLocked);
     }
 
     int components(MeshFaces const& faces)
@@ -200,10 +207,10 @@ namespace {
             });
             return linkCount;
         };
-        auto const uniteSafely = [&](std::uint64_t begin, std::uint64_t end) {
+        auto const uniteLocked = [&](std::uint64_t begin, std::uint64_t end) {
             unitePoints(begin, end, [&](unsigned int a, unsigned int b) { sets.unite(a, b); });
         };
-        std::uint64_t const count = countUnited(sets, pointCount, grain::kPoints, uniteLoosely, uniteSafely);
+        std::uint64_t const count = countUnited(sets, pointCount, grain::kPoints, false, uniteLoosely, uniteLocked);
         return static_cast<int>(static_cast<std::uint32_t>(count - 1));
     }
 

@@ -75,10 +75,10 @@ namespace {
                 Internal::forEachConfiguration([&]<class Traits>() {
                     if (Nexil::dynamicPtrCast<VoxelTopology<Traits>>(component)) {
                         add(component);
-                        addContainers<Traits>(held.name);
+                        addContainers<Traits>(held.name, component->name());
                     } else if (Nexil::dynamicPtrCast<PointTopology<Traits>>(component)) {
                         add(component);
-                        addChannels<Traits>(held.name);
+                        addChannels<Traits>(held.name, component->name());
                     }
                 });
             }
@@ -86,22 +86,29 @@ namespace {
         }
 
     private:
+        // What is targeted under one name is looked for under its own name in a volume: where they differ it would be lost.
         template <class Traits>
-        void addContainers(Nexil::String const& topologyName)
+        void addContainers(Nexil::String const& topologyName, Nexil::String const& ownName)
         {
             for (auto const& held : proxies_.containers)
                 if (held.target == topologyName) {
-                    add(Nexil::dynamicPtrCast<Container<Traits>>(held.proxy->getVldComponent()));
-                    addChannels<Traits>(held.name);
+                    auto const container = Nexil::dynamicPtrCast<Container<Traits>>(held.proxy->getVldComponent());
+                    isSound_ = isSound_ && container && topologyName == ownName;
+                    if (!isSound_)
+                        return;
+                    add(container);
+                    addChannels<Traits>(held.name, container->name());
                 }
         }
 
         template <class Traits>
-        void addChannels(Nexil::String const& targetName)
+        void addChannels(Nexil::String const& targetName, Nexil::String const& ownName)
         {
             for (auto const& held : proxies_.channels)
-                if (held.target == targetName)
+                if (held.target == targetName) {
+                    isSound_ = isSound_ && targetName == ownName;
                     add(Nexil::dynamicPtrCast<Channel<Traits>>(held.proxy->getVldComponent()));
+                }
         }
 
         void add(Nexil::Ptr<VLD::Component> component)
