@@ -82,14 +82,33 @@ namespace {
         return distance + reach <= -range.inner - slack ? Place::Inside : Place::Near;
     }
 
+    /// Calls visit(origin), asking for cancellation in between.
     template <int Width, class Visit>
     void forEachTile(Coordinate const& low, Coordinate const& high, Visit const& visit)
     {
         // Within the limits, the step behind the last tile still fits an integer.
         for (int x = tileStart<Width>(low.x); x <= high.x; x += Width)
-            for (int y = tileStart<Width>(low.y); y <= high.y; y += Width)
+            for (int y = tileStart<Width>(low.y); y <= high.y; y += Width) {
+                Nexil::Internal::throwIfJobCancelled();
                 for (int z = tileStart<Width>(low.z); z <= high.z; z += Width)
                     visit(Coordinate{x, y, z});
+            }
+    }
+
+    /// Whether one sphere alone has more elements than can be numbered: by the voxels of its shell, and by the inner tiles that
+    /// its core must hold.
+    template <class Traits>
+    bool isTooLarge(Sphere const& sphere, Range const& range, double voxelSize)
+    {
+        auto const volume = [=](double radius) {
+            double const r = std::max(radius, 0.0) / voxelSize;
+            return 4.0 / 3.0 * std::numbers::pi * r * r * r;
+        };
+        constexpr double kWidth = Traits::kInnerWidth;
+        double const core = sphere.radius - range.inner;
+        double const shellVoxels = volume(sphere.radius) - volume(core);
+        double const coreTiles = volume(core - kWidth * std::numbers::sqrt3 * voxelSize) / (kWidth * kWidth * kWidth);
+        return std::max(shellVoxels, coreTiles * Traits::kInnerCells) >= kNoElement;
     }
 
     template <class Traits>
@@ -103,7 +122,8 @@ namespace {
         Coordinate low;
         Coordinate high;
         if (!Internal::voxelOfPoint(sphere.centre - extent, voxelSize, low) ||
-            !Internal::voxelOfPoint(sphere.centre + extent, voxelSize, high)) {
+            !Internal::voxelOfPoint(sphere.centre + extent, voxelSize, high) ||
+            isTooLarge<Traits>(sphere, range, voxelSize)) {
             touched.isWithinLimits = false;
             return;
         }

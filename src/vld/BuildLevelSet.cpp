@@ -3,9 +3,11 @@
 #include <nexil/parallel/Parallel.h>
 #include <vld/internal/TopologyAssembly.h>
 
+#include <atomic>
 #include <cmath>
 #include <limits>
 #include <numbers>
+#include <optional>
 
 namespace VLD::TileTree3D::Internal {
 
@@ -162,18 +164,31 @@ namespace {
             found.insides.push_back(inner);
     }
 
-    /// Leaf tiles near the surface, and inner tiles that have cells inside.
+    /// No more elements than the tiles will have.
     template <class Traits>
-    FoundTiles findTiles(VoxelBox const& box, Judge const& judge)
+    std::uint64_t elementsOf(FoundTiles const& found)
+    {
+        return found.leaves.size() * Traits::kLeafVoxels + found.insides.size() * Traits::kInnerCells;
+    }
+
+    /// Leaf tiles near the surface, and inner tiles that have cells inside; nothing when they have too many elements.
+    template <class Traits>
+    std::optional<FoundTiles> findTiles(VoxelBox const& box, Judge const& judge)
     {
         Blocks<Traits> const blocks(box);
         std::uint64_t const chunkCount = (blocks.count() + grain::kBlocks - 1) / grain::kBlocks;
         Nexil::Array<FoundTiles> chunks;
         chunks.resize(chunkCount);
+        std::atomic<std::uint64_t> elementCount{0};
         Nexil::parallel::forRange(chunkCount, 1, [&](std::size_t first, std::size_t last) {
             for (std::size_t block = first * grain::kBlocks;
                  block < std::min<std::uint64_t>(last * grain::kBlocks, blocks.count()); ++block) {
+                // More than can be numbered is told before it fills the memory.
+                if (elementCount.load(std::memory_order_relaxed) >= kNoElement)
+                    return;
+                Nexil::Internal::throwIfJobCancelled();
                 FoundTiles& found = chunks[block / grain::kBlocks];
+                std::uint64_t const before = elementsOf<Traits>(found);
                 Coordinate const tile = blocks.firstTile(block);
                 Side const side = blocks.isWhole(tile)
                                       ? judge.sideOf(blocks.originOf(tile), Blocks<Traits>::kBlockWidth)
@@ -182,8 +197,11 @@ namespace {
                     blocks.forEachTile(tile, [&](Coordinate const& inner) { found.insides.push_back(inner); });
                 else if (side == Side::Near)
                     blocks.forEachTile(tile, [&](Coordinate const& inner) { findInTile<Traits>(judge, inner, found); });
+                elementCount.fetch_add(elementsOf<Traits>(found) - before, std::memory_order_relaxed);
             }
         });
+        if (elementCount.load() >= kNoElement)
+            return std::nullopt;
         FoundTiles all;
         for (FoundTiles const& found : chunks) {
             for (Coordinate const& leaf : found.leaves)
@@ -216,9 +234,11 @@ Grid<Traits> buildLevelSet(GridDescription const& description, VoxelBox const& b
         return {};
     double const voxelSize = description.voxelSize;
     Judge const judge(box, band, voxelSize, field);
-    FoundTiles found = findTiles<Traits>(box, judge);
+    auto found = findTiles<Traits>(box, judge);
+    if (!found)
+        return {};
     auto topology =
-        assembleTopology<Traits>(description.topologyName, std::move(found.leaves), std::move(found.insides));
+        assembleTopology<Traits>(description.topologyName, std::move(found->leaves), std::move(found->insides));
     if (!topology)
         return {};
 

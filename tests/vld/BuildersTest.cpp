@@ -313,6 +313,9 @@ TYPED_TEST(Builders, WhatCannotBeBuiltGivesAnEmptyGrid)
         EXPECT_FALSE(plane(good, {{0, 0, 0}, {1, 1, 1}}, width));
         EXPECT_FALSE(points(good, {{0, 0, 0}}, {1.0f}, width));
     }
+    // More elements than 32 bits count are told at once, not when the memory is full: a shell, and a core.
+    EXPECT_FALSE(points(good, {{0, 0, 0}}, {20000.0f}, 3));
+    EXPECT_FALSE(points(good, {{0, 0, 0}}, {1e6f}, 1));
     constexpr int kEnd = kCoordinateLimit;
     EXPECT_TRUE(voxels(good, {}, {}));
     EXPECT_FALSE(voxels(good, {{0, 0, 0}}, {1, 2}));

@@ -223,6 +223,10 @@ TEST(VolumeConversion, AnObjectThatIsNoVolumeStaysWhole)
         populateVolume(o);
         setElementCount(sVoxelComp, 3, o);
     });
+    without([](Object& o) {
+        populateVolume(o);
+        setProperty(o, "values", Nexil::makePtr<FloatArray>(FloatArray{1}));
+    });
     auto withArray = [&](char const* name, char const* key, Nexil::Any const& array) {
         without([&](Object& o) {
             populateLevelSet(o);

@@ -129,10 +129,13 @@ namespace {
         for (auto const& name : getGeoPropNamesByPrototype(object, *getComponentGeoPropPrototype()))
             if (name != sVoxelComp)
                 return false;
-        for (Nexil::String const& name : object.keys())
+        for (Nexil::String const& name : object.keys()) {
+            if (object.propertyInfo(name).arraySize != 0)
+                return false;
             if (auto const part = getPropertyAs<ObjectPtr>(object, name))
                 if (part->propertyInfo(sData).arraySize != 0 || part->propertyInfo(sIndices).arraySize != 0)
                     return false;
+        }
         return true;
     }
 
