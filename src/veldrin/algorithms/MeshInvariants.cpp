@@ -108,10 +108,13 @@ namespace {
         }
     }
 
+    /// Returns how many links that took.
     template <Way way, class Parents, class Ranges>
-    std::uint64_t uniteFaces(Parents parents, unsigned int const* points, std::uint64_t pointCount, Ranges ranges,
-                             std::uint64_t begin, std::uint64_t end)
+    std::uint64_t uniteFaces(Parents parents, MeshFaces const& faces, Ranges ranges, std::uint64_t begin,
+                             std::uint64_t end)
     {
+        unsigned int const* const points = faces.points();
+        std::uint64_t const pointCount = faces.pointCount();
         std::uint64_t linkCount = 0;
         for (std::uint64_t face = begin; face < end; ++face) {
             auto const [first, last] = ranges[face];
@@ -158,17 +161,14 @@ namespace {
         bool const isAlone =
             parallel::threadCount() == 1 || faces.cornerCount() < kParallelCorners ||
             (!order.isByPoint && faces.pointCount() <= kCachedPoints && faces.cornerCount() <= kMostCornersAlone);
-        auto const unite = [&]<Way way>(auto parents, std::uint64_t begin, std::uint64_t end) {
-            return uniteFaces<way>(parents, faces.points(), faces.pointCount(), ranges, begin, end);
-        };
         auto const uniteLocked = [&](std::uint64_t begin, std::uint64_t end) {
-            return unite.template operator()<Way::Locked>(sets.parents(), begin, end);
+            return uniteFaces<Way::Locked>(sets.parents(), faces, ranges, begin, end);
         };
         auto const uniteBest = [&](std::uint64_t begin, std::uint64_t end) {
             if (order.isByFace)
-                return isAlone ? unite.template operator()<Way::AskFirst>(sets.parentsOfOneThread(), begin, end)
-                               : unite.template operator()<Way::AskFirst>(sets.parents(), begin, end);
-            return isAlone ? unite.template operator()<Way::Loosely>(sets.parentsOfOneThread(), begin, end)
+                return isAlone ? uniteFaces<Way::AskFirst>(sets.parentsOfOneThread(), faces, ranges, begin, end)
+                               : uniteFaces<Way::AskFirst>(sets.parents(), faces, ranges, begin, end);
+            return isAlone ? uniteFaces<Way::Loosely>(sets.parentsOfOneThread(), faces, ranges, begin, end)
                            : uniteLocked(begin, end);
         };
         std::uint64_t const cornersOfFace = faces.cornerCount() / std::max<std::uint64_t>(1, faces.faceCount());

@@ -20,9 +20,9 @@ ByteSource::ByteSource(std::streambuf& stream, std::uint64_t position, std::uint
       windowSize_(readAhead == ReadAhead::None
                       ? 1
                       : static_cast<std::size_t>(std::min<std::uint64_t>(kWindowBytes, end - position + 1))),
-      nextFill_(kFirstFillBytes), windowPosition_(position), streamPosition_(position)
+      window_(std::make_unique_for_overwrite<char[]>(windowSize_)), nextFill_(kFirstFillBytes),
+      windowPosition_(position), streamPosition_(position)
 {
-    window_ = std::make_unique_for_overwrite<char[]>(windowSize_);
 }
 
 bool ByteSource::fill()

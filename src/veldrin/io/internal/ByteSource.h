@@ -45,8 +45,8 @@ private:
     std::streambuf& stream_;
     std::uint64_t end_;
     ReadAhead readAhead_;
-    std::unique_ptr<char[]> window_;
     std::size_t windowSize_;
+    std::unique_ptr<char[]> window_;
     std::size_t nextFill_;   // bytes to read ahead next
     std::size_t filled_ = 0; // bytes in the window
     std::size_t taken_ = 0;  // bytes of them already taken
