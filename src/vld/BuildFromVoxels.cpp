@@ -2,7 +2,6 @@
 
 #include <nexil/JobCancel.h>
 #include <nexil/parallel/Parallel.h>
-#include <nexil/parallel/Scan.h>
 #include <vld/TileHash.h>
 #include <vld/internal/ElementWrites.h>
 #include <vld/internal/TileNumbering.h>

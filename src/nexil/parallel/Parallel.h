@@ -4,6 +4,7 @@
 #include <nexil/parallel/PlainThreads.h>
 
 #include <tbb/blocked_range.h>
+#include <tbb/global_control.h>
 #include <tbb/parallel_for.h>
 #include <tbb/parallel_invoke.h>
 #include <tbb/parallel_reduce.h>
@@ -23,6 +24,13 @@
 /// the first exception of a body. Loops and reductions ask for cancellation once per chunk unless they say otherwise.
 /// Ranges of one grain or less stay on the calling thread. A grain is at least 1.
 namespace Nexil::parallel {
+
+/// How many threads a loop started here may run on, for who keeps a table per thread. Results must not depend on it.
+[[nodiscard]] inline std::size_t threadCount()
+{
+    auto const allowed = tbb::global_control::active_value(tbb::global_control::max_allowed_parallelism);
+    return std::min(allowed, static_cast<std::size_t>(std::max(1, tbb::this_task_arena::max_concurrency())));
+}
 
 /// Calls body(begin, end) over disjoint chunks that cover [0, count), and does not ask for cancellation: for loops that
 /// leave their target half changed when they are cut short, and are done in a blink. Where the cuts lie depends on the

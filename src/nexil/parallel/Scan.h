@@ -3,9 +3,6 @@
 #include <nexil/Array.h>
 #include <nexil/parallel/Parallel.h>
 
-#include <tbb/global_control.h>
-#include <tbb/task_arena.h>
-
 #include <algorithm>
 #include <cstddef>
 #include <utility>
@@ -15,13 +12,6 @@
 ///
 ///     auto const faces = parallel::indicesWhere<unsigned int>(faceCount, grain::kFaces, isDegenerate);
 namespace Nexil::parallel {
-
-/// How many threads a loop started here may run on, for who keeps a table per thread. Results must not depend on it.
-[[nodiscard]] inline std::size_t threadCount()
-{
-    auto const allowed = tbb::global_control::active_value(tbb::global_control::max_allowed_parallelism);
-    return std::min(allowed, static_cast<std::size_t>(std::max(1, tbb::this_task_arena::max_concurrency())));
-}
 
 /// Calls body(begin, end, before) for each range of `grain` that [0, count) is cut into, where `before` is the sum of
 /// total(begin, end) over the ranges before it, added from left to right. Between the two, prepare(sum over all ranges)

@@ -1,6 +1,6 @@
 #include <veldrin/algorithms/HalfEdgeDataStructure.h>
 
-#include <nexil/parallel/Scan.h>
+#include <nexil/parallel/Parallel.h>
 #include <veldrin/algorithms/internal/FaceBlocks.h>
 #include <veldrin/algorithms/internal/FaceCorners.h>
 #include <veldrin/algorithms/internal/MeshFaces.h>

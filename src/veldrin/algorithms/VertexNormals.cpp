@@ -1,7 +1,6 @@
 #include <veldrin/algorithms/MeshNormals.h>
 
 #include <nexil/parallel/Parallel.h>
-#include <nexil/parallel/Scan.h>
 #include <veldrin/algorithms/internal/FaceOrderSums.h>
 #include <veldrin/algorithms/internal/PendingOutput.h>
 
