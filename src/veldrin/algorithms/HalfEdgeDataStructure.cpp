@@ -7,6 +7,7 @@
 #include <veldrin/geometry/Prototypes.h>
 
 #include <algorithm>
+#include <type_traits>
 #include <vector>
 
 // The table is a counting sort of all edge uses by owner, in blocks of faces: count per point, running sum, put in place.
@@ -194,21 +195,44 @@ namespace {
         sortMany(folds.begin(), folds.end());
     }
 
+    /// Distinct edges among `size` uses; a size that is a std::integral_constant takes half the time.
+    template <class Size>
+    inline unsigned int distinctAmong(unsigned int const* uses, Size size)
+    {
+        unsigned int repeated = 0;
+        for (unsigned int i = 1; i < size; ++i) {
+            unsigned int isRepeated = 0;
+            for (unsigned int j = 0; j < i; ++j)
+                isRepeated |= isSameEdge(uses[i], uses[j]);
+            repeated += isRepeated;
+        }
+        return size - repeated;
+    }
+
+    template <unsigned int size>
+    inline unsigned int distinctAmong(unsigned int const* uses)
+    {
+        return distinctAmong(uses, std::integral_constant<unsigned int, size>());
+    }
+
     /// Distinct edges of a group; sorts a large one.
-    std::uint64_t finishGroup(unsigned int* first, unsigned int* last)
+    inline std::uint64_t finishGroup(unsigned int* first, unsigned int* last)
     {
         auto const size = static_cast<std::uint64_t>(last - first);
-        std::uint64_t repeated = 0;
-        if (size <= kSmallGroup) {
-            for (std::uint64_t i = 1; i < size; ++i) {
-                unsigned int isRepeated = 0;
-                for (std::uint64_t j = 0; j < i; ++j)
-                    isRepeated |= isSameEdge(first[i], first[j]);
-                repeated += isRepeated;
-            }
-            return size - repeated;
+        switch (size) {
+        case 0:
+        case 1: return size;
+        case 2: return distinctAmong<2>(first);
+        case 3: return distinctAmong<3>(first);
+        case 4: return distinctAmong<4>(first);
+        case 5: return distinctAmong<5>(first);
+        case 6: return distinctAmong<6>(first);
+        default: break;
         }
+        if (size <= kSmallGroup)
+            return distinctAmong(first, static_cast<unsigned int>(size));
         sortMany(first, last);
+        std::uint64_t repeated = 0;
         for (std::uint64_t i = 1; i < size; ++i)
             repeated += isSameEdge(first[i], first[i - 1]);
         return size - repeated;
