@@ -39,7 +39,8 @@ class Usage(tool.ToolTest):
                                (["diff", "text.zon", "text.zon"], "text.zon: bad header"),
                                (["verify", "text.zon"], "text.zon: no zon file"),
                                (["import", "folder.off", "x.zon"], "folder.off: cannot be read: Is a directory"),
-                               (["import", "mesh.xyz", "x.zon"], "mesh.xyz: meshes are read from")):
+                               (["import", "mesh.xyz", "x.zon"], "mesh.xyz: meshes are read from"),
+                               (["export", "text.zon", "x.stl"], "x.stl: meshes are written to .obj")):
             self.assertIn(words, self.zon(*command, code=2).stderr)
 
     def test_a_report_that_cannot_be_printed_is_a_failure(self):

@@ -5,6 +5,7 @@
 #include "JsonReport.h"
 #include "MeshArrays.h"
 #include "OutputFile.h"
+#include "TextInput.h"
 #include "VdbFile.h"
 
 #include <veldrin/geometry/GeoProperties.h>
@@ -224,7 +225,13 @@ namespace {
     ExitCode runExport(Options const& options)
     {
         checkIsOtherFile(options.input, options.output);
-        return fileEnding(options.output) == ".vdb" ? exportVolumes(options) : exportMeshes(options);
+        auto const ending = fileEnding(options.output);
+        if (ending == ".vdb")
+            return exportVolumes(options);
+        if (ending != ".obj" && !ending.empty())
+            throw Failure(fmt::format("{}: meshes are written to .obj, volumes to .vdb, but not to {}", options.output,
+                                      inQuotes(ending)));
+        return exportMeshes(options);
     }
 
 } // namespace
@@ -235,7 +242,10 @@ void addExport(CLI::App& app, Run& run)
     auto* const command =
         app.add_subcommand("export", "Turns a zon file into an OBJ file, or its volumes into a VDB file");
     command->add_option("in", options->input, "zon file")->required();
-    command->add_option("out", options->output, "File to write: .vdb for volumes, else OBJ")->required();
+    command
+        ->add_option("out", options->output,
+                     "File to write: .obj or a name without ending for meshes, .vdb for volumes")
+        ->required();
     command->add_flag("--json", options->wantsJson, "Report as JSON on stdout");
     command->callback([options, &run] { run = [options] { return runExport(*options); }; });
 }
