@@ -2,6 +2,7 @@
 
 #include <nexil/parallel/Parallel.h>
 #include <veldrin/algorithms/internal/CountUnited.h>
+#include <veldrin/algorithms/internal/MeshOrder.h>
 
 #include <algorithm>
 
@@ -76,40 +77,11 @@ namespace {
         return linkCount;
     }
 
-    /// How a mesh lies in memory, judged by a few of its faces.
-    struct Order {
-        bool isByFace = false;  ///< faces share points with the next one more often than chance has it
-        bool isByPoint = false; ///< most faces have points with near numbers
-    };
-
-    template <class Ranges>
-    Order judgeOrder(MeshFaces const& faces, Ranges const& ranges)
-    {
-        constexpr std::uint64_t kLookedAt = 64;
-        constexpr unsigned int kFar = 1024;
-        unsigned int const* const points = faces.points();
-        std::uint64_t sharingCount = 0;
-        std::uint64_t nearCount = 0;
-        for (std::uint64_t i = 0; i < kLookedAt && faces.faceCount() > 1; ++i) {
-            std::uint64_t const face = (faces.faceCount() - 1) * i / kLookedAt;
-            IndexRange const range = ranges[face];
-            IndexRange const next = ranges[face + 1];
-            if (range.end - range.begin < 2 || next.end - next.begin < 2)
-                continue;
-            auto const [lower, upper] = std::minmax(points[range.begin], points[range.begin + 1]);
-            nearCount += upper - lower <= kFar ? 1 : 0;
-            auto const* const end = points + std::min(range.end, range.begin + 4);
-            auto const* const nextEnd = points + std::min(next.end, next.begin + 4);
-            sharingCount += std::find_first_of(points + range.begin, end, points + next.begin, nextEnd) != end ? 1 : 0;
-        }
-        return {sharingCount > kLookedAt / 8, nearCount > kLookedAt / 2};
-    }
-
     template <class Ranges>
     std::uint64_t componentCount(MeshFaces const& faces, Ranges const& ranges)
     {
         PointSets sets(faces.pointCount());
-        Order const order = judgeOrder(faces, ranges);
+        MeshOrder const order = judgeOrder(faces);
         // Threads that want the same cache lines all the time are slower than one that has them all to itself.
         bool const isAlone =
             parallel::threadCount() == 1 || faces.cornerCount() < kParallelCorners ||

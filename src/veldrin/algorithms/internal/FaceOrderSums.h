@@ -4,6 +4,7 @@
 #include <nexil/JobCancel.h>
 #include <nexil/parallel/Parallel.h>
 #include <veldrin/algorithms/internal/FaceContributions.h>
+#include <veldrin/algorithms/internal/MeshOrder.h>
 #include <veldrin/algorithms/internal/PointOwners.h>
 
 #include <algorithm>
@@ -42,13 +43,13 @@ public:
 
     void addInParallel(std::size_t threadCount)
     {
-        if (faces_.pointCount() > kMostNearPoints) {
+        if (Geometry::judgeOrder(faces_).isLocal) {
             PointOwners const owners(faces_, std::min(threadCount, PointOwners::kMostParts));
             if (owners.areMostlyApart())
                 return addByParts(owners);
-            if (threadCount > kMostTakingTurns)
-                return addByStripes(threadCount);
         }
+        if (faces_.pointCount() > kMostNearPoints && threadCount > kMostTakingTurns)
+            return addByStripes(threadCount);
         addInTurns();
     }
 
