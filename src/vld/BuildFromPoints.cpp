@@ -95,35 +95,51 @@ namespace {
             }
     }
 
-    /// Whether one sphere alone has more elements than can be numbered: by the voxels of its shell, and by the inner tiles that
-    /// its core must hold.
-    template <class Traits>
-    bool isTooLarge(Sphere const& sphere, Range const& range, double voxelSize)
+    bool makesNothing(Sphere const& sphere)
     {
-        auto const volume = [=](double radius) {
-            double const r = std::max(radius, 0.0) / voxelSize;
+        auto const& c = sphere.centre;
+        return !std::isfinite(c.x) || !std::isfinite(c.y) || !std::isfinite(c.z) || !std::isfinite(sphere.radius) ||
+               !(sphere.radius > 0);
+    }
+
+    /// How many entries of `Touched` a sphere will make, on an average over where it may lie among the tiles.
+    template <class Traits>
+    double touchedCount(Sphere const& sphere, Range const& range, double voxelSize)
+    {
+        // Tiles of which the centre lies within a radius.
+        auto const tiles = [](double radius, double width) {
+            double const r = std::max(radius, 0.0) / width;
             return 4.0 / 3.0 * std::numbers::pi * r * r * r;
         };
-        constexpr double kWidth = Traits::kInnerWidth;
-        double const core = sphere.radius - range.inner;
-        double const shellVoxels = volume(sphere.radius) - volume(core);
-        double const coreTiles = volume(core - kWidth * std::numbers::sqrt3 * voxelSize) / (kWidth * kWidth * kWidth);
-        return std::max(shellVoxels, coreTiles * Traits::kInnerCells) >= kNoElement;
+        auto const reach = [=](int width) { return (width - 1) * 0.5 * std::numbers::sqrt3 * voxelSize; };
+        double const outer = sphere.radius + range.outer + reach(Traits::kDataWidth);
+        double const core = sphere.radius - range.inner - reach(Traits::kInnerWidth);
+        double const cellWidth = Traits::kDataWidth * voxelSize;
+        return tiles(outer, cellWidth) - tiles(core, cellWidth) + tiles(core, Traits::kInnerWidth * voxelSize);
+    }
+
+    /// Whether spheres touch too many tiles. Told before any is: it is their entries that take memory.
+    template <class Traits>
+    bool touchTooMuch(Spheres const& spheres, Range const& range, double voxelSize)
+    {
+        double count = 0;
+        for (std::uint64_t point = 0; point < spheres.count(); ++point)
+            if (!makesNothing(spheres[point]))
+                count += touchedCount<Traits>(spheres[point], range, voxelSize);
+        return count > kMostTouchedTiles;
     }
 
     template <class Traits>
     void touch(Sphere const& sphere, unsigned int point, Range const& range, float voxelSize, Touched& touched)
     {
-        auto isFinite = [](double3 const& v) { return std::isfinite(v.x) && std::isfinite(v.y) && std::isfinite(v.z); };
-        if (!isFinite(sphere.centre) || !std::isfinite(sphere.radius) || !(sphere.radius > 0))
+        if (makesNothing(sphere))
             return;
         double const reach = sphere.radius + range.outer;
         double3 const extent{reach, reach, reach};
         Coordinate low;
         Coordinate high;
         if (!Internal::voxelOfPoint(sphere.centre - extent, voxelSize, low) ||
-            !Internal::voxelOfPoint(sphere.centre + extent, voxelSize, high) ||
-            isTooLarge<Traits>(sphere, range, voxelSize)) {
+            !Internal::voxelOfPoint(sphere.centre + extent, voxelSize, high)) {
             touched.isWithinLimits = false;
             return;
         }
@@ -144,11 +160,21 @@ namespace {
         });
     }
 
+    /// One part of all chunks, which give it up.
     template <class T>
-    void append(Nexil::Array<T>& all, Nexil::Array<T> const& part)
+    Nexil::Array<T> joined(Nexil::Array<Touched>& chunks, Nexil::Array<T> Touched::*part)
     {
-        for (T const& element : part)
-            all.push_back(element);
+        std::uint64_t count = 0;
+        for (Touched const& chunk : chunks)
+            count += (chunk.*part).size();
+        Nexil::Array<T> all;
+        all.reserve(count);
+        for (Touched& chunk : chunks) {
+            for (T const& element : chunk.*part)
+                all.push_back(element);
+            chunk.*part = {};
+        }
+        return all;
     }
 
     template <class Traits>
@@ -163,13 +189,10 @@ namespace {
                 touch<Traits>(spheres[point], static_cast<unsigned int>(point), range, voxelSize,
                               chunks[point / grain::kPoints]);
         });
-        Touched all;
-        for (Touched const& chunk : chunks) {
-            append(all.leaves, chunk.leaves);
-            append(all.insideCells, chunk.insideCells);
-            append(all.insideTiles, chunk.insideTiles);
+        Touched all{joined(chunks, &Touched::leaves), joined(chunks, &Touched::insideCells),
+                    joined(chunks, &Touched::insideTiles)};
+        for (Touched const& chunk : chunks)
             all.isWithinLimits = all.isWithinLimits && chunk.isWithinLimits;
-        }
         Nexil::parallel::sort(all.leaves.begin(), all.leaves.end(), [](TouchedLeaf const& a, TouchedLeaf const& b) {
             return a.leaf == b.leaf ? a.point < b.point : isBefore(a.leaf, b.leaf);
         });
@@ -205,6 +228,8 @@ namespace {
     Grid<Traits> build(GridDescription const& description, Spheres const& spheres, Range const& range, float background,
                        Value const& value)
     {
+        if (touchTooMuch<Traits>(spheres, range, description.voxelSize))
+            return {};
         Touched touched = touchAll<Traits>(spheres, range, description.voxelSize);
         if (!touched.isWithinLimits)
             return {};

@@ -18,6 +18,9 @@ namespace {
         constexpr std::size_t kBlocks = 16;
     } // namespace grain
 
+    // So that an empty box of any size takes no memory.
+    constexpr std::uint64_t kMostChunks = 1 << 16;
+
     enum class Side { Outside, Inside, Near };
 
     /// Tells on which side of the surface whole cubes of voxels lie.
@@ -173,21 +176,22 @@ namespace {
 
     /// Leaf tiles near the surface, and inner tiles that have cells inside; nothing when they have too many elements.
     template <class Traits>
-    std::optional<FoundTiles> findTiles(VoxelBox const& box, Judge const& judge)
+    std::optional<FoundTiles> findTiles(VoxelBox const& box, Judge const& judge, std::uint64_t mostElements)
     {
         Blocks<Traits> const blocks(box);
-        std::uint64_t const chunkCount = (blocks.count() + grain::kBlocks - 1) / grain::kBlocks;
+        std::uint64_t const chunkBlocks = std::max<std::uint64_t>(grain::kBlocks, blocks.count() / kMostChunks + 1);
+        std::uint64_t const chunkCount = (blocks.count() + chunkBlocks - 1) / chunkBlocks;
         Nexil::Array<FoundTiles> chunks;
         chunks.resize(chunkCount);
         std::atomic<std::uint64_t> elementCount{0};
         Nexil::parallel::forRange(chunkCount, 1, [&](std::size_t first, std::size_t last) {
-            for (std::size_t block = first * grain::kBlocks;
-                 block < std::min<std::uint64_t>(last * grain::kBlocks, blocks.count()); ++block) {
+            for (std::uint64_t block = first * chunkBlocks; block < std::min(last * chunkBlocks, blocks.count());
+                 ++block) {
                 // More than can be numbered is told before it fills the memory.
-                if (elementCount.load(std::memory_order_relaxed) >= kNoElement)
+                if (elementCount.load(std::memory_order_relaxed) > mostElements)
                     return;
                 Nexil::Internal::throwIfJobCancelled();
-                FoundTiles& found = chunks[block / grain::kBlocks];
+                FoundTiles& found = chunks[block / chunkBlocks];
                 std::uint64_t const before = elementsOf<Traits>(found);
                 Coordinate const tile = blocks.firstTile(block);
                 Side const side = blocks.isWhole(tile)
@@ -200,7 +204,7 @@ namespace {
                 elementCount.fetch_add(elementsOf<Traits>(found) - before, std::memory_order_relaxed);
             }
         });
-        if (elementCount.load() >= kNoElement)
+        if (elementCount.load() > mostElements)
             return std::nullopt;
         FoundTiles all;
         for (FoundTiles const& found : chunks) {
@@ -228,13 +232,13 @@ namespace {
 
 template <class Traits>
 Grid<Traits> buildLevelSet(GridDescription const& description, VoxelBox const& box, float band,
-                           DistanceField const& field)
+                           DistanceField const& field, std::uint64_t mostElements)
 {
     if (!isUsable(description) || !isUsable(box) || !std::isfinite(band) || !(band > 0))
         return {};
     double const voxelSize = description.voxelSize;
     Judge const judge(box, band, voxelSize, field);
-    auto found = findTiles<Traits>(box, judge);
+    auto found = findTiles<Traits>(box, judge, mostElements);
     if (!found)
         return {};
     auto topology =
@@ -269,8 +273,8 @@ Grid<Traits> buildLevelSet(GridDescription const& description, VoxelBox const& b
 }
 
 template VELDRIN_PLATFORM_API Grid<SmallTiles> buildLevelSet(GridDescription const&, VoxelBox const&, float,
-                                                             DistanceField const&);
+                                                             DistanceField const&, std::uint64_t);
 template VELDRIN_PLATFORM_API Grid<WideTiles> buildLevelSet(GridDescription const&, VoxelBox const&, float,
-                                                            DistanceField const&);
+                                                            DistanceField const&, std::uint64_t);
 
 } // namespace VLD::TileTree3D::Internal

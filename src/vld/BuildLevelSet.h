@@ -7,6 +7,7 @@
 #include <vld/Grid.h>
 
 #include <algorithm>
+#include <cstdint>
 
 /// Level sets from a distance function.
 ///
@@ -40,9 +41,32 @@ namespace Internal {
         return {(origin.x + half) * voxelSize, (origin.y + half) * voxelSize, (origin.z + half) * voxelSize};
     }
 
+    template <class Distance>
+    [[nodiscard]] DistanceField fieldOf(Distance const& distance)
+    {
+        DistanceField field;
+        field.function = &distance;
+        field.at = [](void const* function, Veldrin::Math::double3 const& position) {
+            return static_cast<double>((*static_cast<Distance const*>(function))(position));
+        };
+        field.fill = [](void const* function, Coordinate const& origin, int width, double voxelSize, float limit,
+                        float* distances) {
+            auto const& at = *static_cast<Distance const*>(function);
+            for (int x = 0; x < width; ++x)
+                for (int y = 0; y < width; ++y)
+                    for (int z = 0; z < width; ++z) {
+                        Coordinate const voxel = origin + Coordinate{x, y, z};
+                        auto const value = static_cast<float>(at(centreOf(voxel, 1, voxelSize)));
+                        *distances++ = std::clamp(value, -limit, limit);
+                    }
+        };
+        return field;
+    }
+
+    /// mostElements: an empty grid where tiles with more elements are found, which ends the search for them.
     template <class Traits>
     VELDRIN_PLATFORM_API Grid<Traits> buildLevelSet(GridDescription const& description, VoxelBox const& box, float band,
-                                                    DistanceField const& field);
+                                                    DistanceField const& field, std::uint64_t mostElements);
 
 } // namespace Internal
 
@@ -65,23 +89,7 @@ template <class Traits, class Distance>
 [[nodiscard]] Grid<Traits> buildLevelSet(GridDescription const& description, VoxelBox const& box, float band,
                                          Distance const& distance)
 {
-    Internal::DistanceField field;
-    field.function = &distance;
-    field.at = [](void const* function, Veldrin::Math::double3 const& position) {
-        return static_cast<double>((*static_cast<Distance const*>(function))(position));
-    };
-    field.fill = [](void const* function, Coordinate const& origin, int width, double voxelSize, float limit,
-                    float* distances) {
-        auto const& at = *static_cast<Distance const*>(function);
-        for (int x = 0; x < width; ++x)
-            for (int y = 0; y < width; ++y)
-                for (int z = 0; z < width; ++z) {
-                    Coordinate const voxel = origin + Coordinate{x, y, z};
-                    auto const value = static_cast<float>(at(Internal::centreOf(voxel, 1, voxelSize)));
-                    *distances++ = std::clamp(value, -limit, limit);
-                }
-    };
-    return Internal::buildLevelSet<Traits>(description, box, band, field);
+    return Internal::buildLevelSet<Traits>(description, box, band, Internal::fieldOf(distance), kNoElement - 1);
 }
 
 } // namespace VLD::TileTree3D

@@ -120,6 +120,13 @@ namespace {
         return findings.acceptAll(wrongChild, "wrong child in cell");
     }
 
+    template <class Traits>
+    bool canCreate(Nexil::String const& name, SharedTileLevels const& levels)
+    {
+        return !name.empty() && levels.leafOrigins && levels.leafParents && levels.innerOrigins &&
+               levels.innerChildren && areConsistent<Traits>(levels, Findings(name, false));
+    }
+
 } // namespace
 
 template <class Traits>
@@ -155,10 +162,22 @@ Nexil::Ptr<VoxelTopology<Traits>> VoxelTopology<Traits>::create(Nexil::String na
 template <class Traits>
 Nexil::Ptr<VoxelTopology<Traits>> VoxelTopology<Traits>::create(Nexil::String name, SharedTileLevels levels)
 {
-    if (name.empty() || !levels.leafOrigins || !levels.leafParents || !levels.innerOrigins || !levels.innerChildren ||
-        !areConsistent<Traits>(levels, Findings(name, false)))
+    if (!canCreate<Traits>(name, levels))
         return nullptr;
     return Nexil::makePtr<VoxelTopology>(std::move(name), std::move(levels));
+}
+
+template <class Traits>
+Nexil::Ptr<VoxelTopology<Traits>> VoxelTopology<Traits>::create(Nexil::String name, SharedTileLevels levels,
+                                                                VoxelTopology const& like)
+{
+    if (!(levels.innerOrigins == like.levels_.innerOrigins))
+        return create(std::move(name), std::move(levels));
+    if (!canCreate<Traits>(name, levels))
+        return nullptr;
+    auto made = Nexil::makeMutable<VoxelTopology>(std::move(name), like);
+    made->levels_ = std::move(levels);
+    return made;
 }
 
 template <class Traits>

@@ -64,6 +64,9 @@ public:
     [[nodiscard]] static Nexil::Ptr<VoxelTopology> create(Nexil::String name, TileLevels levels);
     /// The same from shared arrays, which stay shared; null also when one of them is null.
     [[nodiscard]] static Nexil::Ptr<VoxelTopology> create(Nexil::String name, SharedTileLevels levels);
+    /// The same; where both have one array of inner origins, what finds tiles by them is shared with `like`, too.
+    [[nodiscard]] static Nexil::Ptr<VoxelTopology> create(Nexil::String name, SharedTileLevels levels,
+                                                          VoxelTopology const& like);
 
     [[nodiscard]] Nexil::Array<Coordinate> const& leafOrigins() const noexcept { return *levels_.leafOrigins; }
     [[nodiscard]] Nexil::Array<unsigned int> const& leafParents() const noexcept { return *levels_.leafParents; }

@@ -5,6 +5,7 @@ import random
 import unittest
 
 import tool
+import zon_files
 
 try:
     import pyopenvdb as vdb
@@ -110,7 +111,8 @@ class Volumes(tool.ToolTest):
         self.write_grids("a.vdb", good, stretched, huge)
         said = self.zon("import", "a.vdb", "a.zon").stderr
         self.assertIn("grid 'stretched': its transform is not one positive scale and a translation", said)
-        self.assertIn("grid 'huge': it has more voxels than a volume holds", said)
+        self.assertIn("grid 'huge': its regions of one value cover 1073741824 blocks of 8 x 8 x 8 voxels, and more than "
+                      "16777216 are not taken", said)
         self.assertEqual(len(self.objects("a.zon")), 1)
         self.write_grids("b.vdb", stretched)
         self.assertIn("there is no grid in it that a zon file holds", self.zon("import", "b.vdb", "b.zon", code=2).stderr)
@@ -144,7 +146,22 @@ class Volumes(tool.ToolTest):
         self.assertIn("object 0: its surface is not closed: 4 boundary edges", said)
         for source, size in (("solid.zon", "0.1"), *(("cube.zon", size) for size in ("0", "-1", "nan", "inf", "x"))):
             self.zon("volume", "from-mesh", source, "x.zon", f"--voxel-size={size}", code=2)
+        for options, wanted in ((("--voxel-size=1e-4", "--band=1e6"), "more than the memory of this machine holds"),
+                                (("--voxel-size=2e-5",), "with voxels that small its level set has some 9e+10 voxels"),
+                                (("--voxel-size=1e-5",), "OpenVDB takes no voxels of size 1e-05")):
+            self.assertIn(wanted, self.zon("volume", "from-mesh", "cube.zon", "x.zon", *options, code=2).stderr)
         self.assertNotIn("x.zon", self.names())
+
+    def test_only_states_go_into_the_grid_of_another_channel(self):
+        values = tuple(range(1, 9))
+        self.write("a.zon", zon_files.stream([zon_files.volume(
+            heat=("f", values), heat_active=("?", [True] * 7 + [False]), wind=("f", values),
+            wind_active=("f", values), lone_active=("?", [True] * 8))]))
+        self.zon("export", "a.zon", "a.vdb")
+        self.zon("import", "a.vdb", "b.zon")
+        self.assertEqual([set(properties) - {"name", "voxel_tile_tree"} for _, properties, _ in self.objects("b.zon")],
+                         [{"voxel_heat", "voxel_heat_active"}, {"voxel_lone_active"}, {"voxel_wind"},
+                          {"voxel_wind_active"}])
 
 
 class VolumesOfPoints(tool.ToolTest):
@@ -166,6 +183,13 @@ class VolumesOfPoints(tool.ToolTest):
         self.assertEqual(self.dumped("balls.zon", "voxel_tile_tree", "indices"), "", "they only count up")
         self.assertEqual(self.zon("volume", "info", "two.zon").stdout, "object 0: no volume\n")
         self.zon("volume", "from-points", "two.zon", "x.zon", "--radius", "1e9", "--voxel-size", "1e-9", code=2)
+
+    def test_the_dump_shows_tiles_however_deep_a_volume_lies(self):
+        deep = zon_files.volume(heat=("f", range(8)))
+        for name in ("inner", "outer"):
+            deep = {name: zon_files.part(zon_files.obj(deep))}
+        self.write("deep.zon", zon_files.stream([deep]))
+        self.assertIn("indices: [  ] 0 elements", self.zon("dump", "deep.zon").stdout)
 
 
 if __name__ == "__main__":

@@ -3,7 +3,7 @@ import itertools
 import struct
 
 # What an array of numbers is, by its form in struct: the type, and how many numbers make an element.
-ARRAYS = {"I": (122, 1), "f": (128, 1), "3f": (151, 3), "?": (130, 1)}
+ARRAYS = {"I": (122, 1), "f": (128, 1), "3i": (149, 3), "3f": (151, 3), "?": (130, 1)}
 NULL = b"\xc0"
 
 
@@ -35,6 +35,10 @@ def part(payload):
 
 def text(value):
     return frame(11, value)
+
+
+def single(value):
+    return frame(8, b"\xca" + struct.pack(">f", value))
 
 
 def blob(memory):
@@ -81,3 +85,24 @@ def stream(top, shared=()):
     *starts, end = itertools.accumulate(map(len, items), initial=len(head) + 9)
     entries = [(start, 1) for start in starts[len(shared):]] + [(start, 0) for start in starts[:len(shared)]]
     return head + pack(end) + b"".join(items) + b"".join(pack(number) for entry in entries for number in entry)
+
+
+def volume(**channels):
+    """One small inner tile without leaf tiles; each channel has a form and the values of its eight cells."""
+    sizes = dict(zip(("voxelTileWidth", "voxelTileDataWidth", "voxelOffsetType", "voxelInnerLevels"),
+                     (frame(2, each) for each in (2, 4, 0, 1))))
+    none = array("I", ())
+    tiles = {"count": frame(2, 8), "vld_component": text("voxel_topology"), "name": text("voxel_component"), **sizes,
+             "leaf_origins": array("3i", ()), "leaf_parents": none, "inner_origins": array("3i", (0, 0, 0)),
+             "inner_children": array("I", [0xFFFFFFFF] * 8)}
+    tree = {"indices": none, "target": text("voxel_component"), "depends_on": frame(131, [1, []]),
+            "vld_component": text("container"), "name": text("voxel_tile_tree"), "topology": text("voxel_component"),
+            "voxelSize": single(1)}
+    geometry = {"voxel_component": part(obj(tiles)), "voxel_tile_tree": part(obj(tree))}
+    for name, (form, values) in channels.items():
+        default = frame(10, False) if form == "?" else single(0)
+        channel = {"data": array(form, values), "target": text("voxel_tile_tree"), "depends_on": frame(131, [1, []]),
+                   "default": default, "interpolation_mode": frame(360, 1), "vld_component": text("channel"),
+                   "name": text(name), **sizes, "container": text("voxel_tile_tree")}
+        geometry[name] = part(obj(channel))
+    return geometry

@@ -213,7 +213,7 @@ TYPED_TEST(Builders, PointsMakeTheUnionOfTheirSpheres)
         float largest, voxelSize, width;
     };
     for (Case const& c : {Case{60, {0, 0, 0}, 4, 1, 2}, Case{3, {5, -9, 0.5f}, 18, 1, 1.5f},
-                          Case{20, {-3, 0, 0}, 6, 2, 2}, Case{40, {-1 << 20, 1 << 20, 0}, 4, 1, 2}}) {
+                          Case{20, {-3, 0, 0}, 6, 2, 2}, Case{40, {-1 << 30, 1 << 30, 0}, 4, 1, 2}}) {
         Points const points = randomPoints(c.count, c.centre, c.largest);
         auto const distance = [&](double3 const& p) {
             double nearest = std::numeric_limits<double>::max();
@@ -313,9 +313,20 @@ TYPED_TEST(Builders, WhatCannotBeBuiltGivesAnEmptyGrid)
         EXPECT_FALSE(plane(good, {{0, 0, 0}, {1, 1, 1}}, width));
         EXPECT_FALSE(points(good, {{0, 0, 0}}, {1.0f}, width));
     }
-    // More elements than 32 bits count are told at once, not when the memory is full: a shell, and a core.
+    // A search for tiles ends when they have too many elements: those of a small box, and before it is through a large one.
+    auto planeOf = [&](VoxelBox const& in, std::uint64_t mostElements) {
+        auto const distance = [](double3 const& p) { return p.x; };
+        return bool(Internal::buildLevelSet<Traits>(good, in, 1, Internal::fieldOf(distance), mostElements));
+    };
+    EXPECT_TRUE(planeOf({{-9, 0, 0}, {30, 30, 30}}, 1 << 20));
+    EXPECT_FALSE(planeOf({{-9, 0, 0}, {30, 30, 30}}, 1000));
+    EXPECT_FALSE(planeOf({{-1 << 19, 0, 0}, {1 << 20, 1 << 20, 1}}, 100000));
+    // Spheres that touch too many tiles are told at once, not when the memory is full: a shell, a core, and many small ones.
     EXPECT_FALSE(points(good, {{0, 0, 0}}, {20000.0f}, 3));
     EXPECT_FALSE(points(good, {{0, 0, 0}}, {1e6f}, 1));
+    Nexil::Array<float3> same;
+    same.resize(1000000);
+    EXPECT_FALSE(points(good, same, {30.0f}, 3));
     constexpr int kEnd = kCoordinateLimit;
     EXPECT_TRUE(voxels(good, {}, {}));
     EXPECT_FALSE(voxels(good, {{0, 0, 0}}, {1, 2}));

@@ -19,6 +19,15 @@ template <class Traits>
 class VolumeBounds : public ::testing::Test {};
 TYPED_TEST_SUITE(VolumeBounds, support::BothConfigurations);
 
+/// The largest float that is no larger.
+float nearestNotAbove(long double value)
+{
+    float below = std::nextafter(static_cast<float>(value), -HUGE_VALF);
+    for (float above = below; above <= value; above = std::nextafter(above, HUGE_VALF))
+        below = above;
+    return below;
+}
+
 /// A volume of few or many voxels anywhere, and the box that a loop over its elements finds.
 template <class Traits>
 class DrawnVolume {
@@ -50,9 +59,10 @@ public:
             if (grid.topology->isCellWithLeaf(element) || !isContent((*elements)[element]))
                 continue;
             VoxelCube const cube = grid.topology->elementCube(element);
-            for (int const step : {0, cube.width}) {
-                auto at = [&](int v) { return static_cast<float>((double(v) + step) * double(0.1f)); };
-                box.extend({at(cube.origin.x), at(cube.origin.y), at(cube.origin.z)});
+            for (int axis = 0; axis < 3; ++axis) {
+                long double const low = cube.origin[axis];
+                box.min[axis] = std::min(box.min[axis], nearestNotAbove(low * 0.1f));
+                box.max[axis] = std::max(box.max[axis], -nearestNotAbove(-(low + cube.width) * 0.1f));
             }
         }
     }

@@ -40,8 +40,8 @@ def cell_of(leaf, inner, w, d):
 class Volume:
     """Finds the sound components of one geometry: `elements` has, by property, (kind, configuration, element count)."""
 
-    def __init__(self, geometry, known):
-        self.known, self.elements = known, {}
+    def __init__(self, geometry):
+        self.elements = {}
         parts = {key: value for key, (code, value) in geometry.properties.items()
                  if code == OBJECT and value and b"vld_component" in value.properties}
         for kind, make in zip(KINDS, (self.voxel_topology, self.point_topology, self.container, self.channel)):
@@ -56,12 +56,11 @@ class Volume:
         found = self.elements.get(get(part, b"target", STRING), (None, None, 0))
         return found[1:] if found[0] in kinds else (None, 0)
 
-    def arrays(self, part, *names_and_codes):
-        """The arrays of tiles, unless one is missing or belongs to other tiles."""
+    @staticmethod
+    def arrays(part, *names_and_codes):
+        """The arrays of tiles, unless one is missing. How often arrays are looked at is not counted here."""
         arrays = tuple(get(part, *name_and_code) for name_and_code in names_and_codes)
-        if None in arrays or any(array.count and self.known.setdefault(array, arrays) != arrays for array in arrays):
-            return None
-        return arrays
+        return None if None in arrays else arrays
 
     def voxel_topology(self, part):
         traits = configuration(part)
@@ -113,8 +112,7 @@ class Volume:
         return (traits, count) if traits and traits == configuration(part) and has_default and named else None
 
 
-
-def mark_components(geometry, known):
+def mark_components(geometry):
     """Notes at each object that the geometry holds whether a reader rebuilds it as a view of a component."""
-    for part in Volume(geometry, known).sound:
+    for part in Volume(geometry).sound:
         part.is_proxy = True

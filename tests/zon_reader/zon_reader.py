@@ -92,7 +92,7 @@ class Values:
     """Makes values of decoded items, by the rules of one version."""
 
     def __init__(self, version, compressed, resolve=None):
-        self.version, self.compressed, self.resolve, self.tiles = version, compressed, resolve, {}
+        self.version, self.compressed, self.resolve = version, compressed, resolve
 
     def frame(self, item, unknown="any type not supported"):
         if item is None and self.version > 1:
@@ -135,7 +135,7 @@ class Values:
             if name:
                 made.properties[name] = value
         if self.version > 4:
-            mark_components(made, self.tiles)
+            mark_components(made)
         return made
 
     def array(self, code, item):

@@ -11,6 +11,7 @@
 
 #include <cstdio>
 #include <memory>
+#include <unordered_map>
 
 namespace Zon {
 
@@ -30,22 +31,45 @@ namespace {
         }
     };
 
-    /// The object with proxies of volumes as what a file holds of them: the indices of a container would have to be made.
-    Veldrin::Object described(Veldrin::Object const& object)
-    {
-        Veldrin::Object result;
-        if (Veldrin::Geometry::describeVldProxy(object, result))
-            return result;
-        for (auto const& key : object.keys()) {
-            auto value = object.getProperty(key);
-            auto const* const part = value.get<Nexil::Ptr<Veldrin::Object>>();
-            Veldrin::Object description;
-            if (part && *part && Veldrin::Geometry::describeVldProxy(**part, description))
-                value = Nexil::Ptr<Veldrin::Object>(Nexil::makePtr<Veldrin::Object>(std::move(description)));
-            result.setPropertyAny(key, std::move(value));
+    // What lies deeper, the dump does not print.
+    constexpr unsigned int kMostLevels = 1000;
+
+    using ObjectPtr = Nexil::Ptr<Veldrin::Object>;
+    using ObjectListPtr = Nexil::Ptr<Nexil::Array<ObjectPtr>>;
+
+    /// Objects with proxies of volumes as what a file holds of them: the indices of a container would have to be made.
+    class Described {
+    public:
+        [[nodiscard]] ObjectPtr of(ObjectPtr const& object, unsigned int depth = 0)
+        {
+            if (!object || depth > kMostLevels)
+                return object;
+            // What is met again is printed again, but made once.
+            if (auto const known = made_.find(object.get()); known != made_.end())
+                return known->second;
+            auto result = Nexil::makeMutable<Veldrin::Object>();
+            if (!Veldrin::Geometry::describeVldProxy(*object, *result))
+                for (auto const& key : object->keys())
+                    result->setPropertyAny(key, valueOf(object->getProperty(key), depth + 1));
+            return made_[object.get()] = std::move(result);
         }
-        return result;
-    }
+
+    private:
+        Nexil::Any valueOf(Nexil::Any value, unsigned int depth)
+        {
+            if (auto const* const part = value.get<ObjectPtr>())
+                return of(*part, depth);
+            if (auto const* const list = value.get<ObjectListPtr>(); list && *list) {
+                Nexil::Array<ObjectPtr> parts;
+                for (ObjectPtr const& part : **list)
+                    parts.push_back(of(part, depth));
+                return Nexil::makePtr<Nexil::Array<ObjectPtr>>(std::move(parts));
+            }
+            return value;
+        }
+
+        std::unordered_map<Veldrin::Object const*, ObjectPtr> made_;
+    };
 
     ExitCode runDump(Options const& options)
     {
@@ -54,7 +78,8 @@ namespace {
         for (std::uint64_t i = 0; i < objects.size(); ++i) {
             fmt::print("object {}:\n", i);
             if (objects[i])
-                Veldrin::Geometry::Internal::debugDumpToStream(output, described(*objects[i]), options.maxElements);
+                Veldrin::Geometry::Internal::debugDumpToStream(output, *Described().of(objects[i]),
+                                                               options.maxElements);
             else
                 fmt::print("(null)");
             fmt::print("\n");

@@ -16,10 +16,13 @@
 
 #include <fmt/format.h>
 
+#include <unistd.h>
+
 #include <algorithm>
 #include <cmath>
 #include <cstring>
 #include <functional>
+#include <numbers>
 #include <optional>
 #include <string_view>
 #include <type_traits>
@@ -37,8 +40,15 @@ namespace {
     constexpr char kTransform[] = "vdb_transform";
     constexpr char kActive[] = "_active";
     constexpr int kBlockWidth = SmallTiles::kInnerWidth;
-    // Ten thousand million voxels of constant values; what is larger is a fault, or more than memory holds.
-    constexpr double kMostBlocks = 1 << 24;
+    // Blocks of one value that are taken: some for every file, and more by the blocks of a grid that have voxels of their own,
+    // so that the inside of a large surface has its place, but a few bytes do not become gigabytes.
+    constexpr double kFreeBlocks = 1 << 24;
+    constexpr double kBlocksPerLeaf = 64;
+
+    // Their arithmetic on coordinates is of 32 bits, and goes a few voxels beyond the band.
+    constexpr double kMostMeshCoordinate = 1 << 30;
+    // What is taken for one while a mesh is turned into a level set, on an average over surfaces, as measured.
+    constexpr double kBytesPerBandVoxel = 32;
 
     /// Calls visit.operator()<E>() for the element types that both sides have.
     template <class Visit>
@@ -158,10 +168,15 @@ namespace {
     openvdb::math::Transform::Ptr transformOf(Placement const& placement)
     {
         auto const& t = placement.translation;
-        // A scale, and behind it a translation: x * voxelSize + t.
-        openvdb::math::MapBase::Ptr const map =
-            std::make_shared<openvdb::math::UniformScaleTranslateMap>(placement.voxelSize, openvdb::Vec3d(t));
-        return std::make_shared<openvdb::math::Transform>(map);
+        try {
+            // A scale, and behind it a translation: x * voxelSize + t.
+            openvdb::math::MapBase::Ptr const map =
+                std::make_shared<openvdb::math::UniformScaleTranslateMap>(placement.voxelSize, openvdb::Vec3d(t));
+            return std::make_shared<openvdb::math::Transform>(map);
+        } catch (openvdb::ArithmeticError const&) {
+            throw openvdb::ValueError(
+                fmt::format("OpenVDB takes no voxels of size {}", static_cast<float>(placement.voxelSize)));
+        }
     }
 
     /// Turns one grid into a volume.
@@ -178,15 +193,14 @@ namespace {
         {
         }
 
-        /// Null when there are more voxels than a volume holds, or some beyond its limits.
+        /// Throws Failure with the reason for what no volume holds.
         Nexil::MutablePtr<VLD::Object> read(float voxelSize)
         {
-            if (!collectBlocks())
-                return nullptr;
+            collectBlocks();
             collectLeaves();
             auto topology = VoxelTopology<SmallTiles>::create(Geometry::sVoxelComp, layOutTiles());
             if (!topology)
-                return nullptr;
+                throw Failure("it has more voxels than a volume holds, or some beyond the coordinates that there are");
             return makeVolume(std::move(topology), voxelSize);
         }
 
@@ -206,25 +220,27 @@ namespace {
             unsigned int cell;
         };
 
-        bool collectBlocks()
+        void collectBlocks()
         {
             auto const& root = grid_.tree().root();
+            mostBlocks_ = kFreeBlocks + kBlocksPerLeaf * static_cast<double>(grid_.tree().leafCount());
             for (auto child = root.cbeginChildOn(); child; ++child)
                 collectBlocks(*child);
             for (auto tile = root.cbeginValueAll(); tile; ++tile)
                 addTile(tile.getCoord(), std::int64_t(std::decay_t<decltype(root)>::ChildNodeType::DIM), ours(*tile),
                         tile.isValueOn());
-            if (blockCount_ > kMostBlocks)
-                return false;
+            if (constantBlockCount_ > mostBlocks_)
+                throw Failure(
+                    fmt::format("its regions of one value cover {:.0f} blocks of {} x {} x {} voxels, and more "
+                                "than {:.0f} are not taken",
+                                constantBlockCount_, kBlockWidth, kBlockWidth, kBlockWidth, mostBlocks_));
             std::sort(blocks_.begin(), blocks_.end(),
                       [](Block const& a, Block const& b) { return isBefore(a.origin, b.origin); });
-            return true;
         }
 
         void collectBlocks(Leaf const& leaf)
         {
             auto const& origin = leaf.origin();
-            blockCount_ += 1;
             blocks_.push_back({{origin.x(), origin.y(), origin.z()}, &leaf, background_, false});
         }
 
@@ -248,8 +264,8 @@ namespace {
             if (!isOn && isSame(value, background_))
                 return;
             auto const blocksAlong = static_cast<double>(width / kBlockWidth);
-            blockCount_ += blocksAlong * blocksAlong * blocksAlong;
-            if (blockCount_ > kMostBlocks)
+            constantBlockCount_ += blocksAlong * blocksAlong * blocksAlong;
+            if (constantBlockCount_ > mostBlocks_)
                 return;
             for (int x = 0; x < width; x += kBlockWidth)
                 for (int y = 0; y < width; y += kBlockWidth)
@@ -365,7 +381,8 @@ namespace {
         E background_;
         ActiveRule<E> isActive_;
         std::vector<Block> blocks_;
-        double blockCount_ = 0; // of those that there would be
+        double constantBlockCount_ = 0; // of those that there would be
+        double mostBlocks_ = 0;
         std::vector<PlacedLeaf> leaves_;
     };
 
@@ -398,13 +415,11 @@ namespace {
                 return;
             isKnown = true;
             channelName = channelNameOf(grid, std::is_floating_point_v<E>);
-            if (auto volume = GridReader<E>(static_cast<Grid const&>(grid), channelName).read(voxelSize))
-                object = Geometry::move_vld_volume_to_object(*volume);
+            auto volume = GridReader<E>(static_cast<Grid const&>(grid), channelName).read(voxelSize);
+            object = Geometry::move_vld_volume_to_object(*volume);
         });
         if (!isKnown)
             throw Failure("it has values of type " + grid.valueType());
-        if (!object)
-            throw Failure("it has more voxels than a volume holds, or some beyond the coordinates that there are");
         // A grid that is called like its channel has no name of its own.
         if (Nexil::String const name = grid.getName().c_str(); !name.empty() && name != channelName)
             setProperty(*object, "name", name);
@@ -554,6 +569,32 @@ namespace {
         std::vector<std::string>& leftOut_;
     };
 
+    /// Throws Failure for a surface whose level set has no place among the coordinates, or in the memory of this machine: it
+    /// would be taken voxel by voxel until there is none.
+    void refuseWhatIsTooLarge(std::vector<openvdb::Vec3s> const& points, std::vector<openvdb::Vec3I> const& triangles,
+                              float halfBand)
+    {
+        for (openvdb::Vec3s const& p : points)
+            for (int axis = 0; axis < 3; ++axis)
+                if (!(std::abs(double(p[axis])) + double(halfBand) < kMostMeshCoordinate))
+                    throw Failure("with voxels that small its level set lies beyond the coordinates that there are");
+        // Voxels of the band, by the areas. What is long and narrow has at least a row of them, small triangles share theirs.
+        double area = 0;
+        for (openvdb::Vec3I const& t : triangles) {
+            openvdb::Vec3d const a(points[t[0]]), b(points[t[1]]), c(points[t[2]]);
+            double const longest = std::max({(b - a).length(), (c - b).length(), (a - c).length()});
+            area += std::max((b - a).cross(c - a).length(), longest > kBlockWidth ? longest : 0) / 2;
+        }
+        double const band = halfBand;
+        double const voxels = std::max(area * 2 * band, 4.0 / 3.0 * std::numbers::pi * band * band * band);
+        auto const memory = double(sysconf(_SC_PHYS_PAGES)) * double(sysconf(_SC_PAGESIZE));
+        if (voxels * kBytesPerBandVoxel > memory)
+            throw Failure(
+                fmt::format("with voxels that small its level set has some {:.2g} voxels, more than the memory of "
+                            "this machine holds",
+                            voxels));
+    }
+
     /// Runs body() with the library ready, and turns what it throws into a Failure that names the file.
     template <class Body>
     auto withVdb(std::string const& path, Body const& body)
@@ -631,6 +672,7 @@ Nexil::Ptr<Object> levelSetOfMesh(Nexil::Array<float3> const& positions, Nexil::
         corners.reserve(triangles.size() / 3);
         for (std::uint64_t i = 0; i + 2 < triangles.size(); i += 3)
             corners.emplace_back(triangles[i], triangles[i + 1], triangles[i + 2]);
+        refuseWhatIsTooLarge(points, corners, halfBand);
         // By this adapter, as it is compiled into the library.
         openvdb::tools::QuadAndTriangleDataAdapter<openvdb::Vec3s, openvdb::Vec3I> const surface(points, corners);
         auto const grid = openvdb::tools::meshToVolume<openvdb::FloatGrid>(surface, *transform, halfBand, halfBand);

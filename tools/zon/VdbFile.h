@@ -27,7 +27,9 @@ struct VdbVolumes {
 /// "voxel_". Voxels keep their coordinates. The grid's transform is kept as "vdb_transform" (x, y, z of the centre of its
 /// voxel 0, 0, 0, and the voxel size) where that is another than the centre of ours. Which values are active follows from
 /// them (all but the background, and its negative in a level set); where it does not, a bool channel "..._active" tells.
-/// Grids of other types, and those whose transform is not one positive scale and a translation, are left out.
+/// Grids of other types, and those whose transform is not one positive scale and a translation, are left out. So are grids
+/// in which regions of one value cover too many blocks of 8 x 8 x 8 voxels, each of which becomes a tile: 2^24 are taken, and
+/// 64 more for every block of voxels of their own.
 /// Errors: Failure with the file's name and the reason.
 [[nodiscard]] VdbVolumes readVdb(std::string const& path);
 
@@ -44,7 +46,8 @@ struct VdbReport {
 
 /// The level set of a closed surface of triangles: distances up to `halfBand` voxels to each side.
 ///
-/// triangles: three indices each, into the positions. Errors: Failure.
+/// triangles: three indices each, into the positions.
+/// Errors: Failure with the reason, also, before it is tried, for more voxels than the memory of the machine holds.
 [[nodiscard]] Nexil::Ptr<Veldrin::Object> levelSetOfMesh(Nexil::Array<Veldrin::Math::float3> const& positions,
                                                          Nexil::Array<unsigned int> const& triangles, float voxelSize,
                                                          float halfBand);

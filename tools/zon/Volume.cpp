@@ -197,8 +197,12 @@ namespace {
         if (openEdges != 0)
             warn(fmt::format("{}its surface is not closed: {}; where a hole is wider than a voxel there is no inside",
                              place, counted(openEdges, "boundary edge")));
-        return levelSetOfMesh(*dataOf<Math::float3>(mesh, Geometry::sPointPosition), triangles, options.voxelSize,
-                              options.halfBand);
+        try {
+            return levelSetOfMesh(*dataOf<Math::float3>(mesh, Geometry::sPointPosition), triangles, options.voxelSize,
+                                  options.halfBand);
+        } catch (Failure const& failure) {
+            throw Failure(place + failure.what());
+        }
     }
 
     Nexil::Ptr<Object> fromPoints(Object const& cloud, std::string const& place, MakeOptions const& options)
@@ -212,7 +216,7 @@ namespace {
                                                               options.halfBand * options.voxelSize);
         auto volume = VLD::createObject();
         if (!grid.addTo(*volume))
-            throw Failure(place + "the spheres have more voxels than a volume holds");
+            throw Failure(place + "the spheres have more voxels than a volume holds, or too many of them overlap");
         return Geometry::move_vld_volume_to_object(*volume);
     }
 

@@ -7,6 +7,8 @@
 #include <vld/Visitor.h>
 
 #include <algorithm>
+#include <cmath>
+#include <cstdint>
 #include <limits>
 #include <memory>
 
@@ -153,6 +155,16 @@ namespace {
         VoxelExtent extent_;
     };
 
+    /// Where the voxel of a number starts along an axis; where no float is there, the next one on the side of `outside`.
+    float positionOf(std::int64_t number, float voxelSize, float outside)
+    {
+        // Wide enough to be exact for all voxels, and so that 0.1f * 10 compares as what it is, not as 1.
+        long double const position = static_cast<long double>(number) * voxelSize;
+        auto const nearest = static_cast<float>(position);
+        bool const isBeyond = outside < 0 ? nearest <= position : nearest >= position;
+        return isBeyond ? nearest : std::nextafter(nearest, outside);
+    }
+
     template <class IsContent, class T, class Traits>
     bool growByValues(ChannelBase const& channel, Container<Traits> const& container, Box& box)
     {
@@ -164,13 +176,13 @@ namespace {
         VoxelExtent const& extent = visitor.extent();
         if (extent.isEmpty())
             return true;
-        double const voxelSize = container.voxelSize();
-        auto corner = [voxelSize](Coordinate const& voxel, int step) {
-            auto at = [&](int v) { return static_cast<float>((double(v) + step) * voxelSize); };
+        auto corner = [&](Coordinate const& voxel, int step, float outside) {
+            auto at = [&](int v) { return positionOf(std::int64_t(v) + step, container.voxelSize(), outside); };
             return Math::float3{at(voxel.x), at(voxel.y), at(voxel.z)};
         };
-        box.extend(corner(extent.low, 0));
-        box.extend(corner(extent.high, 1));
+        constexpr float kInfinity = std::numeric_limits<float>::infinity();
+        box.extend(corner(extent.low, 0, -kInfinity));
+        box.extend(corner(extent.high, 1, kInfinity));
         return true;
     }
 

@@ -11,7 +11,8 @@
 /// The box around what is in a volume.
 ///
 /// The content is what has a "voxel_signed_distance" of at most 0, and what has a "voxel_fog_density" above 0; values that
-/// are not numbers are none. A voxel contributes its whole cube, a cell without voxels the cube of all of its voxels.
+/// are not numbers are none. A voxel contributes its whole cube, a cell without voxels the cube of all of its voxels. Corners
+/// that no float hits are rounded outward: the box holds every cube, also far from zero, where floats lie many voxels apart.
 /// Channels count that hold `float` or `double`, belong to the container, and have one value per element.
 /// Cost: one pass over the tiles, parallel; values are only read where they could make the box larger.
 /// Errors: std::bad_alloc; std::runtime_error when the job is cancelled. Threads: same bits for every thread count.

@@ -122,32 +122,36 @@ private:
         return static_cast<Proxy const&>(*proxy).getVldComponent();
     }
 
-    /// What make() gives for arrays of tiles. Arrays that were looked at before are not again: they make what they made, and
-    /// together with others nothing.
-    template <class Make, class... T>
-    ComponentPtr topologyOf(Make const& make, ArrayPtr<T> const&... arrays)
+    /// Counts a look at arrays; false when there were too many.
+    template <class... T>
+    bool mayLookAt(Nexil::Array<T> const&... arrays)
+    {
+        std::uint64_t const bytes = ((arrays.size() * sizeof(T)) + ...);
+        auto pay = [this](void const* address, std::uint64_t size) {
+            if (rebuilder_.paidArrays_.insert(address).second)
+                rebuilder_.bytesToLookAt_ += kLooksPerArray * size;
+        };
+        (pay(&arrays, arrays.size() * sizeof(T)), ...);
+        if (bytes > rebuilder_.bytesToLookAt_)
+            return false;
+        rebuilder_.bytesToLookAt_ -= bytes;
+        return true;
+    }
+
+    /// What make() gives for arrays of tiles, asked once for the same arrays.
+    template <class Topology, class Make, class... T>
+    Nexil::Ptr<Topology> topologyOf(Make const& make, ArrayPtr<T> const&... arrays)
     {
         if (!(arrays && ...))
             return nullptr;
-        std::vector<void const*> const addresses{arrays.get()...};
-        bool const isEmpty[] = {arrays->empty()...};
-        bool isKnown = false;
-        std::size_t known = 0;
-        for (std::size_t i = 0; i < addresses.size(); ++i) {
-            auto const place = rebuilder_.tilesOfArray_.find(addresses[i]);
-            if (isEmpty[i] || place == rebuilder_.tilesOfArray_.end())
-                continue;
-            isKnown = true;
-            known = place->second;
+        auto const [place, isNew] = rebuilder_.tiles_.try_emplace({typeid(Topology), {arrays.get()...}});
+        Tiles& tiles = place->second;
+        if (isNew) {
+            tiles.arrays = {Nexil::Any(arrays)...};
+            if (mayLookAt(*arrays...))
+                tiles.topology = make();
         }
-        if (isKnown)
-            return rebuilder_.tiles_[known].addresses == addresses ? rebuilder_.tiles_[known].topology : nullptr;
-        for (std::size_t i = 0; i < addresses.size(); ++i)
-            if (!isEmpty[i])
-                rebuilder_.tilesOfArray_.emplace(addresses[i], rebuilder_.tiles_.size());
-        rebuilder_.tiles_.push_back({addresses, {Nexil::Any(arrays)...}, nullptr});
-        rebuilder_.tiles_.back().topology = make();
-        return rebuilder_.tiles_.back().topology;
+        return Nexil::dynamicPtrCast<Topology>(tiles.topology);
     }
 
     ComponentPtr makeVoxelTopology(Object const& description)
@@ -161,9 +165,17 @@ private:
         forEachConfiguration([&]<class Traits>() {
             if (parametersOf(description) != Traits::parameters() || name.empty())
                 return;
-            auto const topology = Nexil::dynamicPtrCast<VoxelTopology<Traits>>(
-                topologyOf([&]() -> ComponentPtr { return VoxelTopology<Traits>::create(name, levels); },
-                           levels.leafOrigins, levels.leafParents, levels.innerOrigins, levels.innerChildren));
+            using Topology = VoxelTopology<Traits>;
+            auto const make = [&] {
+                auto& known = rebuilder_.topologyOfInnerTiles_[levels.innerOrigins.get()];
+                auto const like = Nexil::dynamicPtrCast<Topology>(known);
+                auto topology = like ? Topology::create(name, levels, *like) : Topology::create(name, levels);
+                if (topology)
+                    known = topology;
+                return topology;
+            };
+            auto const topology = topologyOf<Topology>(make, levels.leafOrigins, levels.leafParents,
+                                                       levels.innerOrigins, levels.innerChildren);
             auto const count = description.getProperty(sCount);
             auto const* const heldCount = count.get<unsigned int>();
             if (topology && heldCount && *heldCount == topology->elementCount())
@@ -181,10 +193,9 @@ private:
         forEachConfiguration([&]<class Traits>() {
             if (parametersOf(description) != Traits::parameters() || name.empty())
                 return;
-            auto const topology = Nexil::dynamicPtrCast<PointTopology<Traits>>(
-                topologyOf([&]() -> ComponentPtr { return PointTopology<Traits>::create(name, origins, offsets); },
-                           origins, offsets));
-            if (topology)
+            using Topology = PointTopology<Traits>;
+            if (auto const topology =
+                    topologyOf<Topology>([&] { return Topology::create(name, origins, offsets); }, origins, offsets))
                 made = underName(topology, name);
         });
         return made;

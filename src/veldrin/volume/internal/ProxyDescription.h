@@ -6,8 +6,12 @@
 #include <veldrin/object/Object.h>
 #include <vld/Component.h>
 
-#include <cstddef>
+#include <cstdint>
+#include <map>
+#include <typeindex>
 #include <unordered_map>
+#include <unordered_set>
+#include <utility>
 #include <vector>
 
 /// From descriptions of proxies, as `describeVldProxy` makes them and files hold them, back to proxies.
@@ -18,8 +22,9 @@ namespace Veldrin::Geometry::Internal {
 
 /// Turns descriptions that were read back into proxies.
 ///
-/// What several geometries share is rebuilt once: proxies with one description, and topologies with the same arrays. No array
-/// is looked at twice, however often descriptions refer to it.
+/// What several geometries share is rebuilt once: proxies with one description, and topologies with the same arrays.
+/// Topologies that share only some of their arrays are checked each for itself, but no more of them than the arrays justify:
+/// each array pays for `kLooksPerArray` looks at as many bytes, and whatever goes beyond counts as damaged.
 class ProxyRebuilder {
 public:
     /// Replaces every description in `geometry` by a proxy, in its place. One that does not fit together, by itself or with
@@ -38,16 +43,25 @@ private:
         Nexil::Ptr<Object> proxy;
     };
 
-    /// Arrays of tiles that were looked at together, and what they make; null when they do not fit together.
+    /// A kind of topology and the addresses of its arrays.
+    using TilesKey = std::pair<std::type_index, std::vector<void const*>>;
+
+    /// What arrays of tiles make together; null when they do not fit.
     struct Tiles {
-        std::vector<void const*> addresses;
         std::vector<Nexil::Any> arrays; // so that the addresses stay their own
         Nexil::Ptr<VLD::Component> topology;
     };
 
+    static constexpr std::uint64_t kLooksPerArray = 16;
+    // So that small ones need not be counted closely.
+    static constexpr std::uint64_t kFreeBytes = 1 << 24;
+
     std::unordered_map<Object const*, Rebuilt> rebuilt_;
-    std::vector<Tiles> tiles_;
-    std::unordered_map<void const*, std::size_t> tilesOfArray_;
+    std::map<TilesKey, Tiles> tiles_;
+    /// Of each array of inner tiles, a topology that has it.
+    std::unordered_map<void const*, Nexil::Ptr<VLD::Component>> topologyOfInnerTiles_;
+    std::unordered_set<void const*> paidArrays_;
+    std::uint64_t bytesToLookAt_ = kFreeBytes;
     std::vector<Nexil::String> damaged_;
 };
 
