@@ -3,7 +3,6 @@
 #include <nexil/JobCancel.h>
 #include <veldrin/algorithms/ComponentConversion.h>
 #include <veldrin/algorithms/FaceVertexAdjacency.h>
-#include <veldrin/algorithms/HalfEdgeDataStructure.h>
 #include <veldrin/algorithms/MeshDiagnostic.h>
 #include <veldrin/algorithms/MeshInvariants.h>
 #include <veldrin/algorithms/MeshNormals.h>
@@ -23,36 +22,17 @@ namespace {
 using namespace Veldrin;
 using namespace Veldrin::GeometryAlgorithms;
 using Geometry::Mesh::FaceEdge;
-using Geometry::Mesh::HalfEdgeDataStructure;
 using Math::float3;
-
-std::atomic<int> questions;
-std::atomic<int> patience;
-
-/// Counts the questions of a run that is never cancelled, or cancelled at the question after `patience` others.
-struct Hook {
-    explicit Hook(int questionCount)
-    {
-        questions = 0;
-        patience = questionCount;
-        Nexil::setJobCancelHook([] { return ++questions > patience; });
-    }
-    ~Hook() { Nexil::setJobCancelHook(nullptr); }
-};
-
-// Faces, or strands, that a kernel goes through at most between two questions.
-constexpr unsigned int kMostBetween = 4096;
-constexpr int kNever = 1 << 30;
 
 /// Outputs that no algorithm gives, by which one that was touched is known.
 struct Outputs {
     Nexil::Array<float3> vectors{{7, 7, 7}};
-    Nexil::Array<float> floats{7};
-    Nexil::Array<float> moreFloats{7};
-    Nexil::Array<FaceEdge> edges{FaceEdge{7, 7}};
-    Nexil::Array<FaceEdge> pointFaces{FaceEdge{7, 7}};
+    Nexil::Array<float> floats{7}, moreFloats{7};
+    Nexil::Array<FaceEdge> edges{FaceEdge{7, 7}}, pointFaces{FaceEdge{7, 7}};
     Nexil::Array<unsigned int> indices{7u};
     unsigned int count = 7;
+    /// What it returned, if that tells of anything computed.
+    bool isAnswered = false;
 
     /// room: of each array, as those of callers that compute again and again.
     explicit Outputs(std::uint64_t room = 0)
@@ -63,100 +43,93 @@ struct Outputs {
     bool operator==(Outputs const&) const = default;
 };
 
-struct Algorithm {
-    char const* name;
-    /// False when it tells that there is nothing to compute.
-    std::function<bool(Object const&, Outputs&)> run;
+using Algorithm = std::function<void(Object const&, Outputs&)>;
+using Algorithms = std::vector<std::pair<char const*, Algorithm>>;
+
+Algorithms const kOfPositions{
+    {"face normals", [](Object const& mesh, Outputs& out) { computeMeshFaceNormals(mesh, out.vectors); }},
+    {"normals", [](Object const& mesh, Outputs& out) { computeMeshVertexNormals(mesh, true, false, out.vectors); }},
+    {"diagnose", [](Object const& mesh, Outputs& out) {
+         out.isAnswered = !(Geometry::Mesh::diagnose(mesh) == Geometry::Mesh::Diagnostic{});
+     }}};
+
+Algorithm const kAdjacency = [](Object const& mesh, Outputs& out) {
+    out.isAnswered = buildFaceVertexAdjacency(mesh, out.edges, out.pointFaces, out.indices, nullptr);
 };
 
-Algorithm vertexNormals(bool byAngle, bool byArea)
-{
-    return {"vertex normals", [=](Object const& mesh, Outputs& out) {
-                computeMeshVertexNormals(mesh, byAngle, byArea, out.vectors);
-                return out.vectors.size() > 1;
-            }};
-}
-
-std::vector<Algorithm> const kOfPositions{
-    {"face normals",
-     [](Object const& mesh, Outputs& out) {
-         computeMeshFaceNormals(mesh, out.vectors);
-         return out.vectors.size() > 1;
-     }},
-    {"diagnose",
-     [](Object const& mesh, Outputs&) { return !(Geometry::Mesh::diagnose(mesh) == Geometry::Mesh::Diagnostic{}); }},
-    vertexNormals(false, false),
-    vertexNormals(false, true),
-    vertexNormals(true, false),
-    vertexNormals(true, true)};
-
-std::vector<Algorithm> const kOfTopology{
+Algorithms const kOfTopology{
+    {"adjacency", kAdjacency},
     {"normals topology",
      [](Object const& mesh, Outputs& out) {
          computeMeshNormalsTopology(mesh, {}, 0.5f, out.indices, out.count, nullptr);
-         return out.count != 7;
      }},
-    {"adjacency",
-     [](Object const& mesh, Outputs& out) {
-         return buildFaceVertexAdjacency(mesh, out.edges, out.pointFaces, out.indices, nullptr);
-     }},
-    {"edges",
-     [](Object const& mesh, Outputs&) {
-         HalfEdgeDataStructure const table(mesh);
-         return table.edgeCount() > 0 || table.findEdge(0, 1).faceCount > 0;
-     }},
-    {"Euler", [](Object const& mesh, Outputs&) { return Geometry::Mesh::eulerCharacteristic(mesh) != 0; }},
-    {"components", [](Object const& mesh, Outputs&) { return Geometry::Mesh::connectedComponents(mesh) != -1; }},
-    {"Betti", [](Object const& mesh, Outputs&) { return Geometry::Mesh::bettiNumbers(mesh) != Math::int3{}; }}};
+    {"Euler",
+     [](Object const& mesh, Outputs& out) { out.isAnswered = Geometry::Mesh::eulerCharacteristic(mesh) != 0; }},
+    {"components",
+     [](Object const& mesh, Outputs& out) { out.isAnswered = Geometry::Mesh::connectedComponents(mesh) != -1; }},
+    {"Betti",
+     [](Object const& mesh, Outputs& out) { out.isAnswered = Geometry::Mesh::bettiNumbers(mesh) != Math::int3{}; }}};
 
 /// A conversion answers with a mask of its own.
-std::vector<Algorithm> const kConversions{{"points to faces", [](Object const& mesh, Outputs&) {
-                                               bool isFine = false;
-                                               (void)Geometry::pointsToFaces(
-                                                   mesh, {true}, Geometry::TagConversionStyle::AllElements, &isFine);
-                                               return isFine;
-                                           }}};
+Algorithms const kConversions{{"points to faces", [](Object const& mesh, Outputs& out) {
+                                   (void)Geometry::pointsToFaces(
+                                       mesh, {true}, Geometry::TagConversionStyle::AllElements, &out.isAnswered);
+                               }}};
 
-std::vector<Algorithm> const kOfStrands{
-    {"tangents",
-     [](Object const& strands, Outputs& out) { return computeStrandTangents(strands, out.vectors, nullptr); }},
-    {"lengths", [](Object const& strands,
-                   Outputs& out) { return computeStrandLength(strands, out.floats, out.moreFloats, nullptr); }},
-    {"ratios", [](Object const& strands, Outputs& out) { return computeStrandRatio(strands, out.floats, nullptr); }},
+Algorithms const kOfStrandPoints{
+    {"tangents", [](Object const& strands,
+                    Outputs& out) { out.isAnswered = computeStrandTangents(strands, out.vectors, nullptr); }},
+    {"lengths", [](Object const& strands, Outputs& out) {
+         out.isAnswered = computeStrandLength(strands, out.floats, out.moreFloats, nullptr);
+     }}};
+
+Algorithms const kOfStrands{{"ratios", [](Object const& strands, Outputs& out) {
+                                 out.isAnswered = computeStrandRatio(strands, out.floats, nullptr);
+                             }}};
+
+std::atomic<int> questions;
+std::atomic<int> patience;
+
+/// Counts the questions of a run that is cancelled at the one after `questionCount` others.
+struct Hook {
+    explicit Hook(int questionCount)
+    {
+        questions = 0;
+        patience = questionCount;
+        Nexil::setJobCancelHook([] { return ++questions > patience; });
+    }
+    ~Hook() { Nexil::setJobCancelHook(nullptr); }
 };
 
-void expectCancelledAtAnyQuestion(Algorithm const& algorithm, Object const& object, std::size_t threadCount,
-                                  std::uint64_t room, unsigned int faceCount)
+/// rangeCount: faces or strands, of which a kernel goes through at most 4096 between two questions.
+void expectCancelledAtAnyQuestion(Algorithm const& run, Object const& object, int threadCount, std::uint64_t room,
+                                  int rangeCount)
 {
-    tbb::global_control const limit(tbb::global_control::max_allowed_parallelism, threadCount);
-    tbb::task_arena(static_cast<int>(threadCount)).execute([&] {
-        SCOPED_TRACE(testing::Message() << algorithm.name << " on " << threadCount << " threads");
-        int wholeRun = 0;
-        {
-            Hook const hook(kNever);
-            Outputs out(room);
-            (void)algorithm.run(object, out);
-            wholeRun = questions;
-        }
-        EXPECT_GE(wholeRun, static_cast<int>(faceCount / kMostBetween));
-        // Several threads cut the work otherwise each time: then only so many questions are certain.
-        int const late = threadCount == 1 ? wholeRun - 1 : static_cast<int>(faceCount / kMostBetween) - 1;
-        for (int const questionCount : {0, 1, late / 2, late}) {
-            Outputs out(room);
-            Hook const hook(questionCount);
-            EXPECT_THROW((void)algorithm.run(object, out), std::runtime_error) << questionCount << " of " << wholeRun;
-            EXPECT_EQ(out, Outputs()) << questionCount;
-            // Every thread may be in a chunk of its own when the answer comes.
-            EXPECT_LE(questions, questionCount + 4 * static_cast<int>(threadCount));
-        }
-    });
+    int wholeRun = 0;
+    {
+        Hook const hook(1 << 30);
+        Outputs out(room);
+        run(object, out);
+        wholeRun = questions;
+    }
+    EXPECT_GE(wholeRun, rangeCount / 4096);
+    // Several threads cut the work otherwise each time: then only so many questions are certain.
+    int const late = threadCount == 1 ? wholeRun - 1 : rangeCount / 4096 - 1;
+    for (int const questionCount : {0, 1, late / 2, late}) {
+        Outputs out(room);
+        Hook const hook(questionCount);
+        EXPECT_THROW(run(object, out), std::runtime_error) << questionCount << " of " << wholeRun;
+        EXPECT_EQ(out, Outputs()) << questionCount;
+        // Every thread may be in a chunk of its own when the answer comes.
+        EXPECT_LE(questions, questionCount + 4 * threadCount);
+    }
 }
 
 TEST(UntouchedOutputs, OfACancelledJobThatIsAskedForOnceAChunk)
 {
     struct {
         unsigned int side, stride;
-        std::size_t threadCount;
+        int threadCount;
         bool haveRoom;
     } const rows[] = {
         {160, 1, 1, false},
@@ -166,19 +139,24 @@ TEST(UntouchedOutputs, OfACancelledJobThatIsAskedForOnceAChunk)
     };
     for (auto const& [side, stride, threadCount, haveRoom] : rows) {
         unsigned int const count = side * side;
-        std::uint64_t const room = haveRoom ? 4 * count : 0;
         auto const mesh = support::meshOn(count, support::torusFaces(side, stride));
-        for (auto const* algorithms : {&kOfPositions, &kOfTopology, &kConversions})
-            for (auto const& algorithm : *algorithms)
-                expectCancelledAtAnyQuestion(algorithm, *mesh, threadCount, room, count);
         std::vector<unsigned int> offsets(count + 1);
         for (unsigned int i = 0; i <= count; ++i)
             offsets[i] = 2 * i;
         auto const strands = createObject();
         Geometry::populateStrand(support::array(std::vector<float3>(2 * count, float3{1, 2, 3})),
                                  support::array(offsets), *strands);
-        for (auto const& algorithm : kOfStrands)
-            expectCancelledAtAnyQuestion(algorithm, *strands, threadCount, room, count);
+        tbb::global_control const limit(tbb::global_control::max_allowed_parallelism,
+                                        static_cast<std::size_t>(threadCount));
+        for (auto const* algorithms : {&kOfPositions, &kOfTopology, &kConversions, &kOfStrandPoints, &kOfStrands})
+            for (auto const& [name, run] : *algorithms) {
+                SCOPED_TRACE(testing::Message() << name << " on " << threadCount << " threads");
+                bool const isOfStrands = algorithms == &kOfStrandPoints || algorithms == &kOfStrands;
+                tbb::task_arena(threadCount).execute([&] {
+                    expectCancelledAtAnyQuestion(run, isOfStrands ? *strands : *mesh, threadCount,
+                                                 haveRoom ? 4 * count : 0, static_cast<int>(count));
+                });
+            }
     }
 }
 
@@ -195,56 +173,49 @@ Change counting(char const* component, unsigned int count)
 }
 
 template <class Make>
-void expectNothing(std::vector<Algorithm> const& algorithms, Make const& make, std::vector<Change> const& changes)
+void expectNothing(Make const& make, std::vector<Change> const& changes,
+                   std::initializer_list<Algorithms> const& algorithms)
 {
-    for (auto const& algorithm : algorithms)
-        for (auto const& change : changes) {
-            SCOPED_TRACE(testing::Message() << algorithm.name << ", change " << &change - changes.data());
-            auto const object = make();
-            Outputs out;
-            EXPECT_TRUE(algorithm.run(*object, out)) << "while it is whole";
-            change(*object);
-            Outputs untouched;
-            EXPECT_FALSE(algorithm.run(*object, untouched));
-            EXPECT_EQ(untouched, Outputs());
-        }
+    for (auto const& list : algorithms)
+        for (auto const& [name, run] : list)
+            for (auto const& change : changes) {
+                SCOPED_TRACE(testing::Message() << name << ", change " << &change - changes.data());
+                auto const object = make();
+                Outputs out;
+                run(*object, out);
+                EXPECT_NE(out, Outputs()) << "while it is whole";
+                change(*object);
+                Outputs untouched;
+                run(*object, untouched);
+                EXPECT_EQ(untouched, Outputs());
+            }
 }
 
 TEST(UntouchedOutputs, WhereThereIsNoWholeGeometry)
 {
+    using namespace Geometry;
     auto const mesh = [] { return support::meshOn(4, {{0, 1, 2}, {0, 1}, {0, 2, 3, 2}}); };
-    for (auto const* algorithms : {&kOfPositions, &kOfTopology})
-        expectNothing(*algorithms, mesh,
-                      {without(Geometry::sFaceVertex), without(Geometry::sFaceOffset), counting(Geometry::sFaceComp, 4),
-                       [](Object& object) { object.eraseAllProperties(); }});
-    expectNothing(kConversions, mesh, {without(Geometry::sFaceVertex), without(Geometry::sFaceOffset)});
-    expectNothing(kOfPositions, mesh, {without(Geometry::sPointPosition), counting(Geometry::sPointComp, 5)});
-    expectNothing({kOfTopology[1]}, mesh, {counting(Geometry::sPointComp, 3)}); // a face names a point beyond
+    expectNothing(mesh, {without(sFaceVertex), without(sFaceOffset)}, {kOfPositions, kOfTopology, kConversions});
+    expectNothing(mesh, {counting(sFaceComp, 4)}, {kOfPositions, kOfTopology});
+    expectNothing(mesh, {without(sPointPosition), counting(sPointComp, 5)}, {kOfPositions});
+    // A face names a point beyond.
+    expectNothing(mesh, {counting(sPointComp, 3)}, {{{"adjacency", kAdjacency}}});
     auto const strands = [] {
         return support::filled([](Object& object) {
-            Geometry::populateStrand(support::array<float3>({{}, {}, {}}), support::array<unsigned int>({0, 3}),
-                                     object);
+            populateStrand(support::array<float3>({{}, {}, {}}), support::array<unsigned int>({0, 3}), object);
         });
     };
-    expectNothing(kOfStrands, strands, {without(Geometry::sStrandOffset)});
-    expectNothing(
-        {kOfStrands[0], kOfStrands[1]}, strands,
-        {counting(Geometry::sStrandComp, 2), counting(Geometry::sPointComp, 4), without(Geometry::sPointPosition)});
-
-    // A mesh without faces or points is one.
-    auto const empty = support::filled([](Object& object) { Geometry::populateMesh(object); });
-    Outputs out;
-    EXPECT_TRUE(kOfTopology[1].run(*empty, out));
-    EXPECT_EQ(out.indices, (Nexil::Array<unsigned int>{0}));
-    EXPECT_EQ(Geometry::Mesh::connectedComponents(*empty), 0);
+    expectNothing(strands, {without(sStrandOffset)}, {kOfStrands});
+    expectNothing(strands,
+                  {without(sStrandOffset), counting(sStrandComp, 2), counting(sPointComp, 4), without(sPointPosition)},
+                  {kOfStrandPoints});
     // Conversions answer with a mask of the right size; what needs corners alone still works.
     auto const broken = mesh();
-    broken->eraseProperty(Geometry::sFaceOffset);
+    broken->eraseProperty(sFaceOffset);
     bool isFine = true;
-    EXPECT_EQ(*Geometry::facesToPoints(*broken, {true}, &isFine), (Nexil::Array<bool>{false, false, false, false}));
+    EXPECT_EQ(*facesToPoints(*broken, {true}, &isFine), (Nexil::Array<bool>{false, false, false, false}));
     EXPECT_FALSE(isFine);
-    EXPECT_EQ(Geometry::pointsToFaces(*broken, {true}, {}, nullptr)->size(), 3u);
-    EXPECT_TRUE((*Geometry::pointsToFaceVertices(*broken, {false, true}, &isFine))[1]);
+    EXPECT_TRUE((*pointsToFaceVertices(*broken, {false, true}, &isFine))[1]);
     EXPECT_TRUE(isFine);
 }
 

