@@ -84,6 +84,12 @@ bool haveSameBits(float3 const& found, float3 const& expected)
     return std::memcmp(&found, &expected, sizeof found) == 0;
 }
 
+/// Leaves what is no number in the memory that is handed out next.
+void soilFreeMemory(std::size_t floatCount)
+{
+    std::vector<std::vector<float>> const soil(4, std::vector<float>(floatCount, std::nanf("")));
+}
+
 /// Random faces whose corners lie within `spread` points of each other, all along the points of a mesh.
 Polygons facesAlong(unsigned int pointCount, unsigned int spread, unsigned int faceSize)
 {
@@ -120,11 +126,12 @@ void expectSums(unsigned int pointCount, unsigned int spread, unsigned int faceS
         for (std::size_t p = 0; p < pointCount; ++p) {
             auto const error = first[p] * length(sums.normals[p]) - sums.normals[p];
             // Angles come from an arc cosine of our own.
-            ASSERT_TRUE(byAngle ? length(error) <= 1e-5f * sums.weights[p]
+            ASSERT_TRUE(byAngle ? length(error) <= 1e-6f * sums.weights[p]
                                 : haveSameBits(first[p], unitOr(sums.normals[p], {0, 1, 0})))
                 << p;
         }
         support::onThreadCounts([&] {
+            soilFreeMemory(4 * faces.size());
             Normals normals;
             computeMeshVertexNormals(*mesh, byAngle, byArea, normals);
             ASSERT_EQ(normals.size(), first.size());
@@ -220,6 +227,21 @@ TEST(NormalsTopology, GroupsAreWhatSmoothEdgesJoin)
     }
 }
 
+unsigned int groupCountOf(Veldrin::Object const& mesh, Nexil::Array<unsigned int> const& normals, float maxAngle)
+{
+    Nexil::Array<unsigned int> groups;
+    unsigned int count = 0;
+    computeMeshNormalsTopology(mesh, normals, maxAngle, groups, count, nullptr);
+    return count;
+}
+
+TEST(NormalsTopology, AnEdgeOfThreeFacesIsHardThoughTwoOfThemLieFlat)
+{
+    auto const book =
+        support::mesh({{0, 0, 0}, {1, 0, 0}, {0, 0, 1}, {0, -1, 0}, {0, 1, 0}}, {{1, 0, 2}, {1, 0, 3}, {0, 1, 4}});
+    EXPECT_EQ(groupCountOf(*book, {}, 0.1f), 9u);
+}
+
 TEST(NormalsTopology, KnownNormalsDecideBeforeAngles)
 {
     // Two quads side by side, with the edge from 1 to 4 between them.
@@ -237,10 +259,7 @@ TEST(NormalsTopology, KnownNormalsDecideBeforeAngles)
         {{0, 1, 2, 3}, 0.0f, 8},                   // what is missing is not known
     };
     for (auto const& [normals, maxAngle, expected] : rows) {
-        Nexil::Array<unsigned int> groups;
-        unsigned int count = 0;
-        computeMeshNormalsTopology(*object, normals, maxAngle, groups, count, nullptr);
-        EXPECT_EQ(count, expected);
+        EXPECT_EQ(groupCountOf(*object, normals, maxAngle), expected);
     }
 }
 

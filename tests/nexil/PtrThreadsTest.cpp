@@ -3,7 +3,6 @@
 
 #include <gmock/gmock.h>
 
-#include <atomic>
 #include <barrier>
 #include <numeric>
 #include <thread>
@@ -28,34 +27,24 @@ void onAllThreads(Body const& body)
 /// Reads, when it is destroyed, what each holder wrote before it let go: a race unless the last drop sees all others.
 struct Witness {
     std::vector<int> const* notes;
-    std::atomic<int>* destroyedCount;
     int* sum;
 
-    Witness(std::vector<int> const* n, std::atomic<int>* d, int* s) : notes(n), destroyedCount(d), sum(s) {}
-    ~Witness()
-    {
-        *sum = std::accumulate(notes->begin(), notes->end(), 0);
-        ++*destroyedCount;
-    }
+    Witness(std::vector<int> const* n, int* s) : notes(n), sum(s) {}
+    ~Witness() { *sum += std::accumulate(notes->begin(), notes->end(), 0); }
 };
 
 TEST(PtrThreads, TheLastOfManyHoldersDestroysOnceAndSeesWhatTheOthersDid)
 {
     for (int round = 0; round < kRoundCount; ++round) {
         std::vector<int> notes(kThreadCount);
-        std::atomic<int> destroyedCount = 0;
         int sum = 0;
-        std::vector<Ptr<Witness>> held(kThreadCount, Nexil::makePtr<Witness>(&notes, &destroyedCount, &sum));
+        std::vector<Ptr<Witness>> held(kThreadCount, Nexil::makePtr<Witness>(&notes, &sum));
         onAllThreads([&](std::size_t t) {
-            for (int i = 0; i < 20; ++i) {
+            for (int i = 0; i < 20; ++i)
                 std::vector<Ptr<Witness>> const copies(5, held[t]);
-                Ptr<Witness> const assigned = copies.back();
-                EXPECT_GE(assigned.useCount(), 6u);
-            }
             notes[t] = 1;
             held[t].reset();
         });
-        ASSERT_EQ(destroyedCount, 1);
         ASSERT_EQ(sum, static_cast<int>(kThreadCount));
     }
 }

@@ -32,22 +32,16 @@ TEST(SerializationData, CopiesAreDeepAndAWalkerMayReplaceWhatItStandsOn)
     for (unsigned int depth = 0; depth < 12; ++depth) {
         SequenceSerializationData list;
         list.push_back(tree);
-        list.push_back(depth);
         CompositeSerializationData level;
         level["list"] = std::move(list);
         level["down"] = std::move(tree);
         tree = std::move(level);
     }
-    SerializationData const copy = tree;
-    for (unsigned int depth = 12; depth-- > 0;) {
-        auto const* list = tree.asComposite()->find("list")->asSequence();
-        ASSERT_EQ(list->end() - list->begin(), 2);
-        EXPECT_TRUE(list->begin()[1] == SerializationData(depth));
-        EXPECT_TRUE(list->begin()[0] == *tree.asComposite()->find("down"));
+    for (SerializationData copy = tree; tree.asComposite(); copy = tree) {
+        EXPECT_TRUE(tree.asComposite()->find("list")->asSequence()->begin()[0] == *copy.asComposite()->find("down"));
         ASSERT_TRUE(tree.asComposite()->get("down", tree));
     }
     EXPECT_TRUE(tree == SerializationData(1.5));
-    EXPECT_EQ(copy.asComposite()->size(), 2u);
 }
 
 } // namespace

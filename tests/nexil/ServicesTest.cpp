@@ -1,30 +1,17 @@
-#include <nexil/JobCancel.h>
 #include <nexil/RuntimeMessage.h>
 #include <nexil/SeededHash.h>
 
-#include <gmock/gmock.h>
+#include <gtest/gtest.h>
 
 #include <set>
 #include <string>
 
 namespace {
 
-TEST(Services, TheHostTakesMessagesAndCancelsJobs)
+TEST(Services, CategoriesHaveTheNumbersThatHostsCompare)
 {
-    using Nexil::RuntimeMessageCategory;
-    // Hosts compare the numbers.
-    EXPECT_EQ(RuntimeMessageCategory(1), RuntimeMessageCategory::Error);
-    EXPECT_EQ(RuntimeMessageCategory(2), RuntimeMessageCategory::Warning);
-
-    static bool isCancelled = false;
-    Nexil::setJobCancelHook([] { return isCancelled; });
-    EXPECT_FALSE(Nexil::isJobCancelled());
-    isCancelled = true;
-    EXPECT_TRUE(Nexil::isJobCancelled());
-    EXPECT_THAT([] { Nexil::Internal::throwIfJobCancelled(); },
-                testing::ThrowsMessage<std::runtime_error>("Job cancelled"));
-    Nexil::setJobCancelHook(nullptr);
-    EXPECT_FALSE(Nexil::isJobCancelled());
+    EXPECT_EQ(Nexil::RuntimeMessageCategory(1), Nexil::RuntimeMessageCategory::Error);
+    EXPECT_EQ(Nexil::RuntimeMessageCategory(2), Nexil::RuntimeMessageCategory::Warning);
 }
 
 TEST(Services, HashesTellNamesApartByEveryByteAndTheirLength)

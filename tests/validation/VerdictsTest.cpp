@@ -132,7 +132,6 @@ Case const kCases[] = {
     {"a mesh", Kind::Mesh, [](Object&) {}},
     {"a mesh of nothing", Kind::Mesh, nowOf(static_cast<void (*)(Object&)>(&Geometry::populateMesh))},
     {"a cube", Kind::Mesh, nowOf([](Object& o) { Geometry::populateCubeMesh(2, o); })},
-    {"a plane", Kind::Mesh, nowOf([](Object& o) { Geometry::populatePlaneMesh(1, 7, o); })},
     {"a sphere", Kind::Mesh, nowOf([](Object& o) { Geometry::populateSphereMesh(-1, o); })},
     {"no mesh at all", Kind::Mesh, nowOf([](Object&) {}), Code::InvalidObject, "Object is not a valid mesh"},
     {"a null array of positions", Kind::Mesh,
@@ -175,8 +174,6 @@ Case const kCases[] = {
     {"a volume", Kind::Volume, [](Object&) {}},
     {"a level set", Kind::Volume, nowOf(&Geometry::populateLevelSet)},
     {"a fog volume", Kind::Volume, nowOf(&Geometry::populateFogVolume)},
-    {"instances, whose shapes are attached to nothing, which is all that is wrong with them", Kind::Any,
-     nowOf(&Geometry::populateInstances), Code::MissingTarget, "instance_shape has no target"},
     {"no volume at all", Kind::Volume, nowOf([](Object&) {}), Code::InvalidObject, "Object is not a valid volume"},
     {"a volume whose voxels are claimed by numbers alone", Kind::Volume, count("voxel_component", 1),
      Code::InvalidObject, "Object is not a valid volume"},
@@ -202,8 +199,6 @@ Case const kCases[] = {
          data("d", "e", {1})(o);
      },
      Code::InvalidTarget, "d has an invalid target e"},
-    {"data over a range that asks for no value of none", Kind::Any,
-     sharedOut({}, {kInvalidIndex, kInvalidIndex, kInvalidIndex})},
     {"a last index behind the number of values", Kind::Any, sharedOut({5, 6}, {0, 1, 1, 3}), Code::InvalidIndex,
      "d_index contains an invalid index into d"},
     {"a range that is told first, though the data over it fails as well", Kind::Any, sharedOut({5, 6}, {0, 9}),
@@ -214,23 +209,10 @@ Case const kCases[] = {
          range("r", "c", nullptr)(o);
      },
      Code::InvalidTarget, "d has an invalid target r"},
-    {"an end in a range over what is no component", Kind::Any,
-     [](Object& o) {
-         addData(o, "d", "r", {1});
-         range("r", "further", array(Indices{1}))(o);
-         setProperty(o, "further", createObject());
-     },
-     Code::InvalidIndex, "r contains an invalid index into d"},
     {"a range that targets nothing", Kind::Any, range("r", "e", array(Indices{})), Code::MissingTarget,
      "r has no target"},
     {"a range that targets itself, its indices being null", Kind::Any, range("r", "r", nullptr), Code::InvalidTarget,
      "r target itself"},
-    {"a range without indices over what is no component", Kind::Any,
-     [](Object& o) {
-         data("d", "c", {1, 2, 3})(o);
-         range("r", "d", nullptr)(o);
-     },
-     Code::InvalidProperty, "r contains an invalid property indices"},
     {"a range that targets a range", Kind::Any,
      [](Object& o) {
          range("q", "c", array(Indices{0, 0, 0}))(o);
@@ -252,6 +234,38 @@ TEST(Verdicts, EachFaultHasItsCodeAndMessage)
         EXPECT_EQ(static_cast<bool>(status), c.code == Code::Success) << c.what;
         EXPECT_EQ(support::dump(*object), before) << c.what;
     }
+}
+
+TEST(Verdicts, AreTheSameWhereverInALargeMeshAFaultLiesOnEveryNumberOfThreads)
+{
+    constexpr unsigned int kFaceCount = 100000;
+    Polygons faces;
+    for (unsigned int f = 0; f < kFaceCount; ++f)
+        faces.push_back({f, f + 1, f + 2});
+    auto const mesh = support::mesh(std::vector<Math::float3>(kFaceCount + 2), faces);
+    auto const expectVerdict = [&](char const* name, unsigned int place, unsigned int value, char const* expected) {
+        auto values = valuesIn<unsigned int>(*mesh, name);
+        values[place] = value;
+        auto const changed = Nexil::makeMutable<Object>(*mesh);
+        setIndices(*changed, name, values);
+        onThreadCounts([&] {
+            EXPECT_EQ(Geometry::validateMesh(*changed).message, expected) << name << ' ' << place << ' ' << value;
+        });
+    };
+    unsigned int const pointCount = kFaceCount + 2;
+    for (unsigned int const corner : {0u, kFaceCount, 3 * kFaceCount - 1}) {
+        expectVerdict("face_vertex", corner, pointCount - 1, "");
+        for (unsigned int const value : {pointCount, kInvalidIndex})
+            expectVerdict("face_vertex", corner, value, "face_vertex contains an invalid index into point_component");
+    }
+    for (unsigned int const face : {1u, kFaceCount / 2, kFaceCount}) {
+        unsigned int const next = std::min(3 * face + 3, 3 * kFaceCount);
+        expectVerdict("face_offset", face, 3 * face - 3, "");
+        expectVerdict("face_offset", face, next, "");
+        expectVerdict("face_offset", face, next + 1, "face_offset contains an invalid index into face_component");
+    }
+    expectVerdict("face_offset", kFaceCount / 2, 3 * (kFaceCount / 2) - 4,
+                  "face_offset contains an invalid index into face_component");
 }
 
 TEST(Verdicts, OfSeveralFailuresTheFirstKeyIsTold)
