@@ -168,9 +168,10 @@ TEST(MeshNormals, OffsetsThatWrapAmongOnesThatRiseStayWithinTheirArrays)
 {
     // Whole runs of offsets are looked at together: the second one has steps of 3 and wraps.
     constexpr unsigned int kRun = 16384;
-    std::vector<unsigned int> offsets(4 * kRun + 1);
+    std::vector<unsigned int> offsets(4 * kRun, 0u);
     for (unsigned int i = 0; i < offsets.size(); ++i)
-        offsets[i] = 3 * i - (i >= kRun && i < 2 * kRun ? 3 * kRun + 2 : 0);
+        offsets[i] = i < kRun ? 3 * i : i < 2 * kRun ? 3 * (i - kRun) - 2 : 2 * i - kRun - 2;
+    offsets.push_back(3 * 4 * kRun);
     auto const object = Veldrin::createObject();
     Veldrin::Geometry::populateMesh(support::array(std::vector<float3>(1000)),
                                     support::array(std::vector<unsigned int>(offsets.back(), 999)),
