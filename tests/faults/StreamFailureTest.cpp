@@ -24,70 +24,60 @@ public:
     {
     }
 
-    [[nodiscard]] bool hasFailed() const { return hasFailed_; }
+    [[nodiscard]] bool hasFailed() const { return untilFailure_ == 0; }
 
 protected:
-    int_type underflow() override { return failsNow() ? traits_type::eof() : std::stringbuf::underflow(); }
-    int_type uflow() override { return failsNow() ? traits_type::eof() : std::stringbuf::uflow(); }
-    int_type overflow(int_type c) override { return failsNow() ? traits_type::eof() : std::stringbuf::overflow(c); }
     std::streamsize xsgetn(char* target, std::streamsize count) override
     {
-        return std::stringbuf::xsgetn(target, failsNow() ? shortened(count) : count);
+        return std::stringbuf::xsgetn(target, allowed(count));
     }
     std::streamsize xsputn(char const* source, std::streamsize count) override
     {
-        return std::stringbuf::xsputn(source, failsNow() ? shortened(count) : count);
+        return std::stringbuf::xsputn(source, allowed(count));
     }
     pos_type seekoff(off_type offset, std::ios_base::seekdir direction, std::ios_base::openmode which) override
     {
-        return failsNow() ? pos_type(off_type(-1)) : std::stringbuf::seekoff(offset, direction, which);
+        return allowed(1) ? std::stringbuf::seekoff(offset, direction, which) : pos_type(off_type(-1));
     }
     pos_type seekpos(pos_type position, std::ios_base::openmode which) override
     {
-        return failsNow() ? pos_type(off_type(-1)) : std::stringbuf::seekpos(position, which);
+        return allowed(1) ? std::stringbuf::seekpos(position, which) : pos_type(off_type(-1));
     }
-    int sync() override { return failsNow() ? -1 : std::stringbuf::sync(); }
+    int sync() override { return allowed(1) ? std::stringbuf::sync() : -1; }
 
 private:
-    bool failsNow()
+    /// How much of `count` the next operation does.
+    std::streamsize allowed(std::streamsize count)
     {
         if (untilFailure_ == 0 || --untilFailure_ > 0)
-            return false;
-        hasFailed_ = true;
+            return count;
         if (fault_ == Fault::Throws)
             throw std::runtime_error("broken device");
-        return true;
-    }
-
-    [[nodiscard]] std::streamsize shortened(std::streamsize count) const
-    {
         return fault_ == Fault::IsShort ? count / 2 : 0;
     }
 
     std::uint64_t untilFailure_;
     Fault fault_;
-    bool hasFailed_ = false;
 };
 
-/// Calls attempt(buffer), which answers whether it succeeded, with each operation going wrong in turn until none does, and
-/// answers how many of them it succeeded in spite of.
+/// Calls attempt(buffer, messages), which answers whether it succeeded, with each operation going wrong in turn until none
+/// does, and answers how many of them it succeeded in spite of. Failures have one message each.
 template <class Attempt>
 int failEachOperation(std::string const& bytes, Attempt const& attempt)
 {
     int survived = 0;
-    for (auto const fault : {Fault::Fails, Fault::IsShort, Fault::Throws}) {
-        int failed = 0;
+    for (auto const fault : {Fault::Fails, Fault::IsShort, Fault::Throws})
         for (std::uint64_t number = 1;; ++number) {
             FailingBuf buffer(bytes, number, fault);
-            bool const isDone = attempt(buffer);
+            support::Messages messages;
+            bool const isDone = attempt(buffer, messages);
+            EXPECT_EQ(messages.errors().size(), isDone ? 0u : 1u);
             if (!buffer.hasFailed()) {
-                EXPECT_TRUE(isDone) << "without a fault";
+                EXPECT_TRUE(isDone && number > 2) << "without a fault";
                 break;
             }
-            ++(isDone ? survived : failed);
+            survived += isDone;
         }
-        EXPECT_GT(failed, 1);
-    }
     return survived;
 }
 
@@ -110,13 +100,11 @@ TEST(StreamFailure, AtAnyReadOrSeekGivesOneMessageAndNoObject)
           support::fileBytes(corpus + "v1.zon"), support::fileBytes(corpus + "v3.zon"),
           support::fileBytes(corpus + "v4_handles.zon"), support::fileBytes(corpus + "v5_handles.zon")}) {
         auto const whole = support::read(stream);
-        failEachOperation(stream, [&](FailingBuf& buffer) {
+        failEachOperation(stream, [&](FailingBuf& buffer, Messages& messages) {
             std::istream bytes(&buffer);
             Nexil::InputStream input(bytes);
-            Messages messages;
             Objects objects;
             bool const isRead = IO::deserialize(input, objects, {}, &messages);
-            EXPECT_EQ(messages.errors().size(), isRead ? 0u : 1u);
             EXPECT_EQ(objects.size(), isRead ? whole.objects.size() : 0u);
             // A stream that refuses to seek may still be read from front to back.
             for (std::uint64_t i = 0; i < objects.size(); ++i)
@@ -124,51 +112,27 @@ TEST(StreamFailure, AtAnyReadOrSeekGivesOneMessageAndNoObject)
                                        : !whole.objects[i]);
             return isRead;
         });
-        failEachOperation(stream, [&](FailingBuf& buffer) {
+        failEachOperation(stream, [&](FailingBuf& buffer, Messages& messages) {
             std::istream bytes(&buffer);
             Nexil::InputStream input(bytes);
-            Messages messages;
-            auto const header = createObject();
-            bool const isRead = IO::deserializeHeader(input, *header, &messages);
-            EXPECT_EQ(messages.errors().size(), isRead ? 0u : 1u);
-            return isRead;
+            return IO::deserializeHeader(input, *createObject(), &messages);
         });
     }
 }
 
 TEST(StreamFailure, AtAnyWriteSeekOrFlushIsAFailureWithOneMessage)
 {
-    Sample const sample;
-    auto const before = sample.description();
-    auto const objects = objectsOf(sample);
+    auto const objects = objectsOf(Sample());
     for (int const level : {0, 9}) {
-        int const survived = failEachOperation("", [&](FailingBuf& buffer) {
+        int const survived = failEachOperation("", [&](FailingBuf& buffer, Messages& messages) {
             std::ostream bytes(&buffer);
             Nexil::OutputStream output(bytes);
-            Messages messages;
             IO::SerializationOptions options;
             options.compressionLevel = level;
-            bool const isWritten = IO::serialize(objects, output, options, &messages);
-            EXPECT_EQ(messages.errors().size(), isWritten ? 0u : 1u);
-            return isWritten;
+            return IO::serialize(objects, output, options, &messages);
         });
         EXPECT_EQ(survived, 0);
     }
-    EXPECT_EQ(sample.description(), before);
-}
-
-TEST(StreamFailure, OfAStreamWithoutABufferIsAMessage)
-{
-    std::iostream nowhere(nullptr);
-    Nexil::InputStream input(nowhere);
-    Nexil::OutputStream output(nowhere);
-    Messages messages;
-    Objects objects;
-    auto const header = createObject();
-    EXPECT_FALSE(IO::deserialize(input, objects, {}, &messages));
-    EXPECT_FALSE(IO::deserializeHeader(input, *header, &messages));
-    EXPECT_FALSE(IO::serialize(objects, output, {}, &messages));
-    EXPECT_EQ(messages.errors().size(), 3u);
 }
 
 } // namespace

@@ -74,15 +74,11 @@ TEST(StreamCorpus, TheWriterGivesTheKeptBytes)
         char const* limit;
     };
     // The page that describes the format takes v6_walk apart byte by byte.
-    std::vector<Case> cases{{"v6_walk", "99999999999999999999"},
-                            {"v6_every_type_level0", "4800"},
-                            {"v6_volume_shared", "4800"},
-                            {"v6_many_entries", "4800"}};
-    for (char const* limit : {"1000", " \t1000x", "+1000"})
-        cases.push_back({"v6_chunks_1000_level0", limit});
     // What is no number, or none above 0, means chunks of one byte.
-    for (char const* limit : {"1", "0", "-5", "many", ""})
-        cases.push_back({"v6_chunks_bytes_level0", limit});
+    Case const cases[] = {{"v6_walk", "99999999999999999999"},   {"v6_every_type_level0", "4800"},
+                          {"v6_volume_shared", "4800"},          {"v6_many_entries", "4800"},
+                          {"v6_chunks_1000_level0", " \t1000x"}, {"v6_chunks_1000_level0", "+1000"},
+                          {"v6_chunks_bytes_level0", "-5"},      {"v6_chunks_bytes_level0", "many"}};
     for (Case const& c : cases) {
         support::EnvironmentVariable const variable(kChunkLimit, c.limit);
         auto const kept = support::fileBytes(VELDRIN_TEST_CORPUS "/streams/valid/" + std::string(c.name) + ".zon");

@@ -9,8 +9,6 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <numeric>
-
 namespace {
 
 using testing::ElementsAre;
@@ -18,9 +16,6 @@ using Veldrin::createObject;
 using Veldrin::getPropertyAs;
 using Veldrin::setProperty;
 using ObjectPtr = Nexil::Ptr<Veldrin::Object>;
-using Floats = Nexil::Ptr<Nexil::Array<float>>;
-
-constexpr char kUnknown[] = "Unknown msgpack error occurred";
 
 Nexil::MutablePtr<Veldrin::Object> objectWith(char const* key, Nexil::Any value)
 {
@@ -69,32 +64,6 @@ TEST(StreamRoundTrip, LongArraysComeBackThroughTheWindowAndBesideIt)
         }
 }
 
-TEST(StreamRoundTrip, TwinTypesComeBackAsTheCanonicalOnes)
-{
-    std::pair<Nexil::Any, Nexil::Any> const twins[] = {
-        {5ul, 5ull},
-        {-5l, -5ll},
-        {Veldrin::Math::Vector<long, 2>{1, -2}, Veldrin::Math::long2{1, -2}},
-        {support::array<unsigned long>({1, 2}), support::array<unsigned long long>({1, 2})}};
-    for (auto const& [held, canonical] : twins)
-        EXPECT_EQ(support::describeObjects({readOne(support::written(listOf("t", held)))}),
-                  support::describeObjects(listOf("t", canonical)));
-}
-
-TEST(StreamRoundTrip, NothingOfTheReaderHoldsOnToWhatItGaveAway)
-{
-    auto const data = support::array<float>({1, 2, 3});
-    ObjectPtr const part = objectWith("data", data);
-    auto whole = objectWith("part", part);
-    setProperty(*whole, "data", data);
-    setProperty(*whole, "own", support::array<float>({4}));
-    auto const objects = support::read(support::written({ObjectPtr(std::move(whole)), part})).objects;
-    ASSERT_EQ(objects.size(), 2u);
-    EXPECT_EQ(objects[1].useCount(), 2u);
-    EXPECT_EQ(getPropertyAs<Floats>(*objects[0], "own").useCount(), 2u);
-    EXPECT_EQ(getPropertyAs<Floats>(*objects[0], "data").useCount(), 3u);
-}
-
 TEST(StreamRoundTrip, AChainOfAHundredThousandObjectsNeedsNoStack)
 {
     ObjectPtr chain = objectWith("end", true);
@@ -108,47 +77,56 @@ TEST(StreamRoundTrip, AChainOfAHundredThousandObjectsNeedsNoStack)
     EXPECT_TRUE(back && getPropertyAs<bool>(*back, "end"));
 }
 
-TEST(StreamRoundTrip, AClassThatMakesItsPropertiesUpIsAskedOnce)
+TEST(StreamRoundTrip, SharedAndTwinValuesComeBackOnceAndAreHeldByNothingElse)
 {
-    /// Answers a new object of its class at every question.
-    class Inventor : public Veldrin::Object {
-    public:
-        explicit Inventor(int depth) : depth_(depth) {}
-        [[nodiscard]] Nexil::Array<Nexil::String> keys() const override { return {"next"}; }
-        [[nodiscard]] Nexil::Any getProperty(Nexil::String const&) const override
-        {
-            return depth_ == 0 ? ObjectPtr() : ObjectPtr(Nexil::makePtr<Inventor>(depth_ - 1));
-        }
-
-    private:
-        int depth_;
-    };
-    // Values become entries of their own from the 33rd level on.
-    for (int const levels : {1, 31, 32, 33, 300}) {
-        ObjectPtr back = readOne(support::written({ObjectPtr(Nexil::makePtr<Inventor>(levels))}));
-        for (int i = 0; back && i < levels; ++i)
-            back = getPropertyAs<ObjectPtr>(*back, "next");
-        EXPECT_TRUE(back && back->hasProperty("next")) << levels;
-    }
+    auto const data = support::array<float>({1, 2, 3});
+    ObjectPtr const part = objectWith("data", data);
+    auto whole = objectWith("part", part);
+    setProperty(*whole, "data", data);
+    setProperty(*whole, "own", support::array<unsigned long>({4}));
+    setProperty(*whole, "number", -5l);
+    auto const back = support::read(support::written({ObjectPtr(std::move(whole)), part})).objects;
+    ASSERT_EQ(back.size(), 2u);
+    EXPECT_EQ(back[1], getPropertyAs<ObjectPtr>(*back[0], "part"));
+    EXPECT_EQ(back[1].useCount(), 2u);
+    EXPECT_EQ(getPropertyAs<Nexil::Ptr<Nexil::Array<float>>>(*back[0], "data").useCount(), 3u);
+    EXPECT_EQ(getPropertyAs<Nexil::Ptr<Nexil::Array<unsigned long long>>>(*back[0], "own").useCount(), 2u);
+    EXPECT_EQ(getPropertyAs<long long>(*back[0], "number"), -5);
 }
 
 TEST(StreamRoundTrip, UnknownTypesAreLeftOutWithAWarning)
 {
-    struct Secret {
-        int value;
-    };
+    struct Secret {};
     auto object = objectWith("before", 1);
-    setProperty(*object, "hidden", Secret{2});
+    setProperty(*object, "hidden", Secret{});
     object->setPropertyAny("nothing", {});
-    setProperty(*object, "after", 3);
     support::Messages messages;
     auto const back = readOne(support::written({ObjectPtr(std::move(object))}, 9, &messages));
-    EXPECT_EQ(back->keys(), (Nexil::Array<Nexil::String>{"before", "nothing", "after"}));
+    EXPECT_EQ(back->keys(), (Nexil::Array<Nexil::String>{"before", "nothing"}));
     EXPECT_TRUE(back->getProperty("nothing").empty());
-    EXPECT_EQ(messages.heard.size(), 1u);
     EXPECT_THAT(messages.texts(Nexil::RuntimeMessageCategory::Warning),
                 ElementsAre(testing::AllOf(testing::StartsWith("Property 'hidden' is of the unknown type: '"),
                                            testing::EndsWith("Secret'. it will not be serialized."))));
+}
+
+TEST(StreamRoundTrip, HandlesComeBackAsObjectsFromWhereTheStreamStands)
+{
+    ObjectPtr first = objectWith("n", 1);
+    ObjectPtr second = first;
+    ObjectPtr null;
+    std::stringstream stream;
+    stream << "something else";
+    Nexil::OutputStream output(stream);
+    ASSERT_TRUE(Veldrin::IO::serialize(Nexil::Array<ObjectPtr*>{&first, &null, &second, &first}, output, {}, nullptr));
+    EXPECT_NE(stream.str().find("serialize_handle_addresses"), std::string::npos);
+    stream.seekg(14);
+    Nexil::InputStream input(stream);
+    support::Objects back{null};
+    ASSERT_TRUE(Veldrin::IO::deserialize(input, back, {}, nullptr));
+    ASSERT_EQ(back.size(), 5u);
+    EXPECT_EQ(getPropertyAs<int>(*back[1], "n"), 1);
+    EXPECT_EQ(back[1], back[3]);
+    EXPECT_FALSE(back[2]);
 }
 
 TEST(StreamRoundTrip, WhatCouldNotBeReadAgainIsNotWritten)
@@ -174,63 +152,6 @@ TEST(StreamRoundTrip, WhatCouldNotBeReadAgainIsNotWritten)
     support::EnvironmentVariable const variable("VELDRIN_MAX_SERIALIZATION_ARRAY_SIZE", "1");
     EXPECT_THAT(refusal(large, 0), ElementsAre("Array too large to serialize"));
     EXPECT_THAT(refusal(large, 1), ElementsAre("chunk limit exceeded"));
-}
-
-TEST(StreamRoundTrip, HandlesStoreTheirAddressesAndComeBackAsObjects)
-{
-    ObjectPtr first = objectWith("n", 1);
-    ObjectPtr second = first;
-    ObjectPtr null;
-    std::ostringstream stream;
-    Nexil::OutputStream output(stream);
-    ASSERT_TRUE(Veldrin::IO::serialize(Nexil::Array<ObjectPtr*>{&first, &null, &second, &first}, output, {}, nullptr));
-    auto const result = support::read(stream.str());
-    ASSERT_EQ(result.objects.size(), 4u);
-    EXPECT_EQ(result.objects[0], result.objects[2]);
-    EXPECT_FALSE(result.objects[1]);
-    EXPECT_NE(stream.str().find("serialize_handle_addresses"), std::string::npos);
-}
-
-TEST(StreamRoundTrip, AStreamIsReadFromWhereItStandsAndWithoutSeeking)
-{
-    support::Objects const objects = listOf("values", support::array<float>({1, 2}));
-    std::stringstream stream;
-    stream << "something else";
-    Nexil::OutputStream output(stream);
-    ASSERT_TRUE(Veldrin::IO::serialize(objects, output, {}, nullptr));
-    stream.seekg(14);
-    Nexil::InputStream input(stream);
-    support::Objects back = listOf("already", true);
-    ASSERT_TRUE(Veldrin::IO::deserialize(input, back, {}, nullptr));
-    ASSERT_EQ(back.size(), 2u);
-    EXPECT_EQ(support::describeObjects({back[1]}), support::describeObjects(objects));
-
-    /// Like a pipe: gives its bytes once, in small portions.
-    class Pipe : public std::streambuf {
-    public:
-        explicit Pipe(std::string bytes) : bytes_(std::move(bytes)) {}
-
-    protected:
-        int_type underflow() override
-        {
-            std::size_t const size = std::min<std::size_t>(7, bytes_.size() - given_);
-            if (size == 0)
-                return traits_type::eof();
-            setg(bytes_.data() + given_, bytes_.data() + given_, bytes_.data() + given_ + size);
-            given_ += size;
-            return traits_type::to_int_type(*gptr());
-        }
-
-    private:
-        std::string bytes_;
-        std::size_t given_ = 0;
-    };
-    Pipe pipe(support::written(objects));
-    std::istream pipeStream(&pipe);
-    Nexil::InputStream pipeInput(pipeStream);
-    back.clear();
-    ASSERT_TRUE(Veldrin::IO::deserialize(pipeInput, back, {}, nullptr));
-    EXPECT_EQ(support::describeObjects(back), support::describeObjects(objects));
 }
 
 TEST(StreamHeader, IsReadAloneAndNothingBehindIt)
@@ -280,33 +201,6 @@ TEST(StreamFailure, NamesThePathAndLeavesTheOutputAlone)
     EXPECT_TRUE(header.empty());
 }
 
-TEST(StreamFailure, StreamsInOddStatesAnswerFalseWithOneMessage)
-{
-    /// Throws what no library throws.
-    class Thrower : public std::streambuf {
-        std::streamsize xsputn(char const*, std::streamsize) override { throw 5; }
-        pos_type seekoff(off_type, std::ios_base::seekdir, std::ios_base::openmode) override { return 0; }
-    };
-    // The table offset cannot be put in its place where all goes to the end.
-    std::filebuf appending;
-    std::string const path = testing::TempDir() + "veldrin_appended.zon";
-    ASSERT_TRUE(appending.open(path, std::ios::out | std::ios::binary | std::ios::app));
-    Thrower thrower;
-    support::Messages messages;
-    for (std::streambuf* buffer : {static_cast<std::streambuf*>(&appending), static_cast<std::streambuf*>(&thrower)}) {
-        std::ostream stream(buffer);
-        Nexil::OutputStream output(stream);
-        EXPECT_FALSE(Veldrin::IO::serialize(listOf("n", 1), output, {}, &messages));
-    }
-    std::remove(path.c_str());
-    std::istringstream cut(support::written(listOf("n", 1)).substr(0, 100));
-    cut.exceptions(std::ios::failbit | std::ios::badbit | std::ios::eofbit);
-    Nexil::InputStream input(cut);
-    support::Objects out;
-    EXPECT_FALSE(Veldrin::IO::deserialize(input, out, {}, &messages));
-    EXPECT_THAT(messages.errors(), ElementsAre("Cannot write to stream", kUnknown, "Corrupt stream header"));
-}
-
 TEST(StreamFailure, ACancelledJobAnswersFalseWithoutAMessage)
 {
     std::string const bytes = support::written(listOf("n", 1));
@@ -316,28 +210,6 @@ TEST(StreamFailure, ACancelledJobAnswersFalseWithoutAMessage)
     Nexil::setJobCancelHook(nullptr);
     EXPECT_FALSE(result.isRead);
     EXPECT_EQ(result.errors.size() + result.objects.size(), 0u);
-}
-
-TEST(StreamRoundTrip, ArraysAboveFourGibibytes)
-{
-    if (!std::getenv("VELDRIN_TEST_HUGE"))
-        GTEST_SKIP() << "needs 10 GB of memory and 5 GB of disk: set VELDRIN_TEST_HUGE";
-    std::uint64_t const size = (std::uint64_t(4) << 30) + 5;
-    Nexil::Array<unsigned char> bytes;
-    bytes.resize(size);
-    for (std::uint64_t i = 0; i < size; i += 4093)
-        bytes[i] = static_cast<unsigned char>(i >> 3);
-    auto const objects = listOf("bytes", Nexil::makePtr<Nexil::Array<unsigned char>>(std::move(bytes)));
-    std::string const path = testing::TempDir() + "veldrin_huge.zon";
-    for (int const level : {0, 1}) {
-        Veldrin::IO::SerializationOptions options;
-        options.compressionLevel = level;
-        ASSERT_TRUE(Veldrin::IO::serialize(objects, path.c_str(), options, nullptr));
-        support::Objects back;
-        ASSERT_TRUE(Veldrin::IO::deserialize(path.c_str(), back, {}, nullptr));
-        EXPECT_EQ(support::describeObjects(back), support::describeObjects(objects)) << "level " << level;
-    }
-    std::remove(path.c_str());
 }
 
 } // namespace

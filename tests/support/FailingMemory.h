@@ -23,9 +23,6 @@ public:
 
     /// Whether it was reached.
     [[nodiscard]] bool hasFailed() const noexcept;
-    /// Blocks taken less blocks given back by this thread since the beginning. Always 0 under a sanitizer, which looks for
-    /// leaks itself.
-    [[nodiscard]] std::int64_t blocksHeld() const noexcept;
 };
 
 } // namespace support
