@@ -9,7 +9,15 @@ STREAMS = pathlib.Path(__file__).resolve().parents[1] / "corpus/streams"
 VALID = STREAMS / "valid"
 
 
-class Info(tool.ToolTest):
+def floats(*numbers):
+    return array("f", numbers)
+
+
+def u32(number):
+    return frame(2, number)
+
+
+class Reports(tool.ToolTest):
     def test_every_file_of_the_corpus_is_told_verified_dumped_and_equals_itself(self):
         files = sorted(VALID.glob("*.zon"))
         self.assertGreater(len(files), 20)
@@ -20,60 +28,41 @@ class Info(tool.ToolTest):
     def test_report_of_a_cube(self):
         self.zon("make", "cube", "cube.zon", "--size", "2", "--level", "3")
         report = self.json("info", "cube.zon")
-        cube, = report["objects"]
-        self.assertEqual((report["version"], report["level"], report["handles"], report["bytes"], cube["kind"]),
-                         (6, 3, False, (self.folder / "cube.zon").stat().st_size, "mesh"))
-        self.assertEqual([(c["name"], c["count"]) for c in cube["components"]],
-                         [("point_component", 8), ("face_vertex_component", 24), ("face_component", 6)])
-        normal = cube["properties"][-1]
+        normal = report["objects"][0]["properties"][-1]
         # Six normals, the default of three floats, the mode of four bytes, and the length of the target's name.
-        self.assertEqual((normal["name"], normal["decoded_bytes"]), ("face_vertex_normal", 72 + 12 + 4 + 24))
+        self.assertEqual((report["level"], report["handles"], report["bytes"], normal["decoded_bytes"]),
+                         (3, False, (self.folder / "cube.zon").stat().st_size, 72 + 12 + 4 + 24))
         self.assertTrue(0 < normal["stored_alone_bytes"] < report["bytes"])
-        text = self.zon("dump", "cube.zon", "--max", "2").stdout
-        self.assertIn("data: [ 0, 1, ... ] 24 elements (array<unsigned int>)", text)
 
-
-class Verify(tool.ToolTest):
     def test_the_damaged_entry_is_found_and_the_library_s_message_told(self):
         self.import_text("three.obj", "".join(f"o {name}\nv {name} 0 0\n" for name in (1, 22, 333)))
-        report = self.json("verify", "three.zon")
-        self.assertTrue(report["ok"] and report["hashes_checked"])
-        self.assertEqual([(e["role"], e["type"], e["ok"]) for e in report["entries"]], [("top", "object", True)] * 3)
-        second = report["entries"][1]
+        second = self.json("verify", "three.zon")["entries"][1]
         whole = bytearray((self.folder / "three.zon").read_bytes())
         whole[second["position"] + second["bytes"] - 1] ^= 1
         self.write("hurt.zon", bytes(whole))
         report = self.json("verify", "hurt.zon", code=1)
-        self.assertEqual([e["ok"] for e in report["entries"]], [True, False, True])
+        self.assertEqual([(e["role"], e["type"], e["ok"]) for e in report["entries"]],
+                         [("top", "object", True), ("top", "object", False), ("top", "object", True)])
         self.assertEqual((report["ok"], report["read_fault"], report["objects"]), (False, "Checksum mismatch", None))
         for name, code, message in (("table_role_3", 1, "Corrupt handles"), ("reference_cycle", 1, "ptr not found in map"),
-                                    ("header_odd", 2, "Unknown msgpack error occurred"),
-                                    ("offset_cut", 1, "Corrupt stream header"), ("v4_cut", 1, "Unknown msgpack error")):
+                                    ("header_odd", 2, "Unknown msgpack error occurred"), ("v4_cut", 1, "Unknown msgpack error")):
             result = self.zon("verify", STREAMS / f"bad/{name}.zon", code=code)
             self.assertIn(message, result.stdout + result.stderr, name)
-
-    def test_old_versions_are_read_without_hashes(self):
-        self.assertIn("version 3 has no hashes", self.zon("verify", VALID / "v3.zon").stdout)
         report = self.json("verify", VALID / "v5.zon")
         self.assertEqual((report["hashes_checked"], len(report["entries"]), report["objects"]), (False, 4, 3))
-
-
-def floats(*numbers):
-    return array("f", numbers)
-
-
-def u32(number):
-    return frame(2, number)
 
 
 class Diff(tool.ToolTest):
     def test_a_change_in_a_value_of_any_type_is_found(self):
         report = self.json("diff", VALID / "v6_every_type_level9.zon", VALID / "v6_every_type_other.zon", "--max", "100000",
                            code=1)
-        found = report["differences"]
         self.assertTrue(report["complete"])
-        self.assertEqual({(d["path"][0], d["path"][1]) for d in found}, {("object 0", f"code_{c}") for c in range(370)})
-        self.assertEqual({d["what"] for d in found}, {"value", "null"})
+        self.assertEqual({tuple(d["path"][:2]) for d in report["differences"]},
+                         {("object 0", f"code_{c}") for c in range(370)})
+        report = self.json("diff", VALID / "v6_every_type_level9.zon", VALID / "v6_every_type_other.zon", "--max", "3", code=1)
+        self.assertEqual((len(report["differences"]), report["complete"]), (3, False))
+        self.assertIn("objects: size: 1 | 0",
+                      self.zon("diff", VALID / "v6_every_type_level9.zon", VALID / "v6_empty.zon", code=1).stdout)
 
     def test_differences_by_path(self):
         nan, = struct.unpack("<f", bytes.fromhex("0000c07f"))
@@ -83,7 +72,6 @@ class Diff(tool.ToolTest):
                 ({"a": u32(1)}, {"b": u32(1)}, [], [("a", "missing", "unsigned int", "nothing"),
                                                     ("b", "missing", "nothing", "unsigned int")]),
                 ({"a": u32(1), "b": u32(2)}, {"b": u32(2), "a": u32(1)}, [], [("", "order", '"a"', '"b"')]),
-                (numbers, others, [], [("a/[1]", "value", "2", "2.5")]),
                 (numbers, others, ["--tolerance", "0.5"], []),
                 (numbers, others, ["--tolerance", "0.4"], [("a/[1]", "value", "2", "2.5")]),
                 ({"a": floats(0)}, {"a": floats(-0.0)}, [], [("a/[0]", "value", "0", "-0")]),
@@ -99,14 +87,6 @@ class Diff(tool.ToolTest):
             report = self.json("diff", "a.zon", "b.zon", *options, code=1 if expected else 0)
             self.assertEqual([("/".join(d["path"][1:]), d["what"], d["first"], d["second"])
                               for d in report["differences"]], expected, (first, second))
-            self.assertEqual(report["equal"], not expected)
-
-    def test_sizes_are_told_and_the_asked_number_of_differences_is_not_exceeded(self):
-        self.zon("make", "cube", "a.zon")
-        self.zon("make", "cube", "b.zon", "--size", "3")
-        self.assertIn("objects: size: 1 | 0", self.zon("diff", "a.zon", VALID / "v6_empty.zon", code=1).stdout)
-        report = self.json("diff", "a.zon", "b.zon", "--max", "3", code=1)
-        self.assertEqual((len(report["differences"]), report["complete"]), (3, False))
 
     def test_shared_objects_are_compared_once_and_deep_ones_without_a_stack(self):
         # Level k holds level k - 1 twice: 2^60 paths, 60 objects. Then a chain of 100000 objects.

@@ -77,6 +77,11 @@ def mesh(positions, corners, offsets, counts=None, **more):
             "face_offset": indices(offsets, "face_component"), **more}
 
 
+def strands(point_count, positions, offsets):
+    return {"point_component": component(point_count), "strand_component": component(len(offsets) - 1),
+            "point_position": points(positions), "strand_offset": indices(offsets, "strand_component")}
+
+
 def stream(top, shared=()):
     """A file of objects, each a dict of name to frame. Frame (362, i) refers to object i, those on top counted first."""
     head = obj({"file_identifier": frame(2, 6611198), "file_version": frame(2, 5),

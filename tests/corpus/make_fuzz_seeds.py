@@ -1,11 +1,10 @@
-"""Made the inputs that the fuzz drivers of geometry and of array chunks start from.
+"""Made the inputs that the fuzz driver of geometry starts from.
 
-    make_fuzz_seeds.py FOLDER      writes geometry/* and chunks/*
+    make_fuzz_seeds.py FOLDER      writes geometry/*
 
 The files are kept: no test runs this. Run it again when a driver reads its input in another way.
 """
 import pathlib
-import struct
 import sys
 
 KEEP = 0  # a target, a role or a count as it should be
@@ -53,7 +52,7 @@ SEEDS = {
     "bowtie": geometry([(i, i % 2, 0) for i in range(5)], [0, 1, 2, 2, 3, 4, 0, 0, 1], [0, 3, 6, 9]),
     "wrong_indices": geometry(CUBE, [0, 1, 200, 255, 239, 224, 3, 2, 1], [0, 3, 6, 9]),
     "falling_offsets": geometry(CUBE, QUADS, [0, 8, 4, 12, 3, 24, 250]),
-    "large_counts": geometry(CUBE, QUADS, range(0, 25, 4), counts=(250, 245, 240, 236)),
+    "large_counts": geometry(CUBE, QUADS, range(0, 25, 4), counts=(255, 250, 255, 245, 255, 240, 255, 236)),
     "fan": geometry([(i % 16, i // 16, 1) for i in range(100)], [c for i in range(1, 80) for c in (0, i, i + 1)],
                     range(0, 240, 3)),
     "tiles": tiles(True),
@@ -61,21 +60,6 @@ SEEDS = {
 }
 
 
-def chunk(code, version, packing, count, data):
-    return struct.pack("<HBBI", code, version - 1, packing, count) + data
-
-
-CHUNKS = {
-    "stored_u32": chunk(122, 5, 0, 4, struct.pack("<4I", 1, 2, 3, 4)),
-    "stored_float3_version_1": chunk(151, 1, 0, 2, struct.pack("<6f", 1, 2, 3, 4, 5, 6)),
-    "two_chunks": chunk(120, 5, 0 | 2 | 32 << 2, 16, bytes(range(16))),
-    "math_value": chunk(31, 5, 0, 1, struct.pack("<3f", 1, 2, 3)),
-    "packed_but_not": chunk(122, 5, 1, 4, bytes([2, 1, 2 | 32, 4]) + struct.pack("<III", 16, 16, 32) + bytes(16)),
-}
-
 if __name__ == "__main__":
-    for folder, seeds in (("geometry", SEEDS), ("chunks", CHUNKS)):
-        target = pathlib.Path(sys.argv[1], folder)
-        target.mkdir(exist_ok=True)
-        for name, data in seeds.items():
-            (target / name).write_bytes(data)
+    for name, data in SEEDS.items():
+        pathlib.Path(sys.argv[1], "geometry", name).write_bytes(data)

@@ -58,6 +58,8 @@ TEST(StreamInspection, TellsEveryEntryAndWhichOneIsDamaged)
     EXPECT_EQ(told(kept("v5")), "5 0 0 | 70 f 1 16a 1 | 7f 5 1 16a 1 | 70 f 1 16a 1 | 5b 15 0 7a 1");
     EXPECT_EQ(told(walk.substr(0, 85)), "Corrupt stream header");
     EXPECT_EQ(told(walk + "\x01"), "Corrupt handles");
+    EXPECT_EQ(told(kept("../bad/table_position_at_table")), "Corrupt handles");
+    EXPECT_EQ(told(kept("../bad/table_role_3")), "6 0 1 | 5b a 3 16a 0");
     EXPECT_EQ(told(""), "Unknown msgpack error occurred");
 }
 

@@ -85,6 +85,9 @@ TEST(StreamRoundTrip, SharedAndTwinValuesComeBackOnceAndAreHeldByNothingElse)
     setProperty(*whole, "data", data);
     setProperty(*whole, "own", support::array<unsigned long>({4}));
     setProperty(*whole, "number", -5l);
+    auto once = support::array<int>({7});
+    setProperty(*whole, "any", support::array<Nexil::Any>({once}));
+    setProperty(*whole, "once", std::move(once));
     auto const back = support::read(support::written({ObjectPtr(std::move(whole)), part})).objects;
     ASSERT_EQ(back.size(), 2u);
     EXPECT_EQ(back[1], getPropertyAs<ObjectPtr>(*back[0], "part"));
@@ -92,6 +95,9 @@ TEST(StreamRoundTrip, SharedAndTwinValuesComeBackOnceAndAreHeldByNothingElse)
     EXPECT_EQ(getPropertyAs<Nexil::Ptr<Nexil::Array<float>>>(*back[0], "data").useCount(), 3u);
     EXPECT_EQ(getPropertyAs<Nexil::Ptr<Nexil::Array<unsigned long long>>>(*back[0], "own").useCount(), 2u);
     EXPECT_EQ(getPropertyAs<long long>(*back[0], "number"), -5);
+    using Ints = Nexil::Ptr<Nexil::Array<int>>;
+    auto const any = getPropertyAs<Nexil::Ptr<Nexil::Array<Nexil::Any>>>(*back[0], "any");
+    EXPECT_EQ(*(*any)[0].get<Ints>(), getPropertyAs<Ints>(*back[0], "once"));
 }
 
 TEST(StreamRoundTrip, UnknownTypesAreLeftOutWithAWarning)
@@ -127,6 +133,23 @@ TEST(StreamRoundTrip, HandlesComeBackAsObjectsFromWhereTheStreamStands)
     EXPECT_EQ(getPropertyAs<int>(*back[1], "n"), 1);
     EXPECT_EQ(back[1], back[3]);
     EXPECT_FALSE(back[2]);
+    EXPECT_EQ(stream.tellg(), std::streampos(stream.str().size()));
+}
+
+TEST(StreamRoundTrip, AStreamThatCannotSeekIsReadFromFrontToBack)
+{
+    struct Pipe : std::stringbuf {
+        using std::stringbuf::stringbuf;
+        pos_type seekoff(off_type, std::ios_base::seekdir, std::ios_base::openmode) override { return off_type(-1); }
+        pos_type seekpos(pos_type, std::ios_base::openmode) override { return off_type(-1); }
+    };
+    support::Objects const objects = listOf("values", support::array<float>({1, 2}));
+    Pipe pipe(support::written(objects));
+    std::istream stream(&pipe);
+    Nexil::InputStream input(stream);
+    support::Objects back;
+    ASSERT_TRUE(Veldrin::IO::deserialize(input, back, {}, nullptr));
+    EXPECT_EQ(support::describeObjects(back), support::describeObjects(objects));
 }
 
 TEST(StreamRoundTrip, WhatCouldNotBeReadAgainIsNotWritten)
