@@ -75,34 +75,104 @@ namespace {
         /// Writes both sides of all edges that a point owns; its face-vertices are pointFaces[begin, end).
         void find(unsigned int point, std::uint64_t begin, std::uint64_t end)
         {
-            if (end - begin <= kSmallGroup)
-                findInSmallGroup(point, begin, end);
-            else
-                findInLargeGroup(point, begin, end);
+            if (end - begin > kSmallGroup || !findInPlainGroup(point, begin, end))
+                findInAnyGroup(point, begin, end);
         }
 
     private:
-        /// Calls leaving(run) and arriving(run) for the runs that begin and end at the point and are its own.
-        template <class Leaving, class Arriving>
-        [[gnu::always_inline]] void forEachRun(unsigned int point, std::uint64_t begin, std::uint64_t end,
-                                               Leaving const& leaving, Arriving const& arriving)
+        /// The corners around one of a face, which is at `first + corner` itself.
+        struct Around {
+            unsigned int first;
+            unsigned int last; ///< corner, as are the others
+            unsigned int before;
+            unsigned int next; ///< point, as is the other
+            unsigned int previous;
+        };
+
+        [[gnu::always_inline]] Around around(FaceEdge const& at) const noexcept
         {
+            Geometry::IndexRange const range = ranges_[at.face];
+            auto const first = static_cast<unsigned int>(range.begin);
+            auto const last = static_cast<unsigned int>(range.end - range.begin) - 1;
+            unsigned int const before = at.corner == 0 ? last : at.corner - 1;
+            return {first, last, before, points_[first + (at.corner == last ? 0 : at.corner + 1)],
+                    points_[first + before]};
+        }
+
+        /// Runs of a small group between its point and others. How many there are is kept beside it, in a register.
+        struct FewRuns {
+            std::array<unsigned int, kSmallGroup> others;
+            std::array<unsigned int, kSmallGroup> indices;
+            std::array<FaceEdge, kSmallGroup> edges;
+
+            [[gnu::always_inline]] void set(std::size_t at, unsigned int other, unsigned int index,
+                                            FaceEdge const& edge) noexcept
+            {
+                others[at] = other;
+                indices[at] = index;
+                edges[at] = edge;
+            }
+        };
+
+        /// For points that every face has once, and no face of two corners: false where it is otherwise.
+        ///
+        /// Faces come in order then, and the first run that fits is the right one. Without branches on what a mesh may have in
+        /// any order, as half of them would be mispredicted.
+        bool findInPlainGroup(unsigned int point, std::uint64_t begin, std::uint64_t end)
+        {
+            std::size_t leavingCount = 0;
+            std::size_t arrivingCount = 0;
+            bool isPlain = true;
+            unsigned int lastFace = kInvalidIndex;
             for (std::uint64_t i = begin; i < end; ++i) {
                 prefetch(i + kPrefetchDistance);
                 FaceEdge const at = pointFaces_[i];
-                Geometry::IndexRange const range = ranges_[at.face];
-                auto const first = static_cast<unsigned int>(range.begin);
-                auto const last = static_cast<unsigned int>(range.end - range.begin) - 1;
-                unsigned int const next = points_[first + (at.corner == last ? 0 : at.corner + 1)];
-                unsigned int const before = at.corner == 0 ? last : at.corner - 1;
-                unsigned int const previous = points_[first + before];
-                if (next > point)
-                    leaving(Run{next, first + at.corner, at.face, at.corner});
-                else if (next == point)
-                    adjacentEdges_[first + at.corner] = FaceEdge{};
-                if (previous > point)
-                    arriving(Run{previous, first + before, at.face, before});
+                Around const a = around(at);
+                isPlain &= (at.face != lastFace) & (a.last > 1);
+                lastFace = at.face;
+                leavingFew_.set(leavingCount, a.next, a.first + at.corner, at);
+                leavingCount += a.next > point ? 1 : 0;
+                arrivingFew_.set(arrivingCount, a.previous, a.first + a.before, {at.face, a.before});
+                arrivingCount += a.previous > point ? 1 : 0;
             }
+            if (!isPlain)
+                return false;
+            write(leavingFew_, leavingCount, arrivingFew_, arrivingCount);
+            write(arrivingFew_, arrivingCount, leavingFew_, leavingCount);
+            return true;
+        }
+
+        /// For each of `runs` the first of `others` along the same edge.
+        [[gnu::always_inline]] void write(FewRuns const& runs, std::size_t count, FewRuns const& others,
+                                          std::size_t otherCount)
+        {
+            for (std::size_t i = 0; i < count; ++i) {
+                std::size_t found = kSmallGroup;
+                for (std::size_t j = otherCount; j-- > 0;)
+                    found = others.others[j] == runs.others[i] ? j : found;
+                adjacentEdges_[runs.indices[i]] = found == kSmallGroup ? FaceEdge{} : others.edges[found];
+            }
+        }
+
+        void findInAnyGroup(unsigned int point, std::uint64_t begin, std::uint64_t end)
+        {
+            leaving_.clear();
+            arriving_.clear();
+            for (std::uint64_t i = begin; i < end; ++i) {
+                prefetch(i + kPrefetchDistance);
+                FaceEdge const at = pointFaces_[i];
+                Around const a = around(at);
+                if (a.next > point)
+                    leaving_.push_back({a.next, a.first + at.corner, at.face, at.corner});
+                else if (a.next == point)
+                    adjacentEdges_[a.first + at.corner] = FaceEdge{};
+                if (a.previous > point)
+                    arriving_.push_back({a.previous, a.first + a.before, at.face, a.before});
+            }
+            sort(leaving_);
+            sort(arriving_);
+            write(leaving_, arriving_);
+            write(arriving_, leaving_);
         }
 
         /// Where points are numbered without order, each face lies somewhere else in memory.
@@ -115,45 +185,7 @@ namespace {
             }
         }
 
-        void findInSmallGroup(unsigned int point, std::uint64_t begin, std::uint64_t end)
-        {
-            auto& leaving = fewLeaving_;
-            auto& arriving = fewArriving_;
-            std::size_t leavingCount = 0;
-            std::size_t arrivingCount = 0;
-            forEachRun(
-                point, begin, end, [&](Run const& run) { leaving[leavingCount++] = run; },
-                [&](Run const& run) { arriving[arrivingCount++] = run; });
-            auto const write = [&](auto const& runs, std::size_t count, auto const& others, std::size_t otherCount) {
-                for (std::size_t i = 0; i < count; ++i) {
-                    unsigned int lowest = kInvalidIndex;
-                    FaceEdge across;
-                    for (std::size_t j = 0; j < otherCount; ++j)
-                        if (others[j].other == runs[i].other && others[j].face != runs[i].face &&
-                            others[j].index < lowest) {
-                            lowest = others[j].index;
-                            across = others[j].edge();
-                        }
-                    adjacentEdges_[runs[i].index] = across;
-                }
-            };
-            write(leaving, leavingCount, arriving, arrivingCount);
-            write(arriving, arrivingCount, leaving, leavingCount);
-        }
-
-        void findInLargeGroup(unsigned int point, std::uint64_t begin, std::uint64_t end)
-        {
-            leaving_.clear();
-            arriving_.clear();
-            forEachRun(
-                point, begin, end, [&](Run const& run) { leaving_.push_back(run); },
-                [&](Run const& run) { arriving_.push_back(run); });
-            sort(leaving_);
-            sort(arriving_);
-            write(leaving_, arriving_);
-            write(arriving_, leaving_);
-        }
-
+        /// Without branches on what a mesh may have in any order: half of them would be mispredicted.
         static void sort(std::vector<Run>& runs)
         {
             auto const isBefore = [](Run const& a, Run const& b) {
@@ -187,8 +219,8 @@ namespace {
         FaceEdge const* pointFaces_;
         FaceEdge* adjacentEdges_;
         // Kept from point to point: making them takes longer than finding what goes into them.
-        std::array<Run, kSmallGroup> fewLeaving_;
-        std::array<Run, kSmallGroup> fewArriving_;
+        FewRuns leavingFew_;
+        FewRuns arrivingFew_;
         std::vector<Run> leaving_;
         std::vector<Run> arriving_;
     };
