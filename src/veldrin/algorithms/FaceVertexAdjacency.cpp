@@ -83,9 +83,8 @@ namespace {
         /// The corners around one of a face, which is at `first + corner` itself.
         struct Around {
             unsigned int first;
-            unsigned int last; ///< corner, as are the others
-            unsigned int before;
-            unsigned int next; ///< point, as is the other
+            unsigned int before; ///< corner
+            unsigned int next;   ///< point, as is the other
             unsigned int previous;
         };
 
@@ -95,8 +94,7 @@ namespace {
             auto const first = static_cast<unsigned int>(range.begin);
             auto const last = static_cast<unsigned int>(range.end - range.begin) - 1;
             unsigned int const before = at.corner == 0 ? last : at.corner - 1;
-            return {first, last, before, points_[first + (at.corner == last ? 0 : at.corner + 1)],
-                    points_[first + before]};
+            return {first, before, points_[first + (at.corner == last ? 0 : at.corner + 1)], points_[first + before]};
         }
 
         /// Runs of a small group between its point and others. How many there are is kept beside it, in a register.
@@ -114,7 +112,7 @@ namespace {
             }
         };
 
-        /// For points that every face has once, and no face of two corners: false where it is otherwise.
+        /// For points that every face has once, between two different ones: false where it is otherwise.
         ///
         /// Faces come in order then, and the first run that fits is the right one. Without branches on what a mesh may have in
         /// any order, as half of them would be mispredicted.
@@ -128,7 +126,7 @@ namespace {
                 prefetch(i + kPrefetchDistance);
                 FaceEdge const at = pointFaces_[i];
                 Around const a = around(at);
-                isPlain &= (at.face != lastFace) & (a.last > 1);
+                isPlain &= (at.face != lastFace) & (a.next != a.previous);
                 lastFace = at.face;
                 leavingFew_.set(leavingCount, a.next, a.first + at.corner, at);
                 leavingCount += a.next > point ? 1 : 0;
