@@ -52,29 +52,25 @@ struct Sample {
                        *strands);
     }
 
-    /// Ranges selected by the definition, counting instead of stopping early. isSelected: of a place below `limit`.
+    /// Calls visit(face, place) for the places below `limit` that each face owns.
+    template <class Visit>
+    void forEachOwned(std::size_t limit, Visit const& visit) const
+    {
+        for (std::size_t i = 0; i + 1 < offsets.size(); ++i)
+            for (std::size_t k = offsets[i]; k < std::min<std::size_t>(offsets[i + 1], limit); ++k)
+                visit(i, k);
+    }
+
+    /// The faces selected by the definition. isSelected: of a place below `limit`.
     template <class IsSelected>
     Mask gathered(std::size_t limit, Style style, IsSelected const& isSelected) const
     {
         Mask result = maskOf(offsets.size() - 1);
-        for (std::size_t i = 0; i < result.size(); ++i) {
-            std::size_t selected = 0;
-            std::size_t size = 0;
-            for (std::size_t k = offsets[i]; k < std::min<std::size_t>(offsets[i + 1], limit); ++k, ++size)
-                selected += isSelected(k) ? 1 : 0;
-            result[i] = style == Style::AllElements ? size > 0 && selected == size : selected > 0;
-        }
+        Mask missed = result;
+        forEachOwned(limit, [&](std::size_t i, std::size_t k) { (isSelected(k) ? result : missed)[i] = true; });
+        for (std::size_t i = 0; style == Style::AllElements && i < result.size(); ++i)
+            result[i] = result[i] && !missed[i];
         return result;
-    }
-
-    /// Calls visit(place) for the corners of selected faces.
-    template <class IsSelected, class Visit>
-    void scatter(IsSelected const& isSelected, Visit const& visit) const
-    {
-        for (std::size_t i = 0; i + 1 < offsets.size(); ++i)
-            for (std::size_t k = offsets[i]; isSelected(i) && k < std::min<std::size_t>(offsets[i + 1], corners.size());
-                 ++k)
-                visit(k);
     }
 };
 
@@ -112,9 +108,11 @@ void expectDefinition(Sample const& s, std::mt19937& random, int extra)
         if (s.corners[k] < s.pointCount)
             points[s.corners[k]] = true;
     };
-    s.scatter(face, [&](std::size_t k) {
-        reached[k] = true;
-        reachPoint(reachedPoints, k);
+    s.forEachOwned(cornerCount, [&](std::size_t i, std::size_t k) {
+        if (face(i)) {
+            reached[k] = true;
+            reachPoint(reachedPoints, k);
+        }
     });
     EXPECT_EQ(*facesToFaceVertices(*s.mesh, ofFaces, &ok), reached);
     EXPECT_EQ(*strandsToPoints(*s.strands, ofFaces, &ok), reached);

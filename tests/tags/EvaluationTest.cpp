@@ -112,27 +112,6 @@ TEST(TagEvaluation, ASingleTagIsHandedOutAsItIsStored)
     }
 }
 
-TEST(TagEvaluation, WhatIsNotStoredAsTagsAreResolvesToNothing)
-{
-    auto geometry = TagSample{2, {}, {}, {{"ok_1", "point_component", "10"}}}.build();
-    auto const add = [&](char const* name, auto const& data, bool isWhole) {
-        setProperty(*geometry, name, support::filled([&](Object& property) {
-            if (isWhole)
-                createDataGeoProperty(false, property);
-            setProperty(property, "data", data);
-            setProperty(property, "target", "point_component");
-        }));
-    };
-    add("bare_1", maskOf("01"), false);
-    add("null_1", MaskPtr(), true);
-    add("number_1", support::array<int>({1, 1}), true);
-    setProperty(*geometry, "text_1", "01");
-    // By its name a mask with a target is a tag; patterns look among the data geo properties.
-    EXPECT_EQ(answerTo("bare_1", *geometry), "point_component 01");
-    for (char const* text : {"*_1", "ok_1 ^ null_1", "ok_1 ^ number_1", "ok_1 ^ text_1"})
-        EXPECT_EQ(answerTo(text, *geometry), "point_component 10") << text;
-}
-
 TEST(TagEvaluation, ACancelledJobEndsConversionsAndChangesNothing)
 {
     auto const geometry =
