@@ -1,5 +1,3 @@
-#include "Tracked.h"
-
 #include <nexil/Array.h>
 #include <nexil/String.h>
 
@@ -20,7 +18,6 @@ extern "C" __attribute__((visibility("default"))) char const* __asan_default_opt
 namespace {
 
 using Nexil::Array;
-using support::Tracked;
 using testing::ElementsAre;
 
 bool isAligned(void const* storage, std::uintptr_t alignment)
@@ -57,21 +54,6 @@ TEST(Array, AnElementOfItsOwnCanBeAppended)
     for (int i = 0; i < 40; ++i)
         array.push_back(array[0]);
     EXPECT_THAT(array, testing::AllOf(testing::SizeIs(41), testing::Each(text)));
-}
-
-TEST(Array, AFailedCopyLeavesEverythingAsItWas)
-{
-    int const before = Tracked::alive;
-    {
-        Array<Tracked> const array{1, 2, 3};
-        Array<Tracked> target{9};
-        {
-            support::FailingCopies const fail(2);
-            EXPECT_THROW(target = array, std::runtime_error);
-        }
-        EXPECT_THAT(target, ElementsAre(Tracked(9)));
-    }
-    EXPECT_EQ(Tracked::alive, before);
 }
 
 TEST(Array, ElementsOfWideAlignmentAndBoolsLieAsBytesOneAfterTheOther)

@@ -199,6 +199,10 @@ Case const kCases[] = {
          data("d", "e", {1})(o);
      },
      Code::InvalidTarget, "d has an invalid target e"},
+    {"data over a range that asks for some values, for none last", Kind::Any, sharedOut({5, 6}, {1, 0, kInvalidIndex})},
+    {"a last index that tells the number of values", Kind::Any, sharedOut({5, 6}, {0, 1, 1, 2})},
+    {"an index behind the number of values", Kind::Any, sharedOut({5, 6}, {2, 0, 1}), Code::InvalidIndex,
+     "d_index contains an invalid index into d"},
     {"a last index behind the number of values", Kind::Any, sharedOut({5, 6}, {0, 1, 1, 3}), Code::InvalidIndex,
      "d_index contains an invalid index into d"},
     {"a range that is told first, though the data over it fails as well", Kind::Any, sharedOut({5, 6}, {0, 9}),
