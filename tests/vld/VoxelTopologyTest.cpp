@@ -43,54 +43,54 @@ TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
     using Traits = TypeParam;
     constexpr int kWidth = Traits::kDataWidth;
     struct Damage {
-        char const* name;
+        std::string report;
         std::function<void(TileLevels&)> apply;
     };
     auto swap = [](auto& array, std::uint64_t a, std::uint64_t b) { std::swap(array[a], array[b]); };
-    auto firstFree = [](TileLevels& levels) -> unsigned int& {
-        return *std::find(levels.innerChildren.begin(), levels.innerChildren.end(), kNoTile);
-    };
-    auto firstUsed = [](TileLevels& levels) -> unsigned int& {
-        return *std::find_if(levels.innerChildren.begin(), levels.innerChildren.end(),
-                             [](unsigned int child) { return child != kNoTile; });
-    };
     auto addInner = [](TileLevels& levels, Coordinate const& origin) {
         levels.innerOrigins.push_back(origin);
         for (unsigned int cell = 0; cell < Traits::kInnerCells; ++cell)
             levels.innerChildren.push_back(kNoTile);
     };
+    auto const innerCount = this->sound().innerOrigins.size();
+    std::string const newInner = "wrong origin of inner tile " + std::to_string(innerCount);
+    std::string const lastCell = "wrong child in cell " + std::to_string(innerCount * Traits::kInnerCells - 1);
     std::vector<Damage> const damages{
-        {"leaf tiles in another order, with all that points at them",
+        // Leaf tiles in another order, with all that points at them.
+        {"wrong origin of leaf tile 1",
          [&](TileLevels& l) {
              swap(l.leafOrigins, 0, 1);
              swap(l.leafParents, 0, 1);
              for (unsigned int& child : l.innerChildren)
                  child = child < 2 ? 1 - child : child;
          }},
-        {"a leaf origin twice", [&](TileLevels& l) { l.leafOrigins[1] = l.leafOrigins[0]; }},
-        {"a leaf origin not aligned", [&](TileLevels& l) { l.leafOrigins[0].z += 1; }},
-        {"a leaf origin elsewhere", [&](TileLevels& l) { l.leafOrigins[0].x -= 100 * kWidth; }},
-        {"inner origins not increasing", [&](TileLevels& l) { swap(l.innerOrigins, 0, 1); }},
-        {"an inner tile twice, once without leaf tiles",
-         [&](TileLevels& l) { addInner(l, l.innerOrigins[l.innerOrigins.size() - 1]); }},
-        {"an inner tile beyond the limits",
+        {"wrong origin of leaf tile 1", [&](TileLevels& l) { l.leafOrigins[1] = l.leafOrigins[0]; }},
+        {"wrong origin of leaf tile 3", [&](TileLevels& l) { l.leafOrigins[3].z += 1, l.leafOrigins[5].z += 1; }},
+        {"no cell of its parent points at leaf tile 0", [&](TileLevels& l) { l.leafOrigins[0].x -= 100 * kWidth; }},
+        {"wrong origin of inner tile 1", [&](TileLevels& l) { swap(l.innerOrigins, 0, 1); }},
+        // An inner tile twice, once without leaf tiles; beyond the limits; not aligned.
+        {newInner, [&](TileLevels& l) { addInner(l, l.innerOrigins[l.innerOrigins.size() - 1]); }},
+        {newInner,
          [&](TileLevels& l) {
              addInner(l, {kCoordinateLimit, 0, 0});
          }},
-        {"an inner tile not aligned",
+        {newInner,
          [&](TileLevels& l) {
              addInner(l, {kCoordinateLimit - kWidth, 0, 0});
          }},
-        {"a parent missing", [&](TileLevels& l) { l.leafParents.resize(l.leafParents.size() - 1); }},
-        {"a parent too many", [&](TileLevels& l) { l.leafParents.push_back(0); }},
-        {"a parent out of range", [&](TileLevels& l) { l.leafParents[2] = unsigned(l.innerOrigins.size()); }},
-        {"another parent", [&](TileLevels& l) { l.leafParents[0] = l.leafParents[8]; }},
-        {"children missing", [&](TileLevels& l) { l.innerChildren.resize(l.innerChildren.size() - 1); }},
-        {"children too many", [&](TileLevels& l) { l.innerChildren.push_back(kNoTile); }},
-        {"a child out of range", [&](TileLevels& l) { firstFree(l) = unsigned(l.leafOrigins.size()); }},
-        {"a child in a second cell", [&](TileLevels& l) { firstFree(l) = 0; }},
-        {"a child lost", [&](TileLevels& l) { firstUsed(l) = kNoTile; }},
-        {"leaf tiles without inner ones",
+        {"parents are not one per leaf tile", [&](TileLevels& l) { l.leafParents.resize(l.leafParents.size() - 1); }},
+        {"parents are not one per leaf tile", [&](TileLevels& l) { l.leafParents.push_back(0); }},
+        {"no cell of its parent points at leaf tile 2",
+         [&](TileLevels& l) { l.leafParents[2] = unsigned(l.innerOrigins.size()); }},
+        {"no cell of its parent points at leaf tile 0", [&](TileLevels& l) { l.leafParents[0] = l.leafParents[8]; }},
+        {"children are not one per cell", [&](TileLevels& l) { l.innerChildren.resize(l.innerChildren.size() - 1); }},
+        {"children are not one per cell", [&](TileLevels& l) { l.innerChildren.push_back(kNoTile); }},
+        {lastCell,
+         [&](TileLevels& l) { l.innerChildren[l.innerChildren.size() - 1] = unsigned(l.leafOrigins.size()); }},
+        {lastCell, [&](TileLevels& l) { l.innerChildren[l.innerChildren.size() - 1] = 0; }},
+        {"no cell of its parent points at leaf tile 0",
+         [&](TileLevels& l) { *std::find(l.innerChildren.begin(), l.innerChildren.end(), 0u) = kNoTile; }},
+        {"no cell of its parent points at leaf tile 0",
          [&](TileLevels& l) {
              l.innerOrigins.clear();
              l.innerChildren.clear();
@@ -100,17 +100,19 @@ TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
     EXPECT_TRUE(VoxelTopology<Traits>::create("t", TileLevels()));
     EXPECT_FALSE(VoxelTopology<Traits>::create("", this->sound()));
     for (Damage const& damage : damages) {
-        SCOPED_TRACE(damage.name);
+        SCOPED_TRACE(&damage - damages.data());
         TileLevels levels = this->sound();
         damage.apply(levels);
         EXPECT_FALSE(VoxelTopology<Traits>::create("t", levels));
         auto const topology = Nexil::makePtr<VoxelTopology<Traits>>("t", levels);
         Container<Traits> const container("c", topology, 1);
         EXPECT_FALSE(container.checkConsistency(false));
-        EXPECT_EQ(reportOf(container).rfind("topology t: ", 0), 0u);
+        EXPECT_EQ(reportOf(container), "topology t: " + damage.report + "\n");
     }
     auto const good = Nexil::makePtr<VoxelTopology<Traits>>("t", this->sound());
     EXPECT_TRUE(Container<Traits>("c", good, 0.5f).checkConsistency(true));
+    std::uint64_t const arrays = good->leafCount() * 16ull + good->innerCount() * (12 + 4ull * Traits::kInnerCells);
+    EXPECT_EQ(good->byteSize() - arrays, sizeof(*good) + sizeof(TileHash) + TileHash(good->innerOrigins()).byteSize());
     EXPECT_FALSE(Container<Traits>("c", nullptr, 0.5f).checkConsistency(false));
     for (float const size : {0.0f, -1.0f, std::numeric_limits<float>::infinity(), std::nanf("")})
         EXPECT_FALSE(Container<Traits>("c", good, size).checkConsistency(false));

@@ -51,26 +51,33 @@ public:
             drawn.push_back(random_() % 100 == 0 ? oneOf(values) : mostly);
         auto const grid =
             buildFromVoxels<Traits>({.channelName = channelName, .voxelSize = 0.1f}, voxels_, drawn, oneOf(values));
+        Nexil::MutablePtr<Channel<Traits>> channel(Nexil::Ptr<Channel<Traits>>{grid.channel});
+        auto const elements = channel->template writeValues<T>();
+        for (unsigned int element = 0; element < elements.size(); ++element) {
+            // Nobody looks at the value of a cell with a leaf tile.
+            if (grid.topology->isCellWithLeaf(element))
+                elements[element] = oneOf(values);
+            else if (isContent(elements[element]))
+                growBy(grid.topology->elementCube(element));
+        }
         volume->addComponent(grid.topology);
         volume->addComponent(grid.container);
-        volume->addComponent(grid.channel);
-        auto const elements = grid.channel->template values<T>();
-        for (unsigned int element = 0; element < elements->size(); ++element) {
-            if (grid.topology->isCellWithLeaf(element) || !isContent((*elements)[element]))
-                continue;
-            VoxelCube const cube = grid.topology->elementCube(element);
-            for (int axis = 0; axis < 3; ++axis) {
-                long double const low = cube.origin[axis];
-                box.min[axis] = std::min(box.min[axis], nearestNotAbove(low * 0.1f));
-                box.max[axis] = std::max(box.max[axis], -nearestNotAbove(-(low + cube.width) * 0.1f));
-            }
-        }
+        volume->addComponent(std::move(channel));
     }
 
     Nexil::MutablePtr<VLD::Object> volume = VLD::createObject();
     Box box{{-9, 0, 0}, {0, 0, 2}};
 
 private:
+    void growBy(VoxelCube const& cube)
+    {
+        for (int axis = 0; axis < 3; ++axis) {
+            long double const low = cube.origin[axis];
+            box.min[axis] = std::min(box.min[axis], nearestNotAbove(low * 0.1f));
+            box.max[axis] = std::max(box.max[axis], -nearestNotAbove(-(low + cube.width) * 0.1f));
+        }
+    }
+
     template <class Choices>
     auto oneOf(Choices const& choices)
     {

@@ -5,6 +5,7 @@
 
 #include <nexil/JobCancel.h>
 #include <veldrin/geometry/Prototypes.h>
+#include <veldrin/tags/TagData.h>
 #include <veldrin/volume/ValidUpdatedVolume.h>
 #include <veldrin/volume/VldProxyAccess.h>
 #include <veldrin/volume/VldProxyComponentChannel.h>
@@ -117,6 +118,18 @@ TEST(VolumeConversion, EveryReaderOfGeometryReadsAVolume)
         ASSERT_EQ((*indices)[i], i);
     EXPECT_EQ(getRangeGeoPropIndices(*object, sVoxelTileTree), indices) << "made once";
     EXPECT_NE(support::dump(*object).find("default: 1 (float)"), std::string::npos);
+
+    Nexil::Array<bool> few;
+    few.resize(values->size());
+    auto const mask = Nexil::makePtr<Nexil::Array<bool>>(std::move(few));
+    auto tag = createObject();
+    populateTag(sVoxelTileTree, mask, *tag);
+    setProperty(*object, "voxel_few_tag", std::move(tag));
+    Nexil::Ptr<Nexil::Array<bool>> read;
+    Nexil::String component;
+    EXPECT_TRUE(getTagData(*object, "voxel_few_tag", read, component));
+    EXPECT_EQ(read, mask);
+    EXPECT_EQ(component, sVoxelComp);
 }
 
 TEST(VolumeConversion, CostsTheSameForAnyNumberOfVoxels)
@@ -173,70 +186,61 @@ TEST(VolumeConversion, AVolumeWithAComponentThatHasNoPlaceStaysWhole)
 TEST(VolumeConversion, AnObjectThatIsNoVolumeStaysWhole)
 {
     using namespace Veldrin::Geometry;
-    auto expectRefused = [](Object& object) {
+    using Held = Nexil::MutablePtr<Object>;
+    auto const one = channel<SmallTiles>("x", "c", 1);
+    auto const other = support::sphere<WideTiles>({.channelName = "d"});
+    auto converted = [] { return move_vld_volume_to_object(*support::sphereVolume<SmallTiles>()); };
+    auto with = [&](auto proxy) {
+        auto object = converted();
+        setProperty(*object, "misfit", ObjectPtr(Nexil::makePtr<decltype(proxy)>(std::move(proxy))));
+        return object;
+    };
+    auto changed = [](Held object, char const* name, char const* key, Nexil::Any value) {
+        Held part(support::part(*object, name));
+        EXPECT_TRUE(part->setPropertyAny(key, std::move(value)));
+        setProperty(*object, name, std::move(part));
+        return object;
+    };
+    auto renamed = [&](char const* from, char const* holder) {
+        auto object = converted();
+        object->setPropertyAny("renamed", object->extractProperty(from));
+        return changed(std::move(object), holder, sTarget, Nexil::String("renamed"));
+    };
+    auto levelSet = [&] { return support::filled(&populateLevelSet); };
+    std::pair<char const*, Held> const misfits[] = {
+        {"a topology proxy of nothing", with(VldProxyComponentTopology(nullptr))},
+        {"a topology proxy of a channel", with(VldProxyComponentTopology(one))},
+        {"a container proxy of nothing", with(VldProxyComponentContainer(nullptr, "voxel_component"))},
+        {"a container of other tiles", with(VldProxyComponentContainer(other.container, "voxel_component"))},
+        {"a channel of other tiles", with(VldProxyComponentChannel(other.channel, "voxel_tile_tree"))},
+        {"a channel proxy of nothing", with(VldProxyComponentChannel(nullptr, "voxel_tile_tree"))},
+        {"a channel whose target is not there", with(VldProxyComponentChannel(one, "nothing"))},
+        {"two components of one name",
+         with(VldProxyComponentChannel(channel<SmallTiles>("voxel_component", "c", 1), "voxel_tile_tree"))},
+        {"a topology under another name, which its container targets", renamed(sVoxelComp, sVoxelTileTree)},
+        {"a container under another name, which a channel targets", renamed(sVoxelTileTree, sVoxelSignedDistance)},
+        {"a mesh", support::filled([](Object& o) { populateCubeMesh(1, o); })},
+        {"a mesh that is also an empty volume", support::filled([](Object& o) {
+             populateMesh(o);
+             populateVolume(o);
+         })},
+        {"plain elements", changed(levelSet(), sVoxelComp, sCount, 3u)},
+        {"a plain value", changed(levelSet(), sVoxelSignedDistance, sData, Nexil::makePtr<FloatArray>(FloatArray{1}))},
+        {"a plain range", changed(levelSet(), sVoxelTileTree, sIndices,
+                                  Nexil::makePtr<Nexil::Array<unsigned int>>(Nexil::Array<unsigned int>{1}))},
+        {"a property of another kind", support::filled([](Object& o) {
+             populateVolume(o);
+             setProperty(o, "values", Nexil::makePtr<FloatArray>(FloatArray{1}));
+         })},
+    };
+    for (auto const& [what, misfit] : misfits) {
+        SCOPED_TRACE(what);
+        Object object = *misfit;
         std::string const before = support::dump(object);
         EXPECT_FALSE(move_object_to_vld_volume(object));
         EXPECT_FALSE(shallow_copy_object_to_vld_volume(object));
         EXPECT_EQ(support::dump(object), before);
-    };
-    auto const one = channel<SmallTiles>("x", "c", 1);
-    auto const other = support::sphere<WideTiles>({.channelName = "d"});
-    auto proxy = [](auto value) { return ObjectPtr(Nexil::makePtr<decltype(value)>(std::move(value))); };
-    std::map<char const*, ObjectPtr> const misfits{
-        {"a topology proxy of nothing", proxy(VldProxyComponentTopology(nullptr))},
-        {"a topology proxy of a channel", proxy(VldProxyComponentTopology(one))},
-        {"a container proxy of nothing", proxy(VldProxyComponentContainer(nullptr, "voxel_component"))},
-        {"a container of the other configuration",
-         proxy(VldProxyComponentContainer(other.container, "voxel_component"))},
-        {"a channel of the other configuration", proxy(VldProxyComponentChannel(other.channel, "voxel_tile_tree"))},
-        {"a channel proxy of nothing", proxy(VldProxyComponentChannel(nullptr, "voxel_tile_tree"))},
-        {"a channel whose target is not there", proxy(VldProxyComponentChannel(one, "nothing"))},
-        {"two components of one name",
-         proxy(VldProxyComponentChannel(channel<SmallTiles>("voxel_component", "c", 1), "voxel_tile_tree"))},
-    };
-    for (auto const& [name, misfit] : misfits) {
-        SCOPED_TRACE(name);
-        auto object = move_vld_volume_to_object(*support::sphereVolume<SmallTiles>());
-        setProperty(*object, "misfit", misfit);
-        expectRefused(*object);
     }
-    for (auto const& [from, holder] :
-         {std::pair(sVoxelComp, sVoxelTileTree), std::pair(sVoxelTileTree, sVoxelSignedDistance)}) {
-        SCOPED_TRACE(from + std::string(" under another name, which another part targets"));
-        auto object = move_vld_volume_to_object(*support::sphereVolume<SmallTiles>());
-        object->setPropertyAny("renamed", object->extractProperty(from));
-        Nexil::MutablePtr<Object> part(support::part(*object, holder));
-        ASSERT_TRUE(part->setPropertyAny(sTarget, Nexil::String("renamed")));
-        setProperty(*object, holder, std::move(part));
-        expectRefused(*object);
-    }
-    auto without = [&](auto const& populate) {
-        SCOPED_TRACE("without a topology proxy");
-        expectRefused(*support::filled(populate));
-    };
-    without([](Object& o) { populateCubeMesh(1, o); });
-    without([](Object& o) { // a mesh that is also an empty volume
-        populateMesh(o);
-        populateVolume(o);
-    });
-    without([](Object& o) {
-        populateVolume(o);
-        setElementCount(sVoxelComp, 3, o);
-    });
-    without([](Object& o) {
-        populateVolume(o);
-        setProperty(o, "values", Nexil::makePtr<FloatArray>(FloatArray{1}));
-    });
-    auto withArray = [&](char const* name, char const* key, Nexil::Any const& array) {
-        without([&](Object& o) {
-            populateLevelSet(o);
-            Nexil::MutablePtr<Object> part(support::part(o, name));
-            part->setPropertyAny(key, Nexil::Any(array));
-            setProperty(o, name, std::move(part));
-        });
-    };
-    withArray(sVoxelSignedDistance, "data", Nexil::makePtr<FloatArray>(FloatArray{1}));
-    withArray(sVoxelTileTree, "indices", Nexil::makePtr<Nexil::Array<unsigned int>>(Nexil::Array<unsigned int>{1}));
 }
 
 TEST(VolumeConversion, WhatWasOnlyPopulatedGivesAnEmptyVolume)

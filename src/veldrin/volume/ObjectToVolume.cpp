@@ -11,6 +11,9 @@
 #include <vld/Container.h>
 #include <vld/PointTopology.h>
 
+#include <map>
+#include <utility>
+
 namespace Veldrin::Geometry {
 
 namespace {
@@ -21,18 +24,14 @@ namespace {
     using VLD::TileTree3D::PointTopology;
     using VLD::TileTree3D::VoxelTopology;
 
-    /// The proxies of one kind that an object holds, with the names they stand under and what they target.
+    /// The proxies of one kind that an object holds, with the names they stand under, by what they target.
     template <class Proxy>
-    struct Held {
-        Nexil::String name;
-        Nexil::String target;
-        Nexil::Ptr<Proxy> proxy;
-    };
+    using Held = std::multimap<Nexil::String, std::pair<Nexil::String, Nexil::Ptr<Proxy>>>;
 
     struct Proxies {
-        Nexil::Array<Held<VldProxyComponentTopology>> topologies;
-        Nexil::Array<Held<VldProxyComponentContainer>> containers;
-        Nexil::Array<Held<VldProxyComponentChannel>> channels;
+        Held<VldProxyComponentTopology> topologies;
+        Held<VldProxyComponentContainer> containers;
+        Held<VldProxyComponentChannel> channels;
 
         explicit Proxies(Object const& object)
         {
@@ -51,13 +50,13 @@ namespace {
 
     private:
         template <class Proxy>
-        static bool keep(Nexil::String const& name, ObjectPtr const& part, Nexil::Array<Held<Proxy>>& kept)
+        static bool keep(Nexil::String const& name, ObjectPtr const& part, Held<Proxy>& kept)
         {
             auto proxy = Nexil::dynamicPtrCast<Proxy>(part);
             if (!proxy)
                 return false;
-            Nexil::String const target = getGeoPropTargetName(*proxy);
-            kept.push_back({name, target, std::move(proxy)});
+            Nexil::String target = getGeoPropTargetName(*proxy);
+            kept.emplace(std::move(target), std::pair(name, std::move(proxy)));
             return true;
         }
     };
@@ -71,14 +70,15 @@ namespace {
         bool run()
         {
             for (auto const& held : proxies_.topologies) {
-                auto const component = held.proxy->getVldComponent();
+                Nexil::String const& name = held.second.first;
+                auto const component = held.second.second->getVldComponent();
                 Internal::forEachConfiguration([&]<class Traits>() {
                     if (Nexil::dynamicPtrCast<VoxelTopology<Traits>>(component)) {
                         add(component);
-                        addContainers<Traits>(held.name, component->name());
+                        addContainers<Traits>(name, component->name());
                     } else if (Nexil::dynamicPtrCast<PointTopology<Traits>>(component)) {
                         add(component);
-                        addChannels<Traits>(held.name, component->name());
+                        addChannels<Traits>(name, component->name());
                     }
                 });
             }
@@ -90,25 +90,26 @@ namespace {
         template <class Traits>
         void addContainers(Nexil::String const& topologyName, Nexil::String const& ownName)
         {
-            for (auto const& held : proxies_.containers)
-                if (held.target == topologyName) {
-                    auto const container = Nexil::dynamicPtrCast<Container<Traits>>(held.proxy->getVldComponent());
-                    isSound_ = isSound_ && container && topologyName == ownName;
-                    if (!isSound_)
-                        return;
-                    add(container);
-                    addChannels<Traits>(held.name, container->name());
-                }
+            auto const [first, last] = proxies_.containers.equal_range(topologyName);
+            for (auto place = first; place != last; ++place) {
+                auto const& [name, proxy] = place->second;
+                auto const container = Nexil::dynamicPtrCast<Container<Traits>>(proxy->getVldComponent());
+                isSound_ = isSound_ && container && topologyName == ownName;
+                if (!isSound_)
+                    return;
+                add(container);
+                addChannels<Traits>(name, container->name());
+            }
         }
 
         template <class Traits>
         void addChannels(Nexil::String const& targetName, Nexil::String const& ownName)
         {
-            for (auto const& held : proxies_.channels)
-                if (held.target == targetName) {
-                    isSound_ = isSound_ && targetName == ownName;
-                    add(Nexil::dynamicPtrCast<Channel<Traits>>(held.proxy->getVldComponent()));
-                }
+            auto const [first, last] = proxies_.channels.equal_range(targetName);
+            for (auto place = first; place != last; ++place) {
+                isSound_ = isSound_ && targetName == ownName;
+                add(Nexil::dynamicPtrCast<Channel<Traits>>(place->second.second->getVldComponent()));
+            }
         }
 
         void add(Nexil::Ptr<VLD::Component> component)

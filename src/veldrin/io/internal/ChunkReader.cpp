@@ -14,11 +14,10 @@ namespace {
 
     constexpr std::size_t kPagesGrainBytes = std::size_t(1) << 20;
 
-    /// All pages of a fresh block, taken by all threads at once. Huge pages are few: they come while they are filled.
+    /// All pages of a fresh block, taken by all threads at once. Huge ones too, few as they are: the threads of the
+    /// decompressor write close to each other, and where two come upon one such page at once, both clear it.
     void takePages(std::byte* bytes, std::uint64_t byteCount)
     {
-        if (byteCount >= Nexil::Internal::kHugePagesFromBytes)
-            return;
         Nexil::parallel::forRange(
             static_cast<std::size_t>(byteCount), kPagesGrainBytes,
             [&](std::size_t begin, std::size_t end) { Nexil::Internal::takePages(bytes + begin, end - begin); });
