@@ -24,14 +24,21 @@ namespace {
     using VLD::TileTree3D::PointTopology;
     using VLD::TileTree3D::VoxelTopology;
 
-    /// The proxies of one kind that an object holds, with the names they stand under, by what they target.
+    /// A proxy and the name it stands under.
     template <class Proxy>
-    using Held = std::multimap<Nexil::String, std::pair<Nexil::String, Nexil::Ptr<Proxy>>>;
+    struct Held {
+        Nexil::String name;
+        Nexil::Ptr<Proxy> proxy;
+    };
+
+    /// The proxies of one kind that an object holds, by what they target, in the order in which the object has them.
+    template <class Proxy>
+    using ByTarget = std::multimap<Nexil::String, Held<Proxy>>;
 
     struct Proxies {
-        Held<VldProxyComponentTopology> topologies;
-        Held<VldProxyComponentContainer> containers;
-        Held<VldProxyComponentChannel> channels;
+        Nexil::Array<Held<VldProxyComponentTopology>> topologies;
+        ByTarget<VldProxyComponentContainer> containers;
+        ByTarget<VldProxyComponentChannel> channels;
 
         explicit Proxies(Object const& object)
         {
@@ -49,14 +56,24 @@ namespace {
         [[nodiscard]] std::uint64_t count() const { return topologies.size() + containers.size() + channels.size(); }
 
     private:
+        static bool keep(Nexil::String const& name, ObjectPtr const& part,
+                         Nexil::Array<Held<VldProxyComponentTopology>>& kept)
+        {
+            auto proxy = Nexil::dynamicPtrCast<VldProxyComponentTopology>(part);
+            if (!proxy)
+                return false;
+            kept.push_back({name, std::move(proxy)});
+            return true;
+        }
+
         template <class Proxy>
-        static bool keep(Nexil::String const& name, ObjectPtr const& part, Held<Proxy>& kept)
+        static bool keep(Nexil::String const& name, ObjectPtr const& part, ByTarget<Proxy>& kept)
         {
             auto proxy = Nexil::dynamicPtrCast<Proxy>(part);
             if (!proxy)
                 return false;
             Nexil::String target = getGeoPropTargetName(*proxy);
-            kept.emplace(std::move(target), std::pair(name, std::move(proxy)));
+            kept.emplace(std::move(target), Held<Proxy>{name, std::move(proxy)});
             return true;
         }
     };
@@ -70,15 +87,14 @@ namespace {
         bool run()
         {
             for (auto const& held : proxies_.topologies) {
-                Nexil::String const& name = held.second.first;
-                auto const component = held.second.second->getVldComponent();
+                auto const component = held.proxy->getVldComponent();
                 Internal::forEachConfiguration([&]<class Traits>() {
                     if (Nexil::dynamicPtrCast<VoxelTopology<Traits>>(component)) {
                         add(component);
-                        addContainers<Traits>(name, component->name());
+                        addContainers<Traits>(held.name, component->name());
                     } else if (Nexil::dynamicPtrCast<PointTopology<Traits>>(component)) {
                         add(component);
-                        addChannels<Traits>(name, component->name());
+                        addChannels<Traits>(held.name, component->name());
                     }
                 });
             }
@@ -108,7 +124,7 @@ namespace {
             auto const [first, last] = proxies_.channels.equal_range(targetName);
             for (auto place = first; place != last; ++place) {
                 isSound_ = isSound_ && targetName == ownName;
-                add(Nexil::dynamicPtrCast<Channel<Traits>>(place->second.second->getVldComponent()));
+                add(Nexil::dynamicPtrCast<Channel<Traits>>(place->second.proxy->getVldComponent()));
             }
         }
 
