@@ -172,11 +172,7 @@ class VolumesOfPoints(tool.ToolTest):
         for found, wanted in zip(box["min"] + box["max"], (-1, -1, -1, 6, 1, 1)):
             self.assertTrue(math.isclose(found, wanted, abs_tol=0.1001), box)
         self.assertEqual(self.json("volume", "bounds", "two.zon")["objects"], [{"min": [0, 0, 0], "max": [5, 0, 0]}])
-        # Where tiles lie and how large voxels are is no property of the geometry, but of the file.
-        self.write("far.obj", "v 64 0 0\nv 69 0 0\n")
-        self.zon("import", "far.obj", "far.zon")
-        self.zon("volume", "from-points", "far.zon", "far_balls.zon", "--radius", "1", "--voxel-size", "0.1")
-        self.assertIn("/leaf_origins/[0]: value: ", self.zon("diff", "balls.zon", "far_balls.zon", code=1).stdout)
+        # How large voxels are is no property of the geometry, but of the file.
         self.zon("volume", "from-points", "two.zon", "fine.zon", "--radius", "1", "--voxel-size", "0.1000001")
         self.assertIn("voxelSize: value: 0.1 | 0.1000001", self.zon("diff", "balls.zon", "fine.zon", "--tolerance=0",
                                                                     "--max=99999", code=1).stdout)

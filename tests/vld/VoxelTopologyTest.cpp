@@ -79,12 +79,10 @@ TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
              addInner(l, {kCoordinateLimit - kWidth, 0, 0});
          }},
         {"parents are not one per leaf tile", [&](TileLevels& l) { l.leafParents.resize(l.leafParents.size() - 1); }},
-        {"parents are not one per leaf tile", [&](TileLevels& l) { l.leafParents.push_back(0); }},
         {"no cell of its parent points at leaf tile 2",
          [&](TileLevels& l) { l.leafParents[2] = unsigned(l.innerOrigins.size()); }},
         {"no cell of its parent points at leaf tile 0", [&](TileLevels& l) { l.leafParents[0] = l.leafParents[8]; }},
         {"children are not one per cell", [&](TileLevels& l) { l.innerChildren.resize(l.innerChildren.size() - 1); }},
-        {"children are not one per cell", [&](TileLevels& l) { l.innerChildren.push_back(kNoTile); }},
         {lastCell,
          [&](TileLevels& l) { l.innerChildren[l.innerChildren.size() - 1] = unsigned(l.leafOrigins.size()); }},
         {lastCell, [&](TileLevels& l) { l.innerChildren[l.innerChildren.size() - 1] = 0; }},
@@ -110,6 +108,10 @@ TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
         EXPECT_EQ(reportOf(container), "topology t: " + damage.report + "\n");
     }
     auto const good = Nexil::makePtr<VoxelTopology<Traits>>("t", this->sound());
+    SharedTileLevels others = good->levels();
+    EXPECT_TRUE(VoxelTopology<Traits>::create("t", others, *good));
+    others.leafParents = Nexil::makePtr<Nexil::Array<unsigned int>>();
+    EXPECT_FALSE(VoxelTopology<Traits>::create("t", others, *good));
     EXPECT_TRUE(Container<Traits>("c", good, 0.5f).checkConsistency(true));
     std::uint64_t const arrays = good->leafCount() * 16ull + good->innerCount() * (12 + 4ull * Traits::kInnerCells);
     EXPECT_EQ(good->byteSize() - arrays, sizeof(*good) + sizeof(TileHash) + TileHash(good->innerOrigins()).byteSize());

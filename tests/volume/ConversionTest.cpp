@@ -57,7 +57,8 @@ std::map<char const*, Components> volumes()
     auto const wide = support::sphere<WideTiles>({.channelName = "d"});
     auto const points = support::points<WideTiles>();
     auto const sizes = channel<WideTiles>("sizes", "points", 3);
-    return {{"small tiles", {small.topology, small.container, small.channel}},
+    return {{"nothing", {}},
+            {"small tiles", {small.topology, small.container, small.channel}},
             {"both configurations",
              {wide.topology, wide.container, wide.channel, small.topology, small.container, small.channel}},
             {"a topology without a container", {wide.topology}},
@@ -150,11 +151,9 @@ TEST(VolumeConversion, CostsTheSameForAnyNumberOfVoxels)
     EXPECT_LT(allocations(4), 200u);
 }
 
-TEST(VolumeConversion, AnEmptyOrOutdatedVolumeIsClearedAndGivesAnEmptyObject)
+TEST(VolumeConversion, AnOutdatedVolumeIsClearedAndGivesAnEmptyObject)
 {
-    auto volume = VLD::createObject();
-    EXPECT_TRUE(Geometry::move_vld_volume_to_object(*volume)->empty());
-    volume = support::sphereVolume<SmallTiles>();
+    auto volume = support::sphereVolume<SmallTiles>();
     volume->addComponent(channel<SmallTiles>("short", "voxel_tile_tree", 1));
     EXPECT_TRUE(Geometry::move_vld_volume_to_object(*volume)->empty());
     EXPECT_TRUE(volume->empty());
