@@ -112,6 +112,9 @@ TYPED_TEST(Topology, ConsistencyCheckFindsEachKindOfDamage)
     EXPECT_TRUE(VoxelTopology<Traits>::create("t", others, *good));
     others.leafParents = Nexil::makePtr<Nexil::Array<unsigned int>>();
     EXPECT_FALSE(VoxelTopology<Traits>::create("t", others, *good));
+    auto const apart = buildFromVoxels<Traits>({.channelName = "c"}, {{999, 0, 0}}, Nexil::Array<bool>{true}, false);
+    auto const same = VoxelTopology<Traits>::create("t", apart.topology->levels(), *good);
+    EXPECT_EQ(same->findElement({999, 0, 0}), apart.topology->findElement({999, 0, 0}));
     EXPECT_TRUE(Container<Traits>("c", good, 0.5f).checkConsistency(true));
     std::uint64_t const arrays = good->leafCount() * 16ull + good->innerCount() * (12 + 4ull * Traits::kInnerCells);
     EXPECT_EQ(good->byteSize() - arrays, sizeof(*good) + sizeof(TileHash) + TileHash(good->innerOrigins()).byteSize());
