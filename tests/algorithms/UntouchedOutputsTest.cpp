@@ -137,9 +137,9 @@ TEST(UntouchedOutputs, OfACancelledJobThatIsAskedForOnceAChunk)
         {370, 1, 3, true},     // more points than one thread adds the normals of: each its own part,
         {370, 7919, 6, false}, // or, where neighbours have far numbers, its own stripe
     };
-    for (auto const& [side, stride, threadCount, haveRoom] : rows) {
-        unsigned int const count = side * side;
-        auto const mesh = support::meshOn(count, support::torusFaces(side, stride));
+    for (auto const& row : rows) {
+        unsigned int const count = row.side * row.side;
+        auto const mesh = support::meshOn(count, support::torusFaces(row.side, row.stride));
         std::vector<unsigned int> offsets(count + 1);
         for (unsigned int i = 0; i <= count; ++i)
             offsets[i] = 2 * i;
@@ -147,14 +147,14 @@ TEST(UntouchedOutputs, OfACancelledJobThatIsAskedForOnceAChunk)
         Geometry::populateStrand(support::array(std::vector<float3>(2 * count, float3{1, 2, 3})),
                                  support::array(offsets), *strands);
         tbb::global_control const limit(tbb::global_control::max_allowed_parallelism,
-                                        static_cast<std::size_t>(threadCount));
+                                        static_cast<std::size_t>(row.threadCount));
         for (auto const* algorithms : {&kOfPositions, &kOfTopology, &kConversions, &kOfStrandPoints, &kOfStrands})
-            for (auto const& [name, run] : *algorithms) {
-                SCOPED_TRACE(testing::Message() << name << " on " << threadCount << " threads");
+            for (auto const& algorithm : *algorithms) {
+                SCOPED_TRACE(testing::Message() << algorithm.first << " on " << row.threadCount << " threads");
                 bool const isOfStrands = algorithms == &kOfStrandPoints || algorithms == &kOfStrands;
-                tbb::task_arena(threadCount).execute([&] {
-                    expectCancelledAtAnyQuestion(run, isOfStrands ? *strands : *mesh, threadCount,
-                                                 haveRoom ? 4 * count : 0, static_cast<int>(count));
+                tbb::task_arena(row.threadCount).execute([&] {
+                    expectCancelledAtAnyQuestion(algorithm.second, isOfStrands ? *strands : *mesh, row.threadCount,
+                                                 row.haveRoom ? 4 * count : 0, static_cast<int>(count));
                 });
             }
     }

@@ -16,45 +16,11 @@ using Nexil::Ptr;
 using Nexil::String;
 using support::Tracked;
 
-struct Base {
-    virtual ~Base() = default;
-};
-struct Derived : Base {};
-
 /// Too large to be held inline.
 struct Large {
     Tracked tracked;
     char filling[40] = {};
 };
-
-template <class... Types>
-int typesFoundIn(Any const& any)
-{
-    return (0 + ... + (any.get<Types>() != nullptr));
-}
-
-TEST(Any, OnlyTheExactTypeIsFound)
-{
-    struct {
-        Any value;
-        char const* text;
-    } const rows[] = {
-        {3u, "unsigned int"},
-        {3ll, "long long"},
-        {String("3"), "Nexil::String"},
-        {Ptr<Base>(Nexil::makePtr<Derived>()), nullptr},
-        {Nexil::makePtr<Derived>(), nullptr},
-    };
-    for (auto const& [value, text] : rows) {
-        int const foundCount =
-            typesFoundIn<int, unsigned int, long, long long, String, Ptr<Base>, Ptr<Derived>, Any>(value);
-        EXPECT_EQ(foundCount, 1) << Nexil::anyToTypeString(value);
-        EXPECT_TRUE(!text || Nexil::anyToTypeString(value) == text) << Nexil::anyToTypeString(value);
-    }
-    EXPECT_EQ((typesFoundIn<int, String, Ptr<Base>>(Any())), 0);
-    EXPECT_FALSE(Any().type());
-    EXPECT_EQ(Nexil::anyToTypeString(Any()), "");
-}
 
 template <class T>
 std::uint64_t allocationsOfMakingCopyingAndMoving(T value)
@@ -131,25 +97,6 @@ TEST(Any, CanBecomeAPartOfItsOwnValue)
     for (int level = 0; level < 2; ++level)
         moved = std::move((*moved.get<List>())[0]);
     EXPECT_EQ(*moved.get<String>(), text);
-}
-
-TEST(Any, ArraysOfEveryElementAnswerForTheirSize)
-{
-    struct {
-        Any value;
-        bool isArray;
-        std::uint64_t size;
-    } const rows[] = {
-        {Nexil::makePtr<Array<float>>(std::initializer_list<float>{1, 2, 3}), true, 3},
-        {Ptr<Array<String>>(), true, 0},
-        {Array<float>{1, 2}, false, 0},
-        {Nexil::makePtr<int>(3), false, 0},
-        {Any(), false, 0},
-    };
-    for (auto const& row : rows) {
-        EXPECT_EQ(Nexil::AnyArray::is_any_array(row.value), row.isArray) << Nexil::anyToTypeString(row.value);
-        EXPECT_EQ(Nexil::AnyArray::get_any_array_size(row.value), row.size) << Nexil::anyToTypeString(row.value);
-    }
 }
 
 } // namespace
