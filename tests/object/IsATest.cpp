@@ -71,6 +71,7 @@ TEST(IsA, TableOfKinds)
         {"any array", {{"a", arrayOf<float>({1})}}, {{"a", anyArray}}, true},
         {"any array: null", {{"a", Ptr<Array<bool>>()}}, {{"a", anyArray}}, true},
         {"any array: filled prototype", {{"a", arrayOf<int>({})}}, {{"a", arrayOf<Any>({1})}}, true},
+        {"any array: number", {{"a", 1}}, {{"a", anyArray}}, false},
         {"array of any for another array", {{"a", anyArray}}, {{"a", arrayOf<int>({})}}, false},
         {"nested", {{"a", inner}}, {{"a", objectOf({{"count", 0u}})}}, true},
         {"nested: less", {{"a", inner}}, {{"a", objectOf({{"count", 0u}, {"other", 1}})}}, false},
