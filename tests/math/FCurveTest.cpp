@@ -229,7 +229,8 @@ TEST(FCurve, BrokenTreesAreRefusedAndChangeNothing)
     SerializationData const nothing;
     CompositeSerializationData const empty;
     CompositeSerializationData timeAndValue;
-    timeAndValue["time"] = timeAndValue["value"] = 0.0;
+    timeAndValue["time"] = 0.0;
+    timeAndValue["value"] = 0.0;
     std::vector<SerializationData> broken{nothing, empty, changed(tree, "keys", nothing)};
     for (char const* name : {"pre_extrapolation", "post_extrapolation"})
         for (auto const& wrong : {nothing, SerializationData(5u), SerializationData(0.5)})
