@@ -1,4 +1,4 @@
-/// Meshes, strands and volumes whose counts, offsets, indices and targets are any numbers, without a validator being asked,
+/// Meshes and strands whose counts, offsets, indices and targets are any numbers, without a validator being asked,
 /// to everything that reads geometry. The geometry must come out of it as it went in.
 
 #include "InputBytes.h"
@@ -106,40 +106,6 @@ void run(support::Takes takes, support::Sample const& sample)
             (void)operation.run(sample);
 }
 
-template <class Traits>
-void runOnTiles(support::Sample& sample, InputBytes& bytes)
-{
-    using namespace VLD::TileTree3D;
-    auto const coordinate = [&] {
-        Coordinate at;
-        for (auto* const along : {&at.x, &at.y, &at.z}) {
-            auto const steps = bytes.index();
-            *along = static_cast<int>(steps * (bytes.byte() & 1 ? 1u : static_cast<unsigned int>(Traits::kInnerWidth)));
-        }
-        return at;
-    };
-    auto const index = [&] { return bytes.index(); };
-    TileLevels levels;
-    levels.leafOrigins = *bytes.array(coordinate);
-    levels.leafParents = *bytes.array(index);
-    levels.innerOrigins = *bytes.array(coordinate);
-    levels.innerChildren = *bytes.array(index);
-    if (bytes.byte() & 1)
-        levels.innerChildren.resize(levels.innerOrigins.size() * Traits::kInnerCells);
-    auto const topology = VoxelTopology<Traits>::create(Geometry::sVoxelComp, std::move(levels));
-    if (!topology)
-        return;
-    auto volume = VLD::createObject();
-    volume->addComponent(topology);
-    volume->addComponent(Nexil::makePtr<Container<Traits>>(Geometry::sVoxelTileTree, topology, bytes.number()));
-    auto values = bytes.array([&] { return bytes.number(); });
-    volume->addComponent(
-        Nexil::makePtr<Channel<Traits>>(Geometry::sVoxelFogDensity, Geometry::sVoxelTileTree, std::move(values), 0.0f));
-    sample.smallVolume = sample.wideVolume = Geometry::move_vld_volume_to_object(*volume);
-    if (sample.smallVolume)
-        run(support::Takes::Volumes, sample);
-}
-
 /// What takes numbers besides the geometry.
 void runOnNumbersOfTheInput(Object const& geometry, InputBytes& bytes)
 {
@@ -170,11 +136,6 @@ extern "C" int LLVMFuzzerTestOneInput(std::uint8_t const* data, std::size_t size
     static support::Sample const whole;
     support::Sample sample = whole;
     InputBytes bytes(data, size);
-    if (bytes.byte() == 'v') {
-        runOnTiles<VLD::TileTree3D::SmallTiles>(sample, bytes);
-        runOnTiles<VLD::TileTree3D::WideTiles>(sample, bytes);
-        return 0;
-    }
     Nexil::Ptr<Object> const geometry = geometryFrom(bytes);
     auto const before = support::dump(*geometry, 1000);
     sample.mesh = sample.strands = geometry;

@@ -21,7 +21,7 @@ def positions(points):
 
 def geometry(points, corners, face_offsets, strand_offsets=(0,), counts=(KEEP,) * 4, indices=(), values=(),
              masks=((),) * 4, tail=b"a + f(b)"):
-    head = b"g" + positions(points) + array(corners) + array(face_offsets) + array(strand_offsets) + bytes(counts)
+    head = positions(points) + array(corners) + array(face_offsets) + array(strand_offsets) + bytes(counts)
     properties = bytes([KEEP, KEEP]) * 4
     corner = array(indices) + bytes([KEEP]) + bytes([len(values)]) + bytes(values) + bytes([KEEP, KEEP])
     tags = b"".join(array(mask) + bytes([KEEP, KEEP]) for mask in masks)
@@ -32,16 +32,6 @@ CUBE = [(x, y, z) for y in (-1, 1) for z in (-1, 1) for x in (-1, 1)]
 QUADS = [0, 1, 3, 2, 4, 6, 7, 5, 2, 3, 7, 6, 0, 4, 5, 1, 4, 0, 2, 6, 1, 5, 7, 3]
 GRID = [(x, 0, y) for y in range(6) for x in range(6)]
 CELLS = [i for y in range(5) for x in range(5) for i in (6 * y + x, 6 * y + x + 1, 6 * y + x + 7, 6 * y + x + 6)]
-
-
-def tiles(channel_is_whole):
-    """A leaf tile in an inner one, twice: the driver reads small tiles first, then wide ones."""
-    def one(leaf_voxels, cells):
-        origin = bytes([1]) + bytes([0, 0] * 3)
-        children = array([0] + [224] * (cells - 1))
-        values = array([100 + i % 50 for i in range(leaf_voxels + cells if channel_is_whole else 3)])
-        return origin + array([0]) + origin + children + bytes([KEEP, 124]) + values
-    return b"v" + one(64, 8) + one(125, 125)
 
 
 SEEDS = {
@@ -55,8 +45,6 @@ SEEDS = {
     "large_counts": geometry(CUBE, QUADS, range(0, 25, 4), counts=(255, 250, 255, 245, 255, 240, 255, 236)),
     "fan": geometry([(i % 16, i // 16, 1) for i in range(100)], [c for i in range(1, 80) for c in (0, i, i + 1)],
                     range(0, 240, 3)),
-    "tiles": tiles(True),
-    "tiles_short_channel": tiles(False),
 }
 
 

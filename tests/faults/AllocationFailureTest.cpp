@@ -27,18 +27,17 @@ TEST_P(AllocationFailure, AtAnyMomentLeavesEverythingAsItWas)
     std::ofstream(sample.path, std::ios::binary) << sample.stream;
     auto const before = sample.description();
     // Also makes what is made once.
-    auto const expected = operation.run(sample);
-    ASSERT_NE(expected, "") << operation.name;
+    ASSERT_TRUE(operation.run(sample)) << operation.name;
 
     std::uint64_t number = 0;
     for (bool isOver = false; !isOver;) {
         ++number;
-        std::string result;
+        bool isDone = false;
         std::string fault;
         {
             support::FailingAllocation const failing(number);
             try {
-                result = operation.run(sample);
+                isDone = operation.run(sample);
             } catch (std::bad_alloc const&) {
                 // as it should
             } catch (std::exception const& other) {
@@ -46,7 +45,7 @@ TEST_P(AllocationFailure, AtAnyMomentLeavesEverythingAsItWas)
             }
             isOver = !failing.hasFailed();
         }
-        EXPECT_TRUE(!isOver || result == expected) << operation.name << " gives another result";
+        EXPECT_TRUE(isDone || !isOver) << operation.name;
         EXPECT_EQ(fault, "") << operation.name << ", allocation " << number;
         ASSERT_FALSE(::testing::Test::HasFailure());
     }

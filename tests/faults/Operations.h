@@ -35,10 +35,10 @@ enum class Takes { Sample, Volumes, SmallCounts, Anything };
 
 struct Operation {
     char const* name;
-    /// Runs it and tells the result: the same at each run. Whatever it allocates it gives back. "" where the function says
-    /// that it failed. Outputs that are left neither as before nor empty, when it throws, and answers that contradict each
-    /// other are told by std::logic_error.
-    std::function<std::string(Sample const&)> run;
+    /// Runs it and tells whether the function says that it succeeded. Whatever it allocates it gives back. Outputs that are
+    /// left neither as before nor empty, when it throws, and answers that contradict each other are told by
+    /// std::logic_error.
+    std::function<bool(Sample const&)> run;
     Takes takes = Takes::Sample;
 };
 

@@ -57,6 +57,12 @@ TEST(HostileStream, NoBeginningAndNoFlippedByteIsReadAsSomethingElse)
                 EXPECT_LE(result.errors.size(), result.isRead ? 0u : 1u) << flip;
                 EXPECT_EQ(support::describeObjects(result.objects), result.isRead ? original : "]}\n") << flip;
             }
+            // Without checksums, as version 5, damage goes as deep as the compressor.
+            std::string unchecked = stream;
+            unchecked[stream.find("file_version") + 14] = 5;
+            unchecked[at] = static_cast<char>(unchecked[at] ^ 0x15);
+            auto const result = support::read(unchecked);
+            EXPECT_LE(result.errors.size() + result.objects.size() * !result.isRead, result.isRead ? 0u : 1u);
         }
     }
 }

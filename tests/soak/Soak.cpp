@@ -1,5 +1,5 @@
-/// Round trips over random objects: each list of them is written at a random level, read, and has to be the same. Prints
-/// what went through; ends with 1 at the first difference, naming the seed.
+/// Round trips over random objects: each list of them is written at a random level, read, and has to be the same to the
+/// validators too. Prints what went through; ends with 1 at the first difference, naming the seed.
 ///
 ///     soak [SECONDS] [SEED]
 
@@ -9,6 +9,7 @@
 #include <support/StreamDescription.h>
 #include <support/Streams.h>
 
+#include <veldrin/validation/GeoValidator.h>
 #include <veldrin/volume/VolumeConversion.h>
 
 #include <chrono>
@@ -70,6 +71,8 @@ ObjectPtr randomObject(Random& random, int depth)
         return Geometry::move_vld_volume_to_object(
             *support::sphereVolume<VLD::TileTree3D::SmallTiles>(static_cast<int>(1 + random() % 8)));
     auto made = createObject();
+    if (random() % 4 == 0)
+        Geometry::populatePlaneMesh(1, static_cast<unsigned int>(random() % 30), *made);
     for (auto count = random() % 12; count > 0; --count) {
         Nexil::Any value = everyType()[random() % everyType().size()];
         switch (random() % 10) {
@@ -93,6 +96,11 @@ ObjectPtr randomObject(Random& random, int depth)
     return made;
 }
 
+std::string verdictOn(ObjectPtr const& object)
+{
+    return object ? Geometry::GeoValidator().validate(*object).message.c_str() : "";
+}
+
 /// What the round trips so far took.
 std::uint64_t objectCount = 0, byteCount = 0;
 
@@ -109,8 +117,12 @@ std::string roundTrip(std::uint64_t seed)
         return "not " + (bytes.empty() ? "written" : "read: " + again.errors.at(0));
     objectCount += objects.size();
     byteCount += bytes.size();
-    return support::describeObjects(again.objects) == support::describeObjects(objects) ? ""
-                                                                                        : "not the same after reading";
+    if (support::describeObjects(again.objects) != support::describeObjects(objects))
+        return "not the same after reading";
+    for (std::uint64_t i = 0; i < objects.size(); ++i)
+        if (verdictOn(again.objects[i]) != verdictOn(objects[i]))
+            return "judged otherwise after reading: " + verdictOn(again.objects[i]);
+    return "";
 }
 
 } // namespace
