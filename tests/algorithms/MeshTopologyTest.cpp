@@ -166,6 +166,52 @@ TEST(MeshTopology, IsWhatCountingByDefinitionGivesOnEveryThreadCount)
     expectCounted(pointCount, faces);
 }
 
+/// Two copies side by side, the second with its first `shared` points taken from the first.
+Polygons twice(unsigned int pointCount, unsigned int shared, Polygons faces)
+{
+    std::size_t const count = faces.size();
+    for (std::size_t f = 0; f < count; ++f) {
+        auto face = faces[f];
+        for (unsigned int& corner : face)
+            if (corner >= shared)
+                corner += pointCount - shared;
+        faces.push_back(face);
+    }
+    return faces;
+}
+
+TEST(MeshTopology, KnownSurfacesHaveTheirKnownNumbers)
+{
+    Polygons const cube{{0, 1, 3, 2}, {4, 6, 7, 5}, {0, 4, 5, 1}, {2, 3, 7, 6}, {0, 2, 6, 4}, {1, 5, 7, 3}};
+    // Ten triangles on six points, every two of which share an edge: half an icosahedron.
+    Polygons const projectivePlane{{0, 1, 2}, {0, 2, 3}, {0, 3, 4}, {0, 4, 5}, {0, 5, 1},
+                                   {1, 2, 4}, {2, 3, 5}, {3, 4, 1}, {4, 5, 2}, {5, 1, 3}};
+    struct Case {
+        char const* name;
+        unsigned int pointCount;
+        Polygons faces;
+        int euler;
+        int3 betti;
+    };
+    for (auto const& [name, pointCount, faces, euler, betti] : std::vector<Case>{
+             {"two triangles apart", 6, {{0, 1, 2}, {3, 4, 5}}, 2, {2, 0, 0}},
+             {"cube", 8, cube, 2, {1, 0, 1}},
+             {"cube and a point", 9, cube, 3, {2, 0, 1}},
+             {"cube without a face", 8, {cube.begin(), cube.end() - 1}, 1, {1, 0, 0}},
+             {"two cubes", 16, twice(8, 0, cube), 4, {2, 0, 2}},
+             {"two cubes with a common corner", 15, twice(8, 1, cube), 3, {1, -1, 1}},
+             {"torus", 25, support::torusFaces(5), 0, {1, 2, 1}},
+             {"Moebius strip", 6, {{0, 1, 3, 2}, {2, 3, 5, 4}, {4, 5, 0, 1}}, 0, {1, 1, 0}},
+             {"projective plane", 6, projectivePlane, 1, {1, 1, 1}},
+         }) {
+        auto const mesh = support::meshOn(pointCount, faces);
+        EXPECT_EQ(eulerCharacteristic(*mesh), euler) << name;
+        EXPECT_EQ(bettiNumbers(*mesh), betti) << name;
+    }
+    auto const plane = support::filled([](auto& object) { Veldrin::Geometry::populatePlaneMesh(1, 7, object); });
+    EXPECT_EQ(bettiNumbers(*plane), (int3{1, 0, 0}));
+}
+
 TEST(MeshTopology, ComponentsAreTheSameWhereThreadsMeetAtOneRoot)
 {
     // With points in falling order each face links the root that the one before it made: along a strip, whose points are

@@ -12,8 +12,7 @@ The description is JSON on several lines, ASCII, no blanks but inside strings:
 With no slots the second line is "]}". Every line ends with a line feed.
 
     OBJECT    {"id":N,"properties":[[NAME,CODE,VALUE],...]}; an empty property is [NAME,null,null];
-              kept descriptions have "proxy":true, in front of "properties" where the library makes a view
-              of a volume's component; to this reader it is an object as any other
+              a sound component of a volume has "proxy":true, in front of "properties"
     ARRAY     {"id":N,"count":C,"bytes":HEX} for trivial types up to 64 bytes, longer ones have
               "xxh3":HEX instead, the XXH3 64-bit hash of the bytes (16 digits, most significant first);
               {"id":N,"count":C,"elements":[VALUE,...]} for the others; elements of code 369 are
@@ -67,7 +66,8 @@ def describe(stream):
             return f'{{"ref":{ids[held]}}}'
         ids[held] = number = len(ids)
         if code == OBJECT:
-            return f'{{"id":{number},"properties":' + listed(
+            proxy = '"proxy":true,' if held.is_proxy else ""
+            return f'{{"id":{number},{proxy}"properties":' + listed(
                 f"[{text(name)}," + ("null,null]" if kind is None else f"{kind},{value(kind, part)}]")
                 for name, (kind, part) in held.properties.items()) + "}"
         if held.elements is not None:

@@ -7,6 +7,7 @@ import blosc
 import xxhash
 
 from items import Float32, Float64, Map, Str, ZonError, check, decode, is_list, is_uint
+from volumes import mark_components
 
 OBJECT, CURVE, GEO_LOCATION, STRINGS, ADDRESSES = 362, 365, 367, 131, 123
 POINTERS = {*range(120, 360), 361, OBJECT, 363, 364, 366, 368, 369}
@@ -77,6 +78,7 @@ def curve(tree):
 class Object:
     def __init__(self):
         self.properties = {}    # name: (code, value), (None, None) for an empty value
+        self.is_proxy = False   # a sound component of the volume that its holder is
 
 
 @dataclasses.dataclass(eq=False)
@@ -132,6 +134,8 @@ class Values:
             value = self.frame(value, "Unknown property: " + name.decode("latin-1"))
             if name:
                 made.properties[name] = value
+        if self.version > 4:
+            mark_components(made)
         return made
 
     def array(self, code, item):
