@@ -31,12 +31,15 @@ public:
         return b < 224 ? b : b < 240 ? 0xFFFFFFFFu - (b - 224) : 1u << (b - 224);
     }
 
-    /// Mostly `expected`, or a number near it.
+    /// Mostly near `expected`.
     unsigned int count(std::uint64_t expected)
     {
         unsigned int const b = byte();
-        auto const right = static_cast<unsigned int>(expected);
-        return b < 128 ? right : b < 160 ? right + (b - 144) : b < 224 ? b - 160 : index();
+        if (b < 128)
+            return static_cast<unsigned int>(expected);
+        if (b < 160)
+            return static_cast<unsigned int>(expected) + (b - 144);
+        return b < 224 ? b - 160 : b < 232 ? 0xFFFFFFFFu - (b - 224) : 1u << (b - 224);
     }
 
     float number()

@@ -52,8 +52,10 @@ void run(std::string_view text)
     Geometry::TagResolver again;
     check(again.parses(Nexil::String(std::string_view(dump))).ok);
     Nexil::String component;
+    Nexil::String componentAgain;
     auto const mask = resolver.resolve(*cube, component);
-    check(mask && *mask == *again.resolve(*cube, component));
+    auto const maskAgain = again.resolve(*cube, componentAgain);
+    check(mask && maskAgain && *mask == *maskAgain && component == componentAgain);
     for (auto const& tag : kSample.tags)
         check(flagsOf(support::arrayIn<bool>(*cube, tag.name.c_str())) == tag.flags);
 }

@@ -1,9 +1,11 @@
 """How the tool treats files, terminals and wrong usage."""
 import os
+import random
 import resource
 import signal
 import stat
 import subprocess
+import time
 
 import tool
 
@@ -75,7 +77,48 @@ class Files(tool.ToolTest):
         self.assertEqual(self.names(), before)
         self.assertEqual((self.folder / "old.zon").read_text() + (self.folder / "old.obj").read_text(), "oldold")
 
-    def test_links_and_modes_stay_and_what_a_killed_program_left_goes(self):
+    def test_a_killed_import_leaves_the_old_file_or_the_new_one(self):
+        for name, subdivisions in (("old", 100), ("new", 120)):
+            self.zon("make", "plane", f"{name}.zon", "--subdivisions", str(subdivisions))
+            self.zon("export", f"{name}.zon", f"{name}.obj")
+        wholes = []
+        start = time.monotonic()
+        for name in ("old", "new"):
+            self.zon("import", f"{name}.obj", "target.zon", "--level", "0")
+            wholes.append((self.folder / "target.zon").read_bytes())
+        duration = (time.monotonic() - start) / 2
+        moments = random.Random(6)
+        killed = 0
+        for kill in range(200):
+            program = subprocess.Popen([tool.ZON, "import", ["old", "new"][kill % 2] + ".obj", "target.zon",
+                                        "--level", "0"], cwd=self.folder,
+                                       stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
+            # The end, where the file is put in its place, is the place to hit.
+            time.sleep(duration * (moments.random() if kill % 4 else moments.uniform(0.8, 1.05)))
+            # Now and then one comes to its end, so that what the next leaves is told from what was there.
+            if kill % 20 > 1:
+                program.kill()
+            killed += program.wait() == -signal.SIGKILL
+            self.assertIn((self.folder / "target.zon").read_bytes(), wholes)
+            self.assertLessEqual(sum(name.endswith(".tmp") for name in self.names()), 1)
+        self.assertGreater(killed, 0)
+        # What the last one may have left goes with the next.
+        self.write(".zon-1-0.tmp", "left by a killed program")
+        self.zon("import", "new.obj", "target.zon")
+        self.assertEqual(self.names(), ["new.obj", "new.zon", "old.obj", "old.zon", "target.zon"])
+
+    def test_a_full_disk_leaves_the_old_file(self):
+        disk = self.folder / "disk"
+        disk.mkdir()
+        if subprocess.run(["mount", "-t", "tmpfs", "-o", "size=64k", "none", disk], capture_output=True).returncode:
+            self.skipTest("no file system may be mounted here")
+        self.addCleanup(subprocess.run, ["umount", disk], check=True)
+        (disk / "old.zon").write_text("old")
+        error = self.zon("make", "plane", "disk/old.zon", "--subdivisions", "300", "--level", "0", code=2).stderr
+        self.assertIn("disk/old.zon: cannot be written: No space left", error)
+        self.assertEqual(([path.name for path in disk.iterdir()], (disk / "old.zon").read_text()), (["old.zon"], "old"))
+
+    def test_links_and_modes_stay(self):
         self.zon("make", "cube", "real.zon")
         os.chmod(self.folder / "real.zon", 0o640)
         os.symlink("real.zon", self.folder / "link.zon")

@@ -170,4 +170,33 @@ TEST(GeoProperties, UniqueNamesTakeTheFirstFreeNumber)
     EXPECT_EQ(getGeoPropRangeName("face_vertex_normal"), "face_vertex_normal_index");
 }
 
+/// Counts how often data is asked for rather than its type.
+struct Costly : Object {
+    PropertyInfo propertyInfo(Nexil::String const& key) const override
+    {
+        return key == sData ? PropertyInfo{true, true, Nexil::TypeId::of<Nexil::Ptr<Nexil::Array<float>>>(), 1000}
+                            : Object::propertyInfo(key);
+    }
+    Nexil::Any getProperty(Nexil::String const& key) const override
+    {
+        EXPECT_NE(key, sData) << "built data that nobody asked for";
+        return Object::getProperty(key);
+    }
+};
+
+TEST(GeoProperties, QuestionsNeverBuildData)
+{
+    auto costly = Nexil::makeMutable<Costly>();
+    createDataGeoProperty(0.0f, sPointComp, nullptr, *costly);
+    auto const obj = createObject();
+    setProperty(*obj, "point_heat", std::move(costly));
+    EXPECT_TRUE(getDataGeoProperty(*obj, "point_heat"));
+    EXPECT_FALSE(getRangeGeoProperty(*obj, "point_heat"));
+    EXPECT_EQ(getGeoPropsByName(*obj, "point_*").size(), 1u);
+    EXPECT_EQ(getGeoPropsByTarget(*obj, sPointComp).size(), 1u);
+    EXPECT_EQ(getTargetComponent(*obj, "point_heat"), "point_component");
+    auto const part = support::part(*obj, "point_heat");
+    EXPECT_THAT(support::names(getGeoPropNamesByPrototype(*part, *getComponentGeoPropPrototype())), IsEmpty());
+}
+
 } // namespace

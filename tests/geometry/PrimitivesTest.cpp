@@ -38,14 +38,17 @@ void expectClosedSphere(Object const& mesh, unsigned int pointCount, unsigned in
     EXPECT_TRUE(Mesh::diagnose(mesh) == Mesh::Diagnostic{});
 }
 
-TEST(Primitives, ACubeIsClosedFacesOutwardsAndHasOneNormalPerFace)
+TEST(Primitives, ACubeHasItsTablesAndFacesOutwards)
 {
     auto const cube = support::filled([](Object& object) { populateCubeMesh(2, object); });
     expectClosedSphere(*cube, 8, 6);
     auto const points = support::valuesIn<float3>(*cube, sPointPosition);
-    auto const faces = support::facesOf(*cube);
-    EXPECT_EQ(points[0], (float3{-1, -1, -1}));
-    EXPECT_EQ(faces[0], (std::vector<unsigned int>{0, 1, 2, 3}));
+    std::vector<float3> const expected{{-1, -1, -1}, {1, -1, -1}, {1, -1, 1}, {-1, -1, 1},
+                                       {-1, 1, -1},  {1, 1, -1},  {1, 1, 1},  {-1, 1, 1}};
+    EXPECT_EQ(points, expected);
+    support::Polygons const faces{{0, 1, 2, 3}, {4, 7, 6, 5}, {2, 6, 7, 3}, {0, 4, 5, 1}, {4, 0, 3, 7}, {1, 5, 6, 2}};
+    EXPECT_EQ(support::facesOf(*cube), faces);
+
     auto const normals = support::valuesIn<float3>(*cube, sFaceVertexNormal);
     auto const indices = support::valuesIn<unsigned int>(*cube, "face_vertex_normal_index", sIndices);
     ASSERT_EQ(normals.size(), 6u);
@@ -59,15 +62,20 @@ TEST(Primitives, ACubeIsClosedFacesOutwardsAndHasOneNormalPerFace)
     }
     EXPECT_EQ(support::names(getTargetChain(*cube, sFaceVertexNormal)),
               (std::vector<std::string>{"face_vertex_normal", "face_vertex_normal_index", "face_vertex_component"}));
+    EXPECT_EQ(support::names(cube->keys()).back(), "face_vertex_normal");
+    EXPECT_TRUE(getRangeGeoProperty(*cube, "face_vertex_normal_index"));
 }
 
 TEST(Primitives, APlaneIsAtLeastOneQuadAndAtMostWhatItsCountsHold)
 {
-    auto const plane = createObject();
-    ASSERT_TRUE(populatePlaneMesh(2, 0, *plane));
-    EXPECT_EQ(support::valuesIn<float3>(*plane, sPointPosition),
-              (std::vector<float3>{{-1, 0, 1}, {1, 0, 1}, {-1, 0, -1}, {1, 0, -1}}));
-    EXPECT_EQ(support::facesOf(*plane), (support::Polygons{{0, 1, 3, 2}}));
+    for (unsigned int subdivisions : {0u, 1u}) {
+        auto const plane = createObject();
+        ASSERT_TRUE(populatePlaneMesh(2, subdivisions, *plane));
+        EXPECT_EQ(support::valuesIn<float3>(*plane, sPointPosition),
+                  (std::vector<float3>{{-1, 0, 1}, {1, 0, 1}, {-1, 0, -1}, {1, 0, -1}}));
+        EXPECT_EQ(support::facesOf(*plane), (support::Polygons{{0, 1, 3, 2}}));
+        EXPECT_EQ(plane->size(), 6u);
+    }
     // 32768: corners. 65535: points. 65536 and more: products that wrap around in 32 and in 64 bits.
     auto const untouched = createObject();
     for (unsigned int subdivisions : {32768u, 65535u, 65536u, 0x80000000u, 0xFFFFFFFFu})
@@ -92,19 +100,28 @@ TEST(Primitives, ASphereIsClosedFacesOutwardsAndCarriesItsNormals)
         EXPECT_NEAR(length(normals[i]), 1, 2e-6f) << i;
         EXPECT_GT(dot(points[i], normals[i]), 1.95f) << i;
     }
+    // Entries that break the table's symmetry, or that no invariant above would miss.
+    EXPECT_EQ(points[1], (float3{-0.475528f, -0.809017f, -0.345492f} * 2.0f));
+    EXPECT_EQ(points[17], (float3{-0.475528f, 0.809017f, 0.345491f} * 2.0f));
+    EXPECT_EQ(normals[2], (float3{-0.564703f, -0.716086f, 0.410281f}));
+    EXPECT_EQ(normals[9], (float3{0.961091f, -0.276231f, 0}));
+    EXPECT_EQ(getTargetComponent(*sphere, sPointNormal), "point_component");
 }
 
 TEST(Primitives, ANegativeRadiusMirrorsPointsAndNegatesNormals)
 {
-    auto const sphere = [](float radius) {
-        return support::filled([=](Object& object) { populateSphereMesh(radius, object); });
+    auto const sphere = [](float radius, char const* name) {
+        return support::valuesIn<float3>(*support::filled([=](Object& object) { populateSphereMesh(radius, object); }),
+                                         name);
     };
     for (char const* name : {sPointPosition, sPointNormal}) {
-        auto mirrored = support::valuesIn<float3>(*sphere(1), name);
-        for (auto& each : mirrored)
-            each = each * -1.0f;
-        EXPECT_EQ(support::valuesIn<float3>(*sphere(-1), name), mirrored);
+        auto const outside = sphere(1, name);
+        auto const inside = sphere(-1, name);
+        ASSERT_EQ(outside.size(), 22u);
+        for (std::size_t i = 0; i < outside.size(); ++i)
+            EXPECT_EQ(outside[i] * -1.0f, inside[i]) << name << " " << i;
     }
+    EXPECT_EQ(sphere(0, sPointNormal), sphere(1, sPointNormal));
 }
 
 } // namespace

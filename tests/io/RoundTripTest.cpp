@@ -235,4 +235,26 @@ TEST(StreamFailure, ACancelledJobAnswersFalseWithoutAMessage)
     EXPECT_EQ(result.errors.size() + result.objects.size(), 0u);
 }
 
+TEST(StreamRoundTrip, ArraysAboveFourGibibytes)
+{
+    if (!std::getenv("VELDRIN_TEST_HUGE"))
+        GTEST_SKIP() << "needs 10 GB of memory and 5 GB of disk: set VELDRIN_TEST_HUGE";
+    std::uint64_t const size = (std::uint64_t(4) << 30) + 5;
+    Nexil::Array<unsigned char> bytes;
+    bytes.resize(size);
+    for (std::uint64_t i = 0; i < size; i += 4093)
+        bytes[i] = static_cast<unsigned char>(i >> 3);
+    auto const objects = listOf("bytes", Nexil::makePtr<Nexil::Array<unsigned char>>(std::move(bytes)));
+    std::string const path = testing::TempDir() + "veldrin_huge.zon";
+    for (int const level : {0, 1}) {
+        Veldrin::IO::SerializationOptions options;
+        options.compressionLevel = level;
+        ASSERT_TRUE(Veldrin::IO::serialize(objects, path.c_str(), options, nullptr));
+        support::Objects back;
+        ASSERT_TRUE(Veldrin::IO::deserialize(path.c_str(), back, {}, nullptr));
+        EXPECT_EQ(support::describeObjects(back), support::describeObjects(objects)) << "level " << level;
+    }
+    std::remove(path.c_str());
+}
+
 } // namespace
