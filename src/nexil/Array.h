@@ -44,9 +44,9 @@ namespace Internal {
 
     struct ArrayAccess;
 
-    /// Blocks of so many bytes and more ask the system for huge pages. Below, the padding to whole ones would be a large
-    /// share.
-    inline constexpr std::size_t kHugePagesFromBytes = std::size_t(4) << 20;
+    /// Blocks of so many bytes and more ask the system for huge pages. Below, an array gains nothing from them, and the
+    /// padding to whole ones would be a large share.
+    inline constexpr std::size_t kHugePagesFromBytes = std::size_t(16) << 20;
 
     /// Has the system give all pages of a block, or of a part of one, at once, for callers that are about to overwrite it:
     /// page by page, as bytes arrive, fresh memory takes 1.6 times as long to fill from a file. Where the pages are there

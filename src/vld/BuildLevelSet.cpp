@@ -217,14 +217,14 @@ namespace {
         return all;
     }
 
-    bool isUsable(VoxelBox const& box)
+    bool isUsable(VoxelBox const& box, std::uint64_t blockWidth)
     {
         for (int axis = 0; axis < 3; ++axis)
             if (box.size[axis] <= 0 || box.origin[axis] < -kCoordinateLimit ||
                 static_cast<long long>(box.origin[axis]) + box.size[axis] > kCoordinateLimit)
                 return false;
-        // So that 64 bits count the blocks, whose width the tiles decide.
-        auto const along = [&](int axis) { return static_cast<std::uint64_t>(box.size[axis]) / 64 + 2; };
+        // So that 64 bits count the blocks.
+        auto const along = [&](int axis) { return static_cast<std::uint64_t>(box.size[axis]) / blockWidth + 2; };
         return along(0) * along(1) <= std::numeric_limits<std::uint64_t>::max() / along(2);
     }
 
@@ -234,7 +234,7 @@ template <class Traits>
 Grid<Traits> buildLevelSet(GridDescription const& description, VoxelBox const& box, float band,
                            DistanceField const& field, std::uint64_t mostElements)
 {
-    if (!isUsable(description) || !isUsable(box) || !std::isfinite(band) || !(band > 0))
+    if (!isUsable(description) || !isUsable(box, Blocks<Traits>::kBlockWidth) || !std::isfinite(band) || !(band > 0))
         return {};
     double const voxelSize = description.voxelSize;
     Judge const judge(box, band, voxelSize, field);

@@ -307,6 +307,9 @@ TYPED_TEST(Builders, WhatCannotBeBuiltGivesAnEmptyGrid)
     }
     constexpr int kHalf = 1 << 30;
     EXPECT_FALSE(plane(good, {{-kHalf, -kHalf, -kHalf}, {2147483647, 2147483647, 2147483647}}, 1));
+    // Of exactly 2^64 blocks.
+    EXPECT_FALSE(buildLevelSet<WideTiles>(good, {{-104857600, -104857600, -26214400}, {209715200, 209715200, 52428800}},
+                                          1, [](double3 const& p) { return p.x; }));
     for (float const width : noSizes) {
         EXPECT_FALSE(plane(good, {{0, 0, 0}, {1, 1, 1}}, width));
         EXPECT_FALSE(points(good, {{0, 0, 0}}, {1.0f}, width));

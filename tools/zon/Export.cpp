@@ -189,7 +189,8 @@ namespace {
         auto const objects = readZon(options.input);
         auto const written = writeVdb(objects, options.output);
         if (written.gridCount == 0)
-            throw Failure(fmt::format("{}: there is no volume with values in it", options.input));
+            throw Failure(fmt::format("{}: there is no volume with values in it that a grid holds{}", options.input,
+                                      written.leftOut.empty() ? "" : "; " + written.leftOut[0]));
         std::error_code isNoFile; // a pipe or a device has no size
         auto const size = std::filesystem::file_size(options.output, isNoFile);
         return report(options, "grid", written.gridCount, written.leftOut, isNoFile ? 0 : size);

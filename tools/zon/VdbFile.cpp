@@ -40,10 +40,13 @@ namespace {
     constexpr char kTransform[] = "vdb_transform";
     constexpr char kActive[] = "_active";
     constexpr int kBlockWidth = SmallTiles::kInnerWidth;
-    // Blocks of one value that are taken: some for every file, and more by the blocks of a grid that have voxels of their own,
-    // so that the inside of a large surface has its place, but a few bytes do not become gigabytes.
+    // Blocks of one value that are taken: some for all grids of a file, and more by the blocks of a grid that have voxels of
+    // their own, so that the inside of a large surface has its place, but a few bytes do not become many gigabytes.
     constexpr double kFreeBlocks = 1 << 24;
     constexpr double kBlocksPerLeaf = 64;
+
+    // Their largest tiles are as wide as this; filling a part of one that ends at the last coordinate never ends.
+    constexpr std::int64_t kEndOfGrids = (std::int64_t(1) << 31) - 4096;
 
     // Their arithmetic on coordinates is of 32 bits, and goes a few voxels beyond the band.
     constexpr double kMostMeshCoordinate = 1 << 30;
@@ -187,9 +190,9 @@ namespace {
         using Leaf = typename Grid::TreeType::LeafNodeType;
         static_assert(Leaf::DIM == kBlockWidth);
 
-        GridReader(Grid const& grid, Nexil::String const& channelName)
+        GridReader(Grid const& grid, Nexil::String const& channelName, double& freeBlocks)
             : grid_(grid), channelName_(channelName), background_(ours(grid.background())),
-              isActive_{background_, isLevelSet(channelName)}
+              isActive_{background_, isLevelSet(channelName)}, freeBlocks_(freeBlocks)
         {
         }
 
@@ -223,7 +226,8 @@ namespace {
         void collectBlocks()
         {
             auto const& root = grid_.tree().root();
-            mostBlocks_ = kFreeBlocks + kBlocksPerLeaf * static_cast<double>(grid_.tree().leafCount());
+            double const ownBlocks = kBlocksPerLeaf * static_cast<double>(grid_.tree().leafCount());
+            mostBlocks_ = freeBlocks_ + ownBlocks;
             for (auto child = root.cbeginChildOn(); child; ++child)
                 collectBlocks(*child);
             for (auto tile = root.cbeginValueAll(); tile; ++tile)
@@ -234,6 +238,7 @@ namespace {
                     fmt::format("its regions of one value cover {:.0f} blocks of {} x {} x {} voxels, and more "
                                 "than {:.0f} are not taken",
                                 constantBlockCount_, kBlockWidth, kBlockWidth, kBlockWidth, mostBlocks_));
+            freeBlocks_ -= std::max(0.0, constantBlockCount_ - ownBlocks);
             std::sort(blocks_.begin(), blocks_.end(),
                       [](Block const& a, Block const& b) { return isBefore(a.origin, b.origin); });
         }
@@ -381,6 +386,7 @@ namespace {
         E background_;
         ActiveRule<E> isActive_;
         std::vector<Block> blocks_;
+        double& freeBlocks_;            // that are left for this grid and the file's next ones
         double constantBlockCount_ = 0; // of those that there would be
         double mostBlocks_ = 0;
         std::vector<PlacedLeaf> leaves_;
@@ -399,8 +405,8 @@ namespace {
         return isTaken ? mapped + "_values" : mapped;
     }
 
-    /// The grid as geometry; throws Failure with the reason.
-    Nexil::Ptr<Object> objectOf(openvdb::GridBase const& grid)
+    /// The grid as geometry; throws Failure with the reason. freeBlocks: what is left of `kFreeBlocks` for its file.
+    Nexil::Ptr<Object> objectOf(openvdb::GridBase const& grid, double& freeBlocks)
     {
         auto const placement = placementOf(grid.constTransform());
         if (!placement)
@@ -415,11 +421,11 @@ namespace {
                 return;
             isKnown = true;
             channelName = channelNameOf(grid, std::is_floating_point_v<E>);
-            auto volume = GridReader<E>(static_cast<Grid const&>(grid), channelName).read(voxelSize);
+            auto volume = GridReader<E>(static_cast<Grid const&>(grid), channelName, freeBlocks).read(voxelSize);
             object = Geometry::move_vld_volume_to_object(*volume);
         });
         if (!isKnown)
-            throw Failure("it has values of type " + grid.valueType());
+            throw Failure("it is a grid of type " + grid.type());
         // A grid that is called like its channel has no name of its own.
         if (Nexil::String const name = grid.getName().c_str(); !name.empty() && name != channelName)
             setProperty(*object, "name", name);
@@ -446,7 +452,7 @@ namespace {
         }
     };
 
-    /// Writes one channel of a volume into a grid.
+    /// Writes one channel of a volume into a grid; throws Failure for values that no grid has a place for.
     template <class E>
     openvdb::GridBase::Ptr gridOf(AnyTopology const& topology, ChannelBase const& channel,
                                   Nexil::Array<bool> const* states)
@@ -456,6 +462,12 @@ namespace {
         ActiveRule<E> const isActive{background, isLevelSet(channel.name())};
         auto const stateOf = [&](std::uint64_t element) {
             return states ? (*states)[element] : isActive((*values)[element]);
+        };
+        auto const cubeOf = [&](unsigned int element) {
+            VoxelCube const cube = topology.cubeOf(element);
+            if (std::int64_t(std::max({cube.origin.x, cube.origin.y, cube.origin.z})) + cube.width > kEndOfGrids)
+                throw Failure(fmt::format("it has values beyond coordinate {}", kEndOfGrids));
+            return cube;
         };
         auto grid = VdbGrid<E>::create(theirs(background));
         grid->setGridClass(isLevelSet(channel.name())                     ? openvdb::GRID_LEVEL_SET
@@ -467,7 +479,7 @@ namespace {
             bool const isOn = stateOf(element);
             if (topology.isCellWithLeaf(number) || (!isOn && isSame((*values)[element], background)))
                 continue;
-            VoxelCube const cube = topology.cubeOf(number);
+            VoxelCube const cube = cubeOf(number);
             grid->tree().fill(openvdb::CoordBBox::createCube(theirs(cube.origin), cube.width),
                               theirs((*values)[element]), isOn);
         }
@@ -476,7 +488,7 @@ namespace {
             bool const isOn = stateOf(element);
             if (!isOn && isSame((*values)[element], background))
                 continue;
-            auto const voxel = theirs(topology.cubeOf(static_cast<unsigned int>(element)).origin);
+            auto const voxel = theirs(cubeOf(static_cast<unsigned int>(element)).origin);
             if (isOn)
                 accessor.setValueOn(voxel, theirs((*values)[element]));
             else
@@ -549,10 +561,15 @@ namespace {
                 auto const stateChannel = find(channel->name() + kActive);
                 auto const states = stateChannel ? stateChannel->template values<bool>() : nullptr;
                 openvdb::GridBase::Ptr grid;
-                forEachElementType([&]<class E>() {
-                    if (channel->template values<E>())
-                        grid = gridOf<E>(AnyTopology(*container.topology()), *channel, states.get());
-                });
+                try {
+                    forEachElementType([&]<class E>() {
+                        if (channel->template values<E>())
+                            grid = gridOf<E>(AnyTopology(*container.topology()), *channel, states.get());
+                    });
+                } catch (Failure const& failure) {
+                    leave(std::string(name) + ": " + failure.what());
+                    continue;
+                }
                 if (!grid) {
                     leave(std::string(name) + ": " + typeName(channel->data()));
                     continue;
@@ -615,10 +632,11 @@ VdbVolumes readVdb(std::string const& path)
         openvdb::io::File file(path);
         file.open(false);
         VdbVolumes result;
-        auto const grids = file.getGrids();
-        for (auto const& grid : *grids) {
+        double freeBlocks = kFreeBlocks;
+        for (auto name = file.beginName(); name != file.endName(); ++name) {
+            auto const grid = file.readGrid(*name);
             try {
-                result.objects.push_back(objectOf(*grid));
+                result.objects.push_back(objectOf(*grid, freeBlocks));
             } catch (Failure const& failure) {
                 result.leftOut.push_back("grid '" + grid->getName() + "': " + failure.what());
                 continue;
@@ -677,7 +695,8 @@ Nexil::Ptr<Object> levelSetOfMesh(Nexil::Array<float3> const& positions, Nexil::
         openvdb::tools::QuadAndTriangleDataAdapter<openvdb::Vec3s, openvdb::Vec3I> const surface(points, corners);
         auto const grid = openvdb::tools::meshToVolume<openvdb::FloatGrid>(surface, *transform, halfBand, halfBand);
         grid->setGridClass(openvdb::GRID_LEVEL_SET);
-        return objectOf(*grid);
+        double freeBlocks = kFreeBlocks;
+        return objectOf(*grid, freeBlocks);
     });
 }
 

@@ -216,7 +216,9 @@ namespace {
                                                               options.halfBand * options.voxelSize);
         auto volume = VLD::createObject();
         if (!grid.addTo(*volume))
-            throw Failure(place + "the spheres have more voxels than a volume holds, or too many of them overlap");
+            throw Failure(place +
+                          "the spheres have more voxels than a volume holds, or too many of them overlap, or they lie "
+                          "beyond the coordinates that there are");
         return Geometry::move_vld_volume_to_object(*volume);
     }
 

@@ -167,7 +167,7 @@ private:
                 return;
             using Topology = VoxelTopology<Traits>;
             auto const make = [&] {
-                auto& known = rebuilder_.topologyOfInnerTiles_[levels.innerOrigins.get()];
+                auto& known = rebuilder_.topologyOfInnerTiles_[{typeid(Topology), levels.innerOrigins.get()}];
                 auto const like = Nexil::dynamicPtrCast<Topology>(known);
                 auto topology = like ? Topology::create(name, levels, *like) : Topology::create(name, levels);
                 if (topology)

@@ -58,8 +58,8 @@ private:
 
     std::unordered_map<Object const*, Rebuilt> rebuilt_;
     std::map<TilesKey, Tiles> tiles_;
-    /// Of each array of inner tiles, a topology that has it.
-    std::unordered_map<void const*, Nexil::Ptr<VLD::Component>> topologyOfInnerTiles_;
+    /// Of each kind of topology and array of inner tiles, a topology that has it.
+    std::map<std::pair<std::type_index, void const*>, Nexil::Ptr<VLD::Component>> topologyOfInnerTiles_;
     std::unordered_set<void const*> paidArrays_;
     std::uint64_t bytesToLookAt_ = kFreeBytes;
     std::vector<Nexil::String> damaged_;
