@@ -152,6 +152,18 @@ class Volumes(tool.ToolTest):
             self.assertIn(wanted, self.zon("volume", "from-mesh", "cube.zon", "x.zon", *options, code=2).stderr)
         self.assertNotIn("x.zon", self.names())
 
+    def test_values_where_no_grid_has_a_place_are_left_out_by_name(self):
+        end = (1 << 31) - 4096  # of what OpenVDB fills in a time that ends
+        low, high = (zon_files.volume((0, z, 0), heat=("f", range(8))) for z in (end - 8, end))
+        self.write("a.zon", zon_files.stream([high, low]))
+        self.assertIn(f"object 0: heat: it has values beyond coordinate {end}",
+                      self.zon("export", "a.zon", "a.vdb").stderr)
+        self.zon("import", "a.vdb", "b.zon")
+        self.assertEqual(len(self.objects("b.zon")), 1)
+        self.write("high.zon", zon_files.stream([high]))
+        self.assertIn("beyond", self.zon("export", "high.zon", "high.vdb", code=2).stderr)
+        self.assertNotIn("high.vdb", self.names())
+
     def test_only_states_go_into_the_grid_of_another_channel(self):
         values = tuple(range(1, 9))
         self.write("a.zon", zon_files.stream([zon_files.volume(

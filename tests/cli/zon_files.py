@@ -92,13 +92,13 @@ def stream(top, shared=()):
     return head + pack(end) + b"".join(items) + b"".join(pack(number) for entry in entries for number in entry)
 
 
-def volume(**channels):
+def volume(at=(0, 0, 0), **channels):
     """One small inner tile without leaf tiles; each channel has a form and the values of its eight cells."""
     sizes = dict(zip(("voxelTileWidth", "voxelTileDataWidth", "voxelOffsetType", "voxelInnerLevels"),
                      (frame(2, each) for each in (2, 4, 0, 1))))
     none = array("I", ())
     tiles = {"count": frame(2, 8), "vld_component": text("voxel_topology"), "name": text("voxel_component"), **sizes,
-             "leaf_origins": array("3i", ()), "leaf_parents": none, "inner_origins": array("3i", (0, 0, 0)),
+             "leaf_origins": array("3i", ()), "leaf_parents": none, "inner_origins": array("3i", at),
              "inner_children": array("I", [0xFFFFFFFF] * 8)}
     tree = {"indices": none, "target": text("voxel_component"), "depends_on": frame(131, [1, []]),
             "vld_component": text("container"), "name": text("voxel_tile_tree"), "topology": text("voxel_component"),
