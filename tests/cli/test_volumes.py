@@ -112,7 +112,7 @@ class Volumes(tool.ToolTest):
         said = self.zon("import", "a.vdb", "a.zon").stderr
         self.assertIn("grid 'stretched': its transform is not one positive scale and a translation", said)
         self.assertIn("grid 'huge': its regions of one value cover 1073741824 blocks of 8 x 8 x 8 voxels, and more than "
-                      "16777216 are not taken", said)
+                      "2097152 are not taken", said)
         self.assertEqual(len(self.objects("a.zon")), 1)
         self.write_grids("b.vdb", stretched)
         self.assertIn("there is no grid in it that a zon file holds", self.zon("import", "b.vdb", "b.zon", code=2).stderr)

@@ -40,9 +40,9 @@ namespace {
     constexpr char kTransform[] = "vdb_transform";
     constexpr char kActive[] = "_active";
     constexpr int kBlockWidth = SmallTiles::kInnerWidth;
-    // Blocks of one value that are taken: some for all grids of a file, and more by the blocks of a grid that have voxels of
-    // their own, so that the inside of a large surface has its place, but a few bytes do not become many gigabytes.
-    constexpr double kFreeBlocks = 1 << 24;
+    // Blocks of one value that are taken: some for all grids of a file, which is half a gigabyte at most, and more by the
+    // blocks of a grid that have voxels of their own, so that the inside of a large surface has its place.
+    constexpr double kFreeBlocks = 1 << 21;
     constexpr double kBlocksPerLeaf = 64;
 
     // Their largest tiles are as wide as this; filling a part of one that ends at the last coordinate never ends.
