@@ -243,9 +243,24 @@ namespace {
                 auto const proxy = part(*volume, name.c_str());
                 Nexil::Ptr<Object> copy = proxy;
                 Nexil::MutablePtr<Object> own(std::move(copy));
+                auto const change = [&](auto const& set) {
+                    wholly(
+                        [&] {
+                            Object description;
+                            return Geometry::describeVldProxy(*own, description) ? dump(description) : "";
+                        },
+                        set);
+                };
                 for (auto const& key : proxy->keys()) {
-                    bool const isSet = own->setPropertyAny(key, proxy->getProperty(key));
-                    ask(proxy->propertyInfo(key).arraySize, isSet, own->extractProperty(key).empty());
+                    change([&] { own->setPropertyAny(key, proxy->getProperty(key)); });
+                    ask(proxy->propertyInfo(key).arraySize, own->extractProperty(key).empty());
+                }
+                Nexil::Any const longName(Nexil::String("a name that takes memory of its own"));
+                change([&] { own->setPropertyAny("target", Nexil::Any(longName)); });
+                if (auto* const channel = dynamic_cast<Geometry::VldProxyComponentChannel*>(own.get())) {
+                    change([&] { channel->setInPlacePropertyAny("target", longName); });
+                    auto& values = const_cast<VLD::TileTree3D::ChannelBase&>(*channel->getVldComponent());
+                    change([&] { (void)values.writeValues<float>(); });
                 }
                 own->eraseAllProperties();
             }

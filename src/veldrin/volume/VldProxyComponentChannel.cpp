@@ -22,14 +22,14 @@ namespace {
         return name == sInterp && value.holds<DataInterpolationMode>();
     }
 
-    void set(ChannelBase& channel, Nexil::String const& name, Nexil::Any const& value)
+    void set(ChannelBase& channel, Nexil::String const& name, Nexil::Any&& value) noexcept
     {
         if (name == sTarget)
-            channel.setContainerName(*value.get<Nexil::String>());
+            channel.setContainerName(std::move(*value.get<Nexil::String>()));
         else if (name == sData)
-            channel.setData(value);
+            channel.setData(std::move(value));
         else if (name == sDefault)
-            channel.setDefaultValue(value);
+            channel.setDefaultValue(std::move(value));
         else
             channel.setInitializer(to_vld_volume_interp(*value.get<DataInterpolationMode>()));
     }
@@ -106,21 +106,18 @@ bool VldProxyComponentChannel::setInternalPropertyAny(Nexil::String const& name,
 {
     if (!channel_ || !accepts(*channel_, name, value))
         return false;
+    // Whatever takes memory comes first, so that nothing is half set when there is none.
+    Nexil::Any copy = value;
+    Nexil::String newTarget = name == sTarget ? *value.get<Nexil::String>() : target_;
     if (inPlace) {
         // Channels are made writable, so the cast restores what this one is.
-        set(const_cast<ChannelBase&>(*channel_), name, value);
+        set(const_cast<ChannelBase&>(*channel_), name, std::move(copy));
     } else {
         Nexil::MutablePtr<ChannelBase> own(std::move(channel_));
-        try {
-            set(*own, name, value);
-        } catch (...) {
-            channel_ = std::move(own);
-            throw;
-        }
+        set(*own, name, std::move(copy));
         channel_ = std::move(own);
     }
-    if (name == sTarget)
-        target_ = *value.get<Nexil::String>();
+    target_ = std::move(newTarget);
     return true;
 }
 
