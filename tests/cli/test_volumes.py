@@ -14,7 +14,8 @@ except ImportError:
 
 needs_vdb = unittest.skipUnless(vdb, "python3-openvdb is not there")
 FAR = 1 << 30
-CHANNELS = pathlib.Path(__file__).resolve().parents[1] / "corpus/streams/valid/v6_volume_channels.zon"
+STREAMS = pathlib.Path(__file__).resolve().parents[1] / "corpus/streams/valid"
+CHANNELS = STREAMS / "v6_volume_channels.zon"
 
 
 def active_values(grid):
@@ -191,6 +192,13 @@ class VolumesOfPoints(tool.ToolTest):
         self.assertEqual(self.dumped("balls.zon", "voxel_tile_tree", "indices"), "", "they only count up")
         self.assertEqual(self.zon("volume", "info", "two.zon").stdout, "object 0: no volume\n")
         self.zon("volume", "from-points", "two.zon", "x.zon", "--radius", "1e9", "--voxel-size", "1e-9", code=2)
+
+    def test_the_report_tells_of_parts_without_a_container(self):
+        described = self.json("volume", "info", CHANNELS)["objects"][1]["points"]
+        self.assertEqual([(each["points"], each["channels"][0]["elements"]) for each in described], [(3, 3)])
+        described = self.json("volume", "info", STREAMS / "v6_volume_shared.zon")["objects"][1]
+        self.assertTrue(described["is_volume"])
+        self.assertEqual([each["name"] for each in described["topologies"]], ["voxel_component", "again"])
 
     def test_the_dump_shows_tiles_however_deep_a_volume_lies(self):
         deep = zon_files.volume(heat=("f", range(8)))

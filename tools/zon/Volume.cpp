@@ -13,6 +13,7 @@
 #include <veldrin/math/BBox.h>
 #include <veldrin/volume/VolumeBounds.h>
 #include <vld/BuildFromPoints.h>
+#include <vld/PointTopology.h>
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
@@ -20,6 +21,7 @@
 #include <algorithm>
 #include <cmath>
 #include <memory>
+#include <set>
 
 namespace Zon {
 
@@ -45,14 +47,13 @@ namespace {
 
     // ------------------------------------------------------------------------------------------------- reports
 
-    template <class Traits>
-    Json describe(VLD::Object const& volume, Container<Traits> const& container)
+    /// What the channels of a container or of points hold.
+    template <class Owner>
+    Json describeValues(VLD::Object const& volume, Owner const& owner)
     {
-        VoxelTopology<Traits> const& topology = *container.topology();
-        auto const parameters = Traits::parameters();
         Json channels = Json::array();
         std::uint64_t channelBytes = 0;
-        for (auto const& channel : channelsOf(volume, container)) {
+        for (auto const& channel : channelsOf(volume, owner)) {
             auto const bytes = decodedBytes(channel->data());
             channelBytes += bytes;
             channels.push_back({{"name", channel->name().view()},
@@ -60,46 +61,121 @@ namespace {
                                 {"elements", channel->elementCount()},
                                 {"bytes", bytes}});
         }
-        return {{"name", container.name().view()},
-                {"topology", container.topologyName().view()},
+        return {{"channel_bytes", channelBytes}, {"channels", channels}};
+    }
+
+    template <class Traits>
+    Json describe(VoxelTopology<Traits> const& topology)
+    {
+        auto const parameters = Traits::parameters();
+        return {{"name", topology.name().view()},
                 {"tile_width", parameters.tileWidth},
                 {"data_width", parameters.dataWidth},
-                {"voxel_size", container.voxelSize()},
                 {"leaf_tiles", topology.leafCount()},
                 {"inner_tiles", topology.innerCount()},
                 {"voxels", topology.voxelCount()},
                 {"elements", topology.elementCount()},
                 {"tile_bytes", topology.byteSize()},
-                {"channel_bytes", channelBytes},
-                {"consistent", container.checkConsistency(false)},
-                {"channels", channels}};
+                {"consistent", topology.isConsistent(false)}};
     }
 
-    Json describe(Object const& object)
+    template <class Traits>
+    Json describe(VLD::Object const& volume, Container<Traits> const& container)
     {
-        auto const volume = Geometry::shallow_copy_object_to_vld_volume(object);
-        Json containers = Json::array();
-        if (volume)
-            forEachContainer(*volume,
-                             [&](auto const& container) { containers.push_back(describe(*volume, container)); });
-        return {{"is_volume", !containers.empty()}, {"containers", containers}};
+        Json json = describe(*container.topology());
+        json.update({{"name", container.name().view()},
+                     {"topology", container.topologyName().view()},
+                     {"voxel_size", container.voxelSize()},
+                     {"consistent", container.checkConsistency(false)}});
+        json.update(describeValues(volume, container));
+        return json;
     }
 
-    void print(Json const& container)
+    template <class Traits>
+    Json describe(VLD::Object const& volume, PointTopology<Traits> const& points)
     {
-        auto const text = [&](char const* key) { return printable(container[key].get<std::string>()); };
-        auto const number = [&](char const* key) { return container[key].get<std::uint64_t>(); };
-        fmt::print("    {} over {}: tiles of {} x {} voxels along each axis, voxel size {}\n", text("name"),
-                   text("topology"), number("tile_width"), number("data_width"), container["voxel_size"].get<float>());
-        fmt::print("        {} with {} in all, {}, {}\n", counted(number("leaf_tiles"), "leaf tile"),
-                   counted(number("voxels"), "voxel"), counted(number("inner_tiles"), "inner tile"),
-                   container["consistent"].get<bool>() ? "consistent" : "NOT consistent");
-        fmt::print("        {} for tiles, {} for values\n", byteText(number("tile_bytes")),
-                   byteText(number("channel_bytes")));
-        for (auto const& channel : container["channels"])
-            fmt::print("        channel {}: {}, {}\n", printable(channel["name"].get<std::string>()),
-                       channel["type"].get<std::string>(),
-                       counted(channel["elements"].get<std::uint64_t>(), "element"));
+        auto const bytes = points.leafOrigins().size() * sizeof(Coordinate) + points.offsets().size() * sizeof(int);
+        Json json = {{"name", points.name().view()},
+                     {"data_width", Traits::parameters().dataWidth},
+                     {"leaf_tiles", points.leafOrigins().size()},
+                     {"points", points.elementCount()},
+                     {"tile_bytes", bytes},
+                     {"consistent", points.isConsistent()}};
+        json.update(describeValues(volume, points));
+        return json;
+    }
+
+    /// A volume by its parts: containers, topologies that no container is over, and points.
+    Json describe(Nexil::Ptr<Object> const& object)
+    {
+        Json containers = Json::array(), topologies = Json::array(), points = Json::array();
+        auto const volume = object ? Geometry::shallow_copy_object_to_vld_volume(*object) : nullptr;
+        if (volume) {
+            std::set<void const*> used;
+            forEachContainer(*volume, [&](auto const& container) {
+                containers.push_back(describe(*volume, container));
+                used.insert(container.topology().get());
+            });
+            forEachOf<VoxelTopology>(*volume, [&](auto const& topology) {
+                if (!used.contains(&topology))
+                    topologies.push_back(describe(topology));
+            });
+            forEachOf<PointTopology>(*volume, [&](auto const& each) { points.push_back(describe(*volume, each)); });
+        }
+        return {{"is_volume", volume && !volume->empty()},
+                {"containers", containers},
+                {"topologies", topologies},
+                {"points", points}};
+    }
+
+    std::string textIn(Json const& part, char const* key)
+    {
+        return printable(part[key].get<std::string>());
+    }
+
+    std::string countedIn(Json const& part, char const* key, char const* noun)
+    {
+        return counted(part[key].get<std::uint64_t>(), noun);
+    }
+
+    /// The lines below the title of a part of a volume.
+    void printTiles(Json const& part, std::string const& tiles)
+    {
+        fmt::print("        {}, {}\n        {} for tiles", tiles,
+                   part["consistent"].get<bool>() ? "consistent" : "NOT consistent",
+                   byteText(part["tile_bytes"].get<std::uint64_t>()));
+        if (part.contains("channels"))
+            fmt::print(", {} for values", byteText(part["channel_bytes"].get<std::uint64_t>()));
+        fmt::print("\n");
+        for (auto const& channel : part.value("channels", Json::array()))
+            fmt::print("        channel {}: {}, {}\n", textIn(channel, "name"), channel["type"].get<std::string>(),
+                       countedIn(channel, "elements", "element"));
+    }
+
+    void printVoxels(Json const& part, std::string const& over)
+    {
+        fmt::print("    {}{}\n", textIn(part, "name"), over);
+        printTiles(part, fmt::format("{} with {} in all, {}", countedIn(part, "leaf_tiles", "leaf tile"),
+                                     countedIn(part, "voxels", "voxel"), countedIn(part, "inner_tiles", "inner tile")));
+    }
+
+    void print(Json const& object)
+    {
+        auto const widths = [](Json const& part) {
+            return fmt::format("tiles of {} x {} voxels along each axis", part["tile_width"].get<unsigned int>(),
+                               part["data_width"].get<unsigned int>());
+        };
+        for (auto const& container : object["containers"])
+            printVoxels(container, fmt::format(" over {}: {}, voxel size {}", textIn(container, "topology"),
+                                               widths(container), container["voxel_size"].get<float>()));
+        for (auto const& topology : object["topologies"])
+            printVoxels(topology, " without a container: " + widths(topology));
+        for (auto const& points : object["points"]) {
+            fmt::print("    {}: points in tiles of {} voxels along each axis\n", textIn(points, "name"),
+                       points["data_width"].get<unsigned int>());
+            printTiles(points, fmt::format("{} with {} in all", countedIn(points, "leaf_tiles", "leaf tile"),
+                                           countedIn(points, "points", "point")));
+        }
     }
 
     ExitCode runInfo(ReportOptions const& options)
@@ -107,7 +183,7 @@ namespace {
         auto const objects = readZon(options.input);
         Json list = Json::array();
         for (auto const& object : objects)
-            list.push_back(object ? describe(*object) : Json{{"is_volume", false}, {"containers", Json::array()}});
+            list.push_back(describe(object));
         if (options.wantsJson) {
             Json const json{{"file", options.input}, {"objects", list}};
             printReport(json);
@@ -115,8 +191,7 @@ namespace {
         }
         for (std::size_t i = 0; i < list.size(); ++i) {
             fmt::print("object {}: {}\n", i, list[i]["is_volume"].get<bool>() ? "volume" : "no volume");
-            for (auto const& container : list[i]["containers"])
-                print(container);
+            print(list[i]);
         }
         return kDone;
     }
