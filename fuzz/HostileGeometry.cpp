@@ -186,7 +186,7 @@ extern "C" int LLVMFuzzerTestOneInput(std::uint8_t const* data, std::size_t size
     }
     Nexil::Ptr<Object> const geometry = geometryFrom(bytes);
     auto const before = support::dump(*geometry, 1000);
-    sample.mesh = sample.strands = geometry;
+    sample.geometry = geometry;
     bool hasSmallCounts = true;
     for (auto const* name :
          {Geometry::sPointComp, Geometry::sFaceComp, Geometry::sFaceVertexComp, Geometry::sStrandComp})

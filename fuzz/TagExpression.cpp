@@ -21,17 +21,6 @@ void check(bool condition)
         std::abort();
 }
 
-/// A cube with tags of one letter, of all components, one of them too short and one of none.
-TagSample const kSample{8,
-                        {{0, 1, 2, 3}, {4, 7, 6, 5}, {2, 6, 7, 3}, {0, 4, 5, 1}, {4, 0, 3, 7}, {1, 5, 6, 2}},
-                        {3, 0, 5},
-                        {{"a", "point_component", "01101101"},
-                         {"b", "face_component", "100101"},
-                         {"c", "face_vertex_component", "100100100110111001011001"},
-                         {"d", "strand_component", "101"},
-                         {"ab", "point_component", "110"},
-                         {"a.b", "other", "01"}}};
-
 std::string dumpOf(std::string_view text)
 {
     std::ostringstream stream;
@@ -41,7 +30,7 @@ std::string dumpOf(std::string_view text)
 
 void run(std::string_view text)
 {
-    static auto const cube = kSample.build();
+    static auto const cube = taggedCube().build();
     Geometry::TagResolver resolver;
     auto const status = resolver.parses(Nexil::String(text));
     check(status.ok == status.message.empty() && status.byteOffset <= text.size());
@@ -56,7 +45,7 @@ void run(std::string_view text)
     auto const mask = resolver.resolve(*cube, component);
     auto const maskAgain = again.resolve(*cube, componentAgain);
     check(mask && maskAgain && *mask == *maskAgain && component == componentAgain);
-    for (auto const& tag : kSample.tags)
+    for (auto const& tag : taggedCube().tags)
         check(flagsOf(support::arrayIn<bool>(*cube, tag.name.c_str())) == tag.flags);
 }
 

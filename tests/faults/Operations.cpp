@@ -1,5 +1,6 @@
 #include "Operations.h"
 
+#include "../tags/TagSample.h"
 #include "../validation/Edits.h"
 #include "../volume/Samples.h"
 
@@ -8,6 +9,8 @@
 #include <veldrin/veldrin.h>
 
 #include <cstdio>
+#include <cstring>
+#include <filesystem>
 #include <sstream>
 #include <stdexcept>
 #include <thread>
@@ -18,32 +21,13 @@ namespace support {
 namespace {
 
     using namespace Veldrin;
-    using Veldrin::Geometry::Mesh::FaceEdge;
-    using MaskPtr = Nexil::Ptr<Nexil::Array<bool>>;
-
-    Nexil::Ptr<Object> taggedMesh()
+    /// A cube that is a geometry of strands, too, with selections of all components and values shared out by a range.
+    Nexil::Ptr<Object> facesAndStrands()
     {
-        auto made = filled([](Object& o) { Geometry::populateCubeMesh(2, o); });
+        auto made = taggedCube().build();
         addRange(*made, "corner_index", "face_vertex_component", Indices(24, 1));
         addData(*made, "corner", "corner_index", {1, 2});
-        std::tuple<char const*, char const*, std::vector<bool>> const tags[] = {
-            {"a", "point_component", {true, true, true, true, true, false, false, true}},
-            {"b", "face_component", {true, false, true, false, true, false}},
-            {"c", "face_vertex_component", std::vector<bool>(24, true)}};
-        for (auto const& [name, component, flags] : tags) {
-            auto property = createObject();
-            Geometry::populateTag(component, array(flags), *property);
-            setProperty(*made, name, std::move(property));
-        }
         return made;
-    }
-
-    Nexil::Ptr<Object> someStrands()
-    {
-        return filled([](Object& o) {
-            Geometry::populateStrand(array<Math::float3>({{0, 0, 0}, {1, 0, 0}, {1, 2, 0}, {0, 0, 5}}),
-                                     array<unsigned int>({0, 3, 4}), o);
-        });
     }
 
     template <class Traits>
@@ -79,18 +63,26 @@ namespace {
         }
     }
 
-    /// Runs compute(arrays of T...), which answers whether they were filled, on arrays that held something before, as
-    /// callers' arrays do.
+    /// Has arrays of T... filled by compute(geometry, arrays...), which answers whether it did. They hold something before,
+    /// as callers' arrays do, and keep it unless they are filled.
     template <class... T, class Compute>
-    bool fill(Compute const& compute)
+    Operation filling(char const* name, Compute const& compute, Takes takes = Takes::SmallCounts)
     {
-        auto const run = [&](auto&... outputs) {
-            (outputs.resize(3), ...);
-            return wholly([&] { return ((outputs.empty() || outputs.size() == 3) && ...); },
-                          [&] { return compute(outputs...); });
+        auto const run = [compute](Sample const& sample) {
+            std::tuple<Nexil::Array<T>...> arrays;
+            auto const prepare = [&](auto&... each) {
+                (each.resize(3), ...);
+                (each.reserve(sample.room), ...);
+                (std::memset(static_cast<void*>(each.data()), 0x5A, 3 * sizeof(each[0])), ...);
+            };
+            std::apply(prepare, arrays);
+            auto const before = arrays;
+            auto const computeAll = [&](auto&... each) { return compute(*sample.geometry, each...); };
+            bool const isAnswered = wholly([&] { return arrays; }, [&] { return std::apply(computeAll, arrays); });
+            expect(isAnswered || arrays == before);
+            return arrays != before;
         };
-        std::tuple<Nexil::Array<T>...> outputs;
-        return std::apply(run, outputs);
+        return {name, run, takes};
     }
 
     bool validate(Sample const& sample)
@@ -100,76 +92,43 @@ namespace {
             auto const failures = validator.findFailures(object);
             expect(failures.empty() ? message.empty() : failures[0].status.message == message);
         };
-        judge(Geometry::MeshValidator(), *sample.mesh);
-        judge(Geometry::PointCloudValidator(), *sample.mesh);
-        judge(Geometry::StrandValidator(), *sample.strands);
-        judge(Geometry::StrandValidator(), *sample.mesh);
+        judge(Geometry::MeshValidator(), *sample.geometry);
+        judge(Geometry::PointCloudValidator(), *sample.geometry);
+        judge(Geometry::StrandValidator(), *sample.geometry);
         judge(Geometry::VolumeValidator(), *sample.smallVolume);
         judge(Geometry::GeoValidator(), *sample.wideVolume);
-        return ask(Geometry::validateMesh(*sample.strands));
+        return ask(Geometry::validateMesh(*sample.geometry));
     }
 
-    bool normals(Sample const& sample)
-    {
-        using namespace GeometryAlgorithms;
-        for (bool const byAngle : {false, true})
-            for (bool const byArea : {false, true})
-                fill<Math::float3>([&](auto& output) {
-                    computeMeshVertexNormals(*sample.mesh, byAngle, byArea, output);
-                    return true;
-                });
-        return fill<Math::float3>([&](auto& output) {
-            computeMeshFaceNormals(*sample.mesh, output);
-            return true;
-        });
-    }
-
-    bool topology(Sample const& sample)
+    /// The edge table and what is computed of it agree.
+    bool edges(Sample const& sample)
     {
         using namespace Geometry::Mesh;
-        auto const& mesh = *sample.mesh;
-        fill<unsigned int>([&](auto& groups) {
-            unsigned int count = 0;
-            GeometryAlgorithms::computeMeshNormalsTopology(mesh, {}, 0.5f, groups, count, nullptr);
-            return true;
-        });
-        HalfEdgeDataStructure const table(mesh);
+        HalfEdgeDataStructure const table(*sample.geometry);
         std::uint64_t edgeCount = 0;
         table.forEachEdge(0, table.pointCount(), [&](auto const& edge) {
             ++edgeCount;
             expect(table.findEdge(edge.upper, edge.lower).faceCount == edge.faceCount);
         });
         expect(edgeCount == table.edgeCount());
-        expect(eulerCharacteristic(mesh) == eulerCharacteristic(mesh, table));
-        int const components = connectedComponents(mesh);
-        expect(bettiNumbers(mesh).x == components || components < 0);
-        return ask(diagnose(mesh)) && fill<FaceEdge, FaceEdge, unsigned int>([&](auto&... outputs) {
-                   return GeometryAlgorithms::buildFaceVertexAdjacency(mesh, outputs..., nullptr);
-               });
-    }
-
-    bool strandMeasures(Sample const& sample)
-    {
-        using namespace GeometryAlgorithms;
-        auto const& strands = *sample.strands;
-        return fill<Math::float3>([&](auto& tangents) { return computeStrandTangents(strands, tangents, nullptr); }) &&
-               fill<float, float>(
-                   [&](auto&... lengths) { return computeStrandLength(strands, lengths..., nullptr); }) &&
-               fill<float>([&](auto& ratios) { return computeStrandRatio(strands, ratios, nullptr); });
+        expect(eulerCharacteristic(*sample.geometry) == eulerCharacteristic(*sample.geometry, table));
+        int const components = connectedComponents(*sample.geometry);
+        expect(bettiNumbers(*sample.geometry).x == components || components < 0);
+        return edgeCount > 0;
     }
 
     bool conversions(Sample const& sample)
     {
         using namespace Geometry;
-        auto const& mesh = *sample.mesh;
+        auto const& geometry = *sample.geometry;
         Nexil::Array<bool> const mask{true, false, true};
         bool ok = false;
         for (auto const style : {TagConversionStyle::AnyElement, TagConversionStyle::AllElements})
-            ask(faceVerticesToFaces(mesh, mask, style, &ok), pointsToFaces(mesh, mask, style, &ok),
-                pointsToStrands(*sample.strands, mask, style, &ok));
-        return ask(faceVerticesToPoints(mesh, mask, &ok), facesToFaceVertices(mesh, mask, &ok),
-                   facesToPoints(mesh, mask, &ok), pointsToFaceVertices(mesh, mask, &ok),
-                   strandsToPoints(*sample.strands, mask, &ok));
+            ask(faceVerticesToFaces(geometry, mask, style, &ok), pointsToFaces(geometry, mask, style, &ok),
+                pointsToStrands(geometry, mask, style, &ok));
+        return ask(faceVerticesToPoints(geometry, mask, &ok), facesToFaceVertices(geometry, mask, &ok),
+                   facesToPoints(geometry, mask, &ok), pointsToFaceVertices(geometry, mask, &ok),
+                   strandsToPoints(geometry, mask, &ok));
     }
 
     bool tags(Sample const& sample)
@@ -179,9 +138,10 @@ namespace {
         if (!resolver.parses("(a + f(b)) - !c ^ p(*)"))
             return false;
         Nexil::String component;
-        auto const mask = resolver.resolve(*sample.mesh, component);
+        auto const mask =
+            wholly([&] { return component; }, [&] { return resolver.resolve(*sample.geometry, component); });
         MaskPtr data;
-        if (!mask || !getTagData(*sample.mesh, "b", data, component))
+        if (!mask || !getTagData(*sample.geometry, "b", data, component))
             return false;
         auto flags = *data;
         unionTagData(*mask, flags);
@@ -192,7 +152,7 @@ namespace {
         std::ostringstream dumped;
         VLD::Utils::Internal::parseTagExpression("a + b ^ f(c)")->dump(dumped);
         return dumped && ask(createTagName("face_component", "x"),
-                             convertTagData(*sample.mesh, data, component, "point_component",
+                             convertTagData(*sample.geometry, data, component, "point_component",
                                             TagConversionStyle::AnyElement, &ok));
     }
 
@@ -203,14 +163,17 @@ namespace {
             if (!shared || !Geometry::validUpdatedVolume(*shared))
                 return false;
             VLD::Object volume = *shared;
-            auto const made = wholly([&] { return volume.componentCount(); },
+            auto const components = volume.componentRange();
+            auto const made = wholly([&] { return volume.componentRange(); },
                                      [&] { return Geometry::move_vld_volume_to_object(volume); });
+            // What was not converted stays where it was.
+            expect(made && (made->empty() ? volume.componentRange() == components : volume.empty()));
             Object copy = *object;
             auto const back =
                 wholly([&] { return copy.size(); }, [&] { return Geometry::move_object_to_vld_volume(copy); });
             Math::bbox<Math::float3, float> box;
-            GeometryAlgorithms::getVolumeBounds(*object, box);
-            if (!made || !back)
+            wholly([&] { return box; }, [&] { GeometryAlgorithms::getVolumeBounds(*object, box); });
+            if (!back)
                 return false;
             (void)Geometry::move_object_to_vld_volume_const(copy);
         }
@@ -230,7 +193,7 @@ namespace {
         addPoints<VLD::TileTree3D::WideTiles>(*built);
         auto const made = Geometry::move_vld_volume_to_object_const(*built);
         // The indices of a container are made when they are first asked for.
-        return ask(proxies->keys(), made->keys(), arrayIn<unsigned int>(*made, "voxel_tile_tree", "indices"));
+        return ask(proxies->keys()) && arrayIn<unsigned int>(*made, "voxel_tile_tree", "indices");
     }
 
     bool proxies(Sample const& sample)
@@ -271,7 +234,7 @@ namespace {
     bool accessors(Sample const& sample)
     {
         using namespace Geometry;
-        auto const& mesh = *sample.mesh;
+        auto const& mesh = *sample.geometry;
         for (auto const& key : mesh.keys())
             ask(getDataGeoProperty(mesh, key), getRangeGeoPropIndices(mesh, key), getRangeGeoProperty(mesh, key),
                 getGeoPropTarget(mesh, *part(mesh, key.c_str())), getTargetComponent(mesh, key),
@@ -289,7 +252,7 @@ namespace {
     bool population(Sample const& sample)
     {
         using namespace Geometry;
-        auto copy = sample.mesh;
+        auto copy = sample.geometry;
         Nexil::MutablePtr<Object> own(std::move(copy));
         auto const change = [&](auto const& populate) { wholly([&] { return dump(*own); }, [&] { populate(*own); }); };
         change([](Object& o) { populatePlaneMesh(1, 2, o); });
@@ -302,18 +265,18 @@ namespace {
             change(*populate);
         change([](Object& o) { populateTag("point_component", array<bool>({true}), o); });
         change([](Object& o) { populateRangeGeoProperty(array<unsigned int>({0}), "face_component", o); });
-        return ask(taggedMesh(), someStrands());
+        return ask(facesAndStrands());
     }
 
     bool dumps(Sample const& sample)
     {
-        return ask(dump(*sample.mesh), dump(*sample.smallVolume, 2));
+        return ask(dump(*sample.geometry), dump(*sample.smallVolume, 2));
     }
 
     Objects allOf(Sample const& sample)
     {
         Objects objects;
-        for (auto const& object : {sample.mesh, sample.strands, sample.smallVolume, sample.wideVolume, sample.mesh})
+        for (auto const& object : {sample.geometry, sample.smallVolume, sample.wideVolume, sample.geometry})
             objects.push_back(object);
         return objects;
     }
@@ -337,21 +300,12 @@ namespace {
         return save(handles, 9);
     }
 
-    bool saveFile(Sample const& sample)
-    {
-        // Others may be writing theirs.
-        auto const name = sample.path + "." + std::to_string(std::hash<std::thread::id>()(std::this_thread::get_id()));
-        bool const isWritten = IO::serialize(allOf(sample), Nexil::String(std::string_view(name)), {}, nullptr);
-        std::remove(name.c_str());
-        return isWritten;
-    }
-
     bool load(std::string const& bytes, Sample const& sample)
     {
         IO::InputMemoryBuf buffer(bytes.data(), bytes.size());
         std::istream stream(&buffer);
         Nexil::InputStream input(stream);
-        Objects objects{sample.mesh};
+        Objects objects{sample.geometry};
         bool const isRead =
             wholly([&] { return objects.size(); }, [&] { return IO::deserialize(input, objects, {}, nullptr); });
         expect(isRead || objects.size() == 1);
@@ -366,9 +320,23 @@ namespace {
         return load(bytes, sample);
     }
 
-    bool loadFile(Sample const& sample)
+    /// A name for a file of this thread, which goes when this does.
+    struct TemporaryFile {
+        TemporaryFile()
+        {
+            auto const thread = std::to_string(std::hash<std::thread::id>()(std::this_thread::get_id()));
+            path = std::filesystem::temp_directory_path().string() + "/operations_" + thread + ".zon";
+        }
+        ~TemporaryFile() { std::remove(path.c_str()); }
+        std::string path;
+    };
+
+    bool saveAndLoadFile(Sample const& sample)
     {
-        Nexil::String const path(std::string_view(sample.path));
+        TemporaryFile const file;
+        Nexil::String const path(std::string_view(file.path));
+        if (!IO::serialize(allOf(sample), path, {}, nullptr))
+            return false;
         Objects objects;
         auto const header = createObject();
         IO::StreamLayout layout;
@@ -380,7 +348,7 @@ namespace {
 } // namespace
 
 Sample::Sample()
-    : mesh(taggedMesh()), strands(someStrands()), smallVolume(ball<VLD::TileTree3D::SmallTiles>()),
+    : geometry(facesAndStrands()), smallVolume(ball<VLD::TileTree3D::SmallTiles>()),
       wideVolume(ball<VLD::TileTree3D::WideTiles>())
 {
     stream = written(allOf(*this), 9);
@@ -394,33 +362,81 @@ std::string Sample::description() const
     return result;
 }
 
+std::vector<Operation> const& algorithms()
+{
+    using namespace GeometryAlgorithms;
+    using namespace Geometry::Mesh;
+    auto const vertexNormals = [](char const* name, bool byAngle, bool byArea) {
+        return filling<Math::float3>(
+            name,
+            [=](Object const& mesh, auto& out) { return computeMeshVertexNormals(mesh, byAngle, byArea, out), true; },
+            Takes::Anything);
+    };
+    static std::vector<Operation> const all{
+        filling<Math::float3>(
+            "face normals", [](Object const& mesh, auto& out) { return computeMeshFaceNormals(mesh, out), true; },
+            Takes::Anything),
+        vertexNormals("normals", false, false),
+        vertexNormals("normals by area", false, true),
+        vertexNormals("normals by angle", true, false),
+        vertexNormals("normals by both", true, true),
+        {"diagnose", [](Sample const& sample) { return !(diagnose(*sample.geometry) == Diagnostic{}); },
+         Takes::SmallCounts},
+        filling<FaceEdge, FaceEdge, unsigned int>(
+            "adjacency",
+            [](Object const& mesh, auto&... out) { return buildFaceVertexAdjacency(mesh, out..., nullptr); }),
+        filling<unsigned int, unsigned int>("normals topology",
+                                            [](Object const& mesh, auto& groups, auto& counts) {
+                                                computeMeshNormalsTopology(mesh, {}, 0.5f, groups, counts[0], nullptr);
+                                                return true;
+                                            }),
+        {"Euler", [](Sample const& sample) { return eulerCharacteristic(*sample.geometry) != 0; }, Takes::SmallCounts},
+        {"components", [](Sample const& sample) { return connectedComponents(*sample.geometry) != -1; },
+         Takes::SmallCounts},
+        {"Betti", [](Sample const& sample) { return bettiNumbers(*sample.geometry) != Math::int3{}; },
+         Takes::SmallCounts},
+        {"conversion",
+         [](Sample const& sample) {
+             bool ok = false;
+             (void)Geometry::pointsToFaces(*sample.geometry, {true}, Geometry::TagConversionStyle::AllElements, &ok);
+             return ok;
+         },
+         Takes::SmallCounts},
+        filling<Math::float3>(
+            "tangents", [](Object const& strands, auto& out) { return computeStrandTangents(strands, out, nullptr); }),
+        filling<float, float>("lengths", [](Object const& strands,
+                                            auto&... out) { return computeStrandLength(strands, out..., nullptr); }),
+        filling<float>("ratios",
+                       [](Object const& strands, auto& out) { return computeStrandRatio(strands, out, nullptr); })};
+    return all;
+}
+
 std::vector<Operation> const& operations()
 {
-    static std::vector<Operation> const all{
-        {"validate", validate, Takes::Anything},
-        {"normals", normals, Takes::Anything},
-        {"topology", topology, Takes::SmallCounts},
-        {"strand measures", strandMeasures, Takes::SmallCounts},
-        {"conversions", conversions, Takes::SmallCounts},
-        {"tags", tags, Takes::SmallCounts},
-        {"volume and object", volumeAndObject, Takes::Volumes},
-        {"volumes made", volumesMade},
-        {"proxies", proxies},
-        {"accessors", accessors, Takes::Anything},
-        {"population", population},
-        {"dumps", dumps, Takes::Anything},
-        {"save at level 0", [](Sample const& sample) { return save(allOf(sample), 0); }},
-        {"save at level 9", [](Sample const& sample) { return save(allOf(sample), 9); }},
-        {"save of handles", saveHandles},
-        {"save of a file", saveFile},
-        {"load", [](Sample const& sample) { return load(sample.stream, sample); }},
-        {"load of a file", loadFile},
-        {"load of version 1", loadCorpus<'1'>},
-        {"load of version 2", loadCorpus<'2'>},
-        {"load of version 3", loadCorpus<'3'>},
-        {"load of version 4", loadCorpus<'4'>},
-        {"load of version 5", loadCorpus<'5'>},
-    };
+    static std::vector<Operation> const all = [] {
+        std::vector<Operation> made = algorithms();
+        made.insert(made.end(), {{"validate", validate, Takes::Anything},
+                                 {"edges", edges, Takes::SmallCounts},
+                                 {"conversions", conversions, Takes::SmallCounts},
+                                 {"tags", tags, Takes::SmallCounts},
+                                 {"volume and object", volumeAndObject, Takes::Volumes},
+                                 {"volumes made", volumesMade},
+                                 {"proxies", proxies},
+                                 {"accessors", accessors, Takes::Anything},
+                                 {"population", population},
+                                 {"dumps", dumps, Takes::Anything},
+                                 {"save at level 0", [](Sample const& sample) { return save(allOf(sample), 0); }},
+                                 {"save at level 9", [](Sample const& sample) { return save(allOf(sample), 9); }},
+                                 {"save of handles", saveHandles},
+                                 {"load", [](Sample const& sample) { return load(sample.stream, sample); }},
+                                 {"a file", saveAndLoadFile},
+                                 {"load of version 1", loadCorpus<'1'>},
+                                 {"load of version 2", loadCorpus<'2'>},
+                                 {"load of version 3", loadCorpus<'3'>},
+                                 {"load of version 4", loadCorpus<'4'>},
+                                 {"load of version 5", loadCorpus<'5'>}});
+        return made;
+    }();
     return all;
 }
 

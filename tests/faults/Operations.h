@@ -15,22 +15,22 @@ namespace support {
 struct Sample {
     Sample();
 
-    /// A small mesh with selections of all its components and values shared out by a range.
-    Nexil::Ptr<Veldrin::Object> mesh;
-    Nexil::Ptr<Veldrin::Object> strands;
+    /// Faces and strands over a few points, with selections of all components and values shared out by a range.
+    Nexil::Ptr<Veldrin::Object> geometry;
+    /// For so many elements the arrays have room that algorithms are to fill.
+    std::uint64_t room = 0;
     /// Level sets of a small ball as geometry, in both configurations.
     Nexil::Ptr<Veldrin::Object> smallVolume;
     Nexil::Ptr<Veldrin::Object> wideVolume;
-    /// All of them as a stream, and as a file.
+    /// All of them as a stream.
     std::string stream;
-    std::string path;
 
     /// Everything that can be seen of it.
     [[nodiscard]] std::string description() const;
 };
 
-/// What an operation may be run on besides a sample as it was made: any volumes, a mesh and strands of any numbers at all, or
-/// of element counts that are not huge, where outputs are as large as these say.
+/// What an operation may be run on besides a sample as it was made: any volumes, a geometry of any numbers at all, or of
+/// element counts that are not huge, where outputs are as large as these say.
 enum class Takes { Sample, Volumes, SmallCounts, Anything };
 
 struct Operation {
@@ -42,6 +42,11 @@ struct Operation {
     Takes takes = Takes::Sample;
 };
 
+/// Those that go over all elements of a mesh or of strands, one function each. What finds no whole geometry to work on is no
+/// success.
+[[nodiscard]] std::vector<Operation> const& algorithms();
+
+/// All, the algorithms first.
 [[nodiscard]] std::vector<Operation> const& operations();
 
 } // namespace support

@@ -84,7 +84,7 @@ int failEachOperation(std::string const& bytes, Attempt const& attempt)
 Objects objectsOf(Sample const& sample)
 {
     Objects objects;
-    for (auto const& object : {sample.mesh, sample.strands, sample.smallVolume, sample.mesh})
+    for (auto const& object : {sample.geometry, sample.smallVolume, sample.geometry})
         objects.push_back(object);
     // Arrays so long that they are read past the window, by seeking.
     objects.push_back(support::filled([](Object& o) { Geometry::populatePlaneMesh(1, 70, o); }));

@@ -1,9 +1,9 @@
 #include <nexil/parallel/Parallel.h>
+#include <support/Cancellation.h>
 #include <support/Threads.h>
 
 #include <gmock/gmock.h>
 
-#include <atomic>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -11,17 +11,6 @@
 namespace {
 
 namespace parallel = Nexil::parallel;
-
-/// Cancels the running job for as long as it lives, from the question after `count` further ones on.
-struct CancelAfter {
-    explicit CancelAfter(int count)
-    {
-        questionsLeft = count;
-        Nexil::setJobCancelHook([] { return questionsLeft-- <= 0; });
-    }
-    ~CancelAfter() { Nexil::setJobCancelHook(nullptr); }
-    static inline std::atomic<int> questionsLeft = 0;
-};
 
 /// What [begin, end) gives when it is halved down to ranges of 10: each join in brackets, with the indices in order.
 std::string joinsOf(std::size_t begin, std::size_t end)
@@ -58,7 +47,7 @@ TEST(Parallel, ExceptionsAndCancellationLeaveTheCall)
     support::onThreadCounts([&] {
         for (std::size_t const count : {std::size_t(5), std::size_t(1000)}) {
             for (int const questionCount : {0, count == 5 ? 0 : 3}) {
-                CancelAfter const cancel(questionCount);
+                support::CancelAfter const cancel(questionCount);
                 EXPECT_THAT([&] { loop(count); }, isCancellation);
                 EXPECT_THAT([&] { reduce(count); }, isCancellation);
                 EXPECT_NO_THROW(parallel::forRangeToTheEnd(count, 10, [](std::size_t, std::size_t) {}));

@@ -31,19 +31,33 @@ Nexil::Ptr<Nexil::Array<T>> array(std::vector<T> const& values)
     }
 }
 
-using Polygons = std::vector<std::vector<unsigned int>>;
+using Indices = std::vector<unsigned int>;
+using Polygons = std::vector<Indices>;
+
+inline Nexil::MutablePtr<Veldrin::Object> mesh(std::vector<Veldrin::Math::float3> const& points, Indices const& corners,
+                                               Indices const& offsets)
+{
+    auto made = Veldrin::createObject();
+    Veldrin::Geometry::populateMesh(array(points), array(corners), array(offsets), *made);
+    return made;
+}
 
 /// A mesh with these corners per face.
 inline Nexil::MutablePtr<Veldrin::Object> mesh(std::vector<Veldrin::Math::float3> const& points, Polygons const& faces)
 {
-    std::vector<unsigned int> corners;
-    std::vector<unsigned int> offsets{0};
+    Indices corners, offsets{0};
     for (auto const& face : faces) {
         corners.insert(corners.end(), face.begin(), face.end());
         offsets.push_back(static_cast<unsigned int>(corners.size()));
     }
+    return mesh(points, corners, offsets);
+}
+
+inline Nexil::MutablePtr<Veldrin::Object> strands(std::vector<Veldrin::Math::float3> const& points,
+                                                  Indices const& offsets)
+{
     auto made = Veldrin::createObject();
-    Veldrin::Geometry::populateMesh(array(points), array(corners), array(offsets), *made);
+    Veldrin::Geometry::populateStrand(array(points), array(offsets), *made);
     return made;
 }
 

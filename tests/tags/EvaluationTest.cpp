@@ -4,8 +4,6 @@
 #include <veldrin/tags/TagData.h>
 #include <veldrin/tags/TagResolver.h>
 
-#include <nexil/JobCancel.h>
-
 #include <gtest/gtest.h>
 
 #include <random>
@@ -110,24 +108,6 @@ TEST(TagEvaluation, ASingleTagIsHandedOutAsItIsStored)
         EXPECT_TRUE(resolver.parses(text));
         EXPECT_EQ(resolver.resolve(*geometry, component), support::arrayIn<bool>(*geometry, "a")) << text;
     }
-}
-
-TEST(TagEvaluation, ACancelledJobEndsConversionsAndChangesNothing)
-{
-    auto const geometry =
-        TagSample{3, {{0, 1, 2}}, {}, {{"p", "point_component", "101"}, {"f", "face_component", "1"}}}.build();
-    Nexil::setJobCancelHook([] { return true; });
-    for (char const* text : {"v(f)", "(f + p) ^ (p + f) - !v(f)"}) {
-        TagResolver resolver;
-        EXPECT_TRUE(resolver.parses(text));
-        Nexil::String component = "unset";
-        EXPECT_THROW((void)resolver.resolve(*geometry, component), std::runtime_error) << text;
-        EXPECT_EQ(component, "unset");
-    }
-    // Without conversions there is nothing to cut short.
-    EXPECT_EQ(answerTo("!p + p*", *geometry), "point_component 111");
-    Nexil::setJobCancelHook(nullptr);
-    EXPECT_EQ(answerTo("v(f) - p", *geometry), "point_component 010");
 }
 
 TEST(TagEvaluation, PatternsMatchAsTheRegularExpressionDoes)

@@ -17,12 +17,10 @@ Nexil::MutablePtr<Object> TagSample::build() const
     else
         object = support::mesh(std::vector<Math::float3>(pointCount), faces);
     if (!strandSizes.empty()) {
-        std::vector<unsigned int> offsets{0};
+        support::Indices offsets{0};
         for (auto const size : strandSizes)
             offsets.push_back(offsets.back() + size);
-        auto const strands = support::filled([&](Object& made) {
-            populateStrand(support::array(std::vector<Math::float3>(offsets.back())), support::array(offsets), made);
-        });
+        auto const strands = support::strands(std::vector<Math::float3>(offsets.back()), offsets);
         for (auto const* name : {sStrandComp, sStrandOffset})
             setProperty(*object, name, support::part(*strands, name));
     }
@@ -34,4 +32,18 @@ Nexil::MutablePtr<Object> TagSample::build() const
         }));
     }
     return object;
+}
+
+TagSample const& taggedCube()
+{
+    static TagSample const sample{8,
+                                  {{0, 1, 2, 3}, {4, 7, 6, 5}, {2, 6, 7, 3}, {0, 4, 5, 1}, {4, 0, 3, 7}, {1, 5, 6, 2}},
+                                  {3, 0, 5},
+                                  {{"a", "point_component", "01101101"},
+                                   {"b", "face_component", "100101"},
+                                   {"c", "face_vertex_component", "100100100110111001011001"},
+                                   {"d", "strand_component", "101"},
+                                   {"ab", "point_component", "110"},
+                                   {"a.b", "other", "01"}}};
+    return sample;
 }

@@ -22,6 +22,10 @@ struct TagSample {
     [[nodiscard]] Nexil::MutablePtr<Veldrin::Object> build() const;
 };
 
+/// A cube, its points shared out among three strands, with tags of one letter, of all components, one too short and one of
+/// none.
+[[nodiscard]] TagSample const& taggedCube();
+
 using MaskPtr = Nexil::Ptr<Nexil::Array<bool>>;
 
 inline MaskPtr maskOf(std::string const& flags)

@@ -4,11 +4,24 @@
 
 #include <veldrin/geometry/Names.h>
 
+#include <functional>
+
 /// Changes to geometry that no population function would make.
 namespace support {
 
 using Veldrin::Geometry::kInvalidIndex;
-using Indices = std::vector<unsigned int>;
+using Change = std::function<void(Veldrin::Object&)>;
+
+inline Change without(char const* name)
+{
+    return [=](Veldrin::Object& o) { o.eraseProperty(name); };
+}
+
+/// Another count of a component, whatever there is of its elements.
+inline Change count(char const* component, unsigned int number)
+{
+    return [=](Veldrin::Object& o) { Veldrin::Geometry::setElementCount(component, number, o); };
+}
 
 /// Replaces a field of the object under `name`, or adds it.
 template <class T>

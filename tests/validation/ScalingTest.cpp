@@ -1,8 +1,6 @@
 #include "Edits.h"
 
-#include <nexil/JobCancel.h>
 #include <veldrin/validation/GeoValidator.h>
-#include <veldrin/validation/MeshValidator.h>
 
 #include <gtest/gtest.h>
 
@@ -57,14 +55,6 @@ TEST(Validation, ReadsAnArrayOnceHoweverManyPropertiesShareIt)
         addData(*object, ("e" + number).c_str(), ("r" + number).c_str(), {1});
     }
     EXPECT_EQ(verdict(Geometry::GeoValidator(), *object), "");
-}
-
-TEST(Validation, StopsWhenTheJobIsCancelled)
-{
-    auto const object = filled([](Object& mesh) { Geometry::populatePlaneMesh(1, 10, mesh); });
-    Nexil::setJobCancelHook([] { return true; });
-    EXPECT_THROW((void)Geometry::validateMesh(*object), std::runtime_error);
-    Nexil::setJobCancelHook(nullptr);
 }
 
 } // namespace

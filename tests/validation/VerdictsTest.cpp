@@ -36,8 +36,6 @@ Nexil::MutablePtr<Object> twoTriangles()
     return support::mesh({{0, 0, 0}, {1, 0, 0}, {0, 1, 0}, {1, 1, 0}}, {{0, 1, 2}, {2, 1, 3}});
 }
 
-using Change = std::function<void(Object&)>;
-
 Change indices(char const* name, Indices const& values)
 {
     return [=](Object& o) { setIndices(o, name, values); };
@@ -46,11 +44,6 @@ Change indices(char const* name, Indices const& values)
 Change noIndices(char const* name)
 {
     return [=](Object& o) { setField(o, name, "data", Nexil::Ptr<Nexil::Array<unsigned int>>()); };
-}
-
-Change count(char const* component, unsigned int number)
-{
-    return [=](Object& o) { setField(o, component, "count", number); };
 }
 
 /// What the populate function makes in its place.
@@ -68,11 +61,6 @@ Change noFaces(Indices const& offsets)
         Geometry::populateMesh(o);
         setIndices(o, "face_offset", offsets);
     });
-}
-
-Change without(char const* name)
-{
-    return [=](Object& o) { o.eraseProperty(name); };
 }
 
 /// Data over component "c" of three elements.
