@@ -156,24 +156,32 @@ namespace {
                                             TagConversionStyle::AnyElement, &ok));
     }
 
-    bool volumeAndObject(Sample const& sample)
+    bool volumeToObject(Sample const& sample)
+    {
+        for (auto const& object : {sample.smallVolume, sample.wideVolume}) {
+            auto volume = VLD::createObject();
+            volume->addComponent(Geometry::getVldTopologyFromProxy(part(*object, "voxel_component")));
+            volume->addComponent(Geometry::getVldContainerFromProxy(part(*object, "voxel_tile_tree")));
+            volume->addComponent(Geometry::getVldChannelFromProxy(part(*object, "voxel_signed_distance")));
+            auto const made = wholly([&] { return volume->componentCount(); },
+                                     [&] { return Geometry::move_vld_volume_to_object(*volume); });
+            expect(made && volume->componentCount() == (made->empty() ? 3u : 0u));
+            if (made->empty())
+                return false;
+        }
+        return true;
+    }
+
+    bool objectToVolume(Sample const& sample)
     {
         for (auto const& object : {sample.smallVolume, sample.wideVolume}) {
             auto const shared = Geometry::shallow_copy_object_to_vld_volume(*object);
-            if (!shared || !Geometry::validUpdatedVolume(*shared))
-                return false;
-            VLD::Object volume = *shared;
-            auto const components = volume.componentRange();
-            auto const made = wholly([&] { return volume.componentRange(); },
-                                     [&] { return Geometry::move_vld_volume_to_object(volume); });
-            // What was not converted stays where it was.
-            expect(made && (made->empty() ? volume.componentRange() == components : volume.empty()));
             Object copy = *object;
-            auto const back =
+            auto const moved =
                 wholly([&] { return copy.size(); }, [&] { return Geometry::move_object_to_vld_volume(copy); });
             Math::bbox<Math::float3, float> box;
             wholly([&] { return box; }, [&] { GeometryAlgorithms::getVolumeBounds(*object, box); });
-            if (!back)
+            if (!shared || !Geometry::validUpdatedVolume(*shared) || !moved)
                 return false;
             (void)Geometry::move_object_to_vld_volume_const(copy);
         }
@@ -199,9 +207,6 @@ namespace {
     bool proxies(Sample const& sample)
     {
         for (auto const& volume : {sample.smallVolume, sample.wideVolume}) {
-            ask(Geometry::getVldTopologyFromProxy(part(*volume, "voxel_component"))->name(),
-                Geometry::getVldContainerFromProxy(part(*volume, "voxel_tile_tree"))->name(),
-                Geometry::getVldChannelFromProxy(part(*volume, "voxel_signed_distance"))->name());
             for (auto const& name : volume->keys()) {
                 auto const proxy = part(*volume, name.c_str());
                 Nexil::Ptr<Object> copy = proxy;
@@ -419,7 +424,8 @@ std::vector<Operation> const& operations()
                                  {"edges", edges, Takes::SmallCounts},
                                  {"conversions", conversions, Takes::SmallCounts},
                                  {"tags", tags, Takes::SmallCounts},
-                                 {"volume and object", volumeAndObject, Takes::Volumes},
+                                 {"volume to object", volumeToObject},
+                                 {"object to volume", objectToVolume, Takes::Volumes},
                                  {"volumes made", volumesMade},
                                  {"proxies", proxies},
                                  {"accessors", accessors, Takes::Anything},
