@@ -64,7 +64,7 @@ TEST(HostileStream, NoBeginningAndNoFlippedByteIsReadAsSomethingElse)
                 auto const result = support::read(flipped);
                 // A refusal says why in one message, or nothing when the version reads as 0.
                 EXPECT_LE(result.errors.size(), result.isRead ? 0u : 1u) << flip;
-                EXPECT_EQ(support::describeObjects(result.objects), result.isRead ? original : "]}\n") << flip;
+                EXPECT_EQ(support::describeObjects(result.objects), result.isRead ? original : "[]") << flip;
             }
         }
     }

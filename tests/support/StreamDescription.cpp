@@ -7,11 +7,10 @@
 #include <veldrin/math/FCurve.h>
 #include <veldrin/volume/VldProxyDescription.h>
 
+#include <nlohmann/json.hpp>
 #include <xxhash.h>
 
-#include <cstdio>
 #include <string>
-#include <string_view>
 #include <type_traits>
 #include <typeindex>
 #include <unordered_map>
@@ -22,149 +21,144 @@ namespace {
 
     using Veldrin::Geometry::Common::GeoLocation;
     using FCurve = Veldrin::Math::FCurve;
+    using nlohmann::json;
     using ObjectPtr = Nexil::Ptr<Veldrin::Object>;
     template <class T>
     using ArrayPtr = Nexil::Ptr<Nexil::Array<T>>;
 
     std::string hex(void const* bytes, std::size_t count)
     {
-        std::string text = "\"";
+        constexpr char kDigits[] = "0123456789abcdef";
+        std::string text;
         for (std::size_t i = 0; i < count; ++i) {
-            char digits[3];
-            std::snprintf(digits, sizeof(digits), "%02x", static_cast<unsigned char const*>(bytes)[i]);
-            text += digits;
+            auto const byte = static_cast<unsigned char const*>(bytes)[i];
+            text += {kDigits[byte >> 4], kDigits[byte & 15]};
         }
-        return text + '"';
-    }
-
-    std::string quoted(std::string_view raw)
-    {
-        std::string text = "\"";
-        for (char const c : raw) {
-            if (c >= 32 && c < 127 && c != '"' && c != '\\')
-                text += c;
-            else
-                text += "\\u00" + hex(&c, 1).substr(1, 2);
-        }
-        return text + '"';
+        return text;
     }
 
     template <class Elements, class One>
-    std::string listed(Elements const& elements, One const& one)
+    json listed(Elements const& elements, One const& one)
     {
-        std::string text;
+        json list = json::array();
         for (auto const& element : elements)
-            text += (text.empty() ? "" : ",") + one(element);
-        return "[" + text + "]";
+            list.push_back(one(element));
+        return list;
     }
 
     /// One describer numbers what it meets, so it describes one set of objects.
     class StreamDescriber {
     public:
-        std::string describe(Nexil::Array<ObjectPtr> const& objects)
+        json value(ObjectPtr const& held)
         {
-            std::string text;
-            for (auto const& object : objects)
-                text += (text.empty() ? "" : ",\n") + value(object);
-            return text + (text.empty() ? "]}\n" : "\n]}\n");
+            return shared(held, [&](json& description) {
+                Veldrin::Object const& content = contentOf(*held);
+                if (&content != held.get())
+                    description["proxy"] = true;
+                description["properties"] = listed(content.keys(), [&](Nexil::String const& key) {
+                    Nexil::Any const property = content.getProperty(key);
+                    json const frame = value(property);
+                    return property.empty() ? json{value(key), nullptr, nullptr} : json{value(key), frame[0], frame[1]};
+                });
+            });
         }
 
     private:
         struct Type {
             unsigned int code;
-            std::string (*describe)(StreamDescriber&, Nexil::Any const&);
+            json (*describe)(StreamDescriber&, Nexil::Any const&);
         };
 
         template <class T>
             requires std::is_trivially_copyable_v<T>
-        std::string value(T const& held)
+        json value(T const& held)
         {
-            if constexpr (std::is_same_v<T, bool>)
-                return held ? "true" : "false";
-            else if constexpr (std::is_integral_v<T> || std::is_enum_v<T>)
-                return std::to_string(static_cast<std::conditional_t<std::is_enum_v<T>, unsigned int, T>>(held));
+            if constexpr (std::is_integral_v<T>)
+                return held;
+            else if constexpr (std::is_enum_v<T>)
+                return static_cast<unsigned int>(held);
             else
                 return hex(&held, sizeof(held));
         }
 
-        std::string value(Nexil::String const& text) { return quoted(text.view()); }
-
-        std::string value(Nexil::Ptr<FCurve> const& curve)
+        /// One character for each byte.
+        json value(Nexil::String const& bytes)
         {
-            if (!curve)
-                return "null";
-            auto const tangent = [&](FCurve::Tangent const& t) {
-                return "[" + value(t.time) + "," + value(t.value) + "]";
-            };
-            auto const key = [&](FCurve::Key const& k) {
-                return "[" + value(k.time) + "," + value(k.value) + "," + tangent(k.in) + "," + tangent(k.out) + "," +
-                       value(k.interpolation) + "]";
-            };
-            return "{\"pre\":" + value(curve->preExtrapolation()) + ",\"post\":" + value(curve->postExtrapolation()) +
-                   ",\"keys\":" + listed(curve->keys(), key) + "}";
+            std::string text;
+            for (char const byte : bytes.view()) {
+                auto const code = static_cast<unsigned char>(byte);
+                if (code < 0x80)
+                    text += byte;
+                else
+                    text += {static_cast<char>(0xC0 | code >> 6), static_cast<char>(0x80 | (code & 0x3F))};
+            }
+            return text;
         }
 
-        std::string value(GeoLocation const& held)
+        json value(Nexil::Ptr<FCurve> const& curve)
         {
-            auto const each = [this](auto part) { return value(part); };
-            std::string const ids = listed(held.ids, each);
-            std::string const params = listed(held.params, each);
-            std::string const indices = value(held.indices);
-            return ids.substr(0, ids.size() - 1) + "," + params.substr(1, params.size() - 2) + "," + indices + "," +
-                   value(held.weights) + "]";
+            if (!curve)
+                return nullptr;
+            auto const tangent = [&](FCurve::Tangent const& t) { return json{value(t.time), value(t.value)}; };
+            auto const key = [&](FCurve::Key const& k) {
+                return json{value(k.time), value(k.value), tangent(k.in), tangent(k.out), value(k.interpolation)};
+            };
+            return {{"pre", value(curve->preExtrapolation())},
+                    {"post", value(curve->postExtrapolation())},
+                    {"keys", listed(curve->keys(), key)}};
+        }
+
+        json value(GeoLocation const& held)
+        {
+            json list = listed(held.ids, [this](unsigned int id) { return value(id); });
+            for (float const parameter : held.params)
+                list.push_back(value(parameter));
+            list.push_back(value(held.indices));
+            list.push_back(value(held.weights));
+            return list;
         }
 
         /// With the code of its type.
-        std::string value(Nexil::Any const& held)
+        json value(Nexil::Any const& held)
         {
             if (held.empty())
-                return "null";
+                return nullptr;
             auto const type = types().find(std::type_index(*held.type().info()));
-            return type == types().end()
-                       ? "[-1,\"unknown\"]"
-                       : "[" + std::to_string(type->second.code) + "," + type->second.describe(*this, held) + "]";
+            return type == types().end() ? json{-1, "unknown"}
+                                         : json{type->second.code, type->second.describe(*this, held)};
         }
 
         template <class T>
-        std::string value(ArrayPtr<T> const& array)
+        json value(ArrayPtr<T> const& array)
         {
-            return shared(array, [&] {
-                std::string const content = "\"count\":" + std::to_string(array->size()) + ",";
+            return shared(array, [&](json& description) {
+                description["count"] = array->size();
                 if constexpr (std::is_trivially_copyable_v<T> && !std::is_enum_v<T>) {
                     std::size_t const size = array->size() * sizeof(T);
-                    if (size <= 64)
-                        return content + "\"bytes\":" + hex(array->data(), size);
                     XXH64_canonical_t hash;
                     XXH64_canonicalFromHash(&hash, XXH3_64bits(array->data(), size));
-                    return content + "\"xxh3\":" + hex(hash.digest, sizeof(hash.digest));
+                    if (size <= 64)
+                        description["bytes"] = hex(array->data(), size);
+                    else
+                        description["xxh3"] = hex(hash.digest, sizeof(hash.digest));
                 } else {
-                    return content + "\"elements\":" + listed(*array, [this](T const& part) { return value(part); });
+                    description["elements"] = listed(*array, [this](T const& part) { return value(part); });
                 }
             });
         }
 
-        std::string value(ObjectPtr const& held)
-        {
-            return shared(held, [&] {
-                Veldrin::Object const& content = contentOf(*held);
-                std::string const lead = &content == held.get() ? "" : "\"proxy\":true,";
-                return lead + "\"properties\":" + listed(content.keys(), [&](Nexil::String const& key) {
-                           Nexil::Any const property = content.getProperty(key);
-                           std::string const frame = value(property);
-                           return "[" + value(key) + "," + (property.empty() ? "null,null]" : frame.substr(1));
-                       });
-            });
-        }
-
         /// A shared value: described where it is met first, by its number where it is met again.
-        template <class Pointer, class Content>
-        std::string shared(Pointer const& held, Content const& content)
+        template <class Pointer, class Describe>
+        json shared(Pointer const& held, Describe const& describe)
         {
             if (!held)
-                return "null";
+                return nullptr;
             auto const [place, isNew] = numbers_.try_emplace(held.get(), numbers_.size());
-            std::string const number = std::to_string(place->second);
-            return isNew ? "{\"id\":" + number + "," + content() + "}" : "{\"ref\":" + number + "}";
+            if (!isNew)
+                return {{"ref", place->second}};
+            json description{{"id", place->second}};
+            describe(description);
+            return description;
         }
 
         /// The object itself, or what a file holds for a proxy of a volume.
@@ -215,7 +209,8 @@ namespace {
 
 std::string describeObjects(Nexil::Array<Nexil::Ptr<Veldrin::Object>> const& objects)
 {
-    return StreamDescriber().describe(objects);
+    StreamDescriber describer;
+    return listed(objects, [&](ObjectPtr const& object) { return describer.value(object); }).dump();
 }
 
 } // namespace support

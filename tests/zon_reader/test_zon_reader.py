@@ -1,4 +1,5 @@
 """The second reader against the kept streams: good ones give what stands beside them, bad ones their message."""
+import json
 import pathlib
 import re
 import unittest
@@ -22,7 +23,9 @@ class ZonReader(unittest.TestCase):
         self.assertGreater(len(files), 30)
         for file in files:
             with self.subTest(file.name):
-                self.assertEqual(describe(Stream(file.read_bytes())), file.with_suffix(".json").read_text())
+                kept = json.loads(file.with_suffix(".json").read_text())
+                # As text, in which 1 is not true.
+                self.assertEqual(json.dumps(describe(Stream(file.read_bytes()))), json.dumps(kept))
 
     def test_bad_streams_are_refused_with_their_message(self):
         rows = [line.split("\t") for line in (STREAMS / "bad/expected.tsv").read_text().splitlines()]
