@@ -3,6 +3,7 @@
 #include <nexil/parallel/Parallel.h>
 #include <veldrin/algorithms/internal/FaceOrderSums.h>
 #include <veldrin/algorithms/internal/PendingOutput.h>
+#include <veldrin/algorithms/internal/VectorClones.h>
 
 #include <algorithm>
 #include <array>
@@ -16,7 +17,7 @@ namespace {
     } // namespace grain
 
     /// Scales each sum to length 1, a block at a time.
-    void normalize(Math::float3* sums, std::size_t count) noexcept
+    VELDRIN_VECTOR_CLONES void normalize(Math::float3* sums, std::size_t count) noexcept
     {
         std::array<float, kBlockSize> x, y, z;
         for (std::size_t begin = 0; begin < count; begin += kBlockSize) {

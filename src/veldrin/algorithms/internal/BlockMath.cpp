@@ -1,5 +1,7 @@
 #include <veldrin/algorithms/internal/BlockMath.h>
 
+#include <veldrin/algorithms/internal/VectorClones.h>
+
 #include <algorithm>
 #include <cmath>
 #include <limits>
@@ -15,7 +17,8 @@ namespace {
 } // namespace
 
 template <unsigned int N>
-void fanVectors(CornerBlock<N> const& corners, float* __restrict x, float* __restrict y, float* __restrict z) noexcept
+VELDRIN_VECTOR_CLONES void fanVectors(CornerBlock<N> const& corners, float* __restrict x, float* __restrict y,
+                                      float* __restrict z) noexcept
 {
     for (std::size_t i = 0; i < kBlockSize; ++i) {
         float const originX = corners.x[0][i];
@@ -45,8 +48,8 @@ void fanVectors(CornerBlock<N> const& corners, float* __restrict x, float* __res
 }
 
 template <unsigned int N>
-void newellVectors(CornerBlock<N> const& corners, float* __restrict x, float* __restrict y,
-                   float* __restrict z) noexcept
+VELDRIN_VECTOR_CLONES void newellVectors(CornerBlock<N> const& corners, float* __restrict x, float* __restrict y,
+                                         float* __restrict z) noexcept
 {
     for (std::size_t i = 0; i < kBlockSize; ++i) {
         float sumX = 0;
@@ -69,7 +72,8 @@ template void fanVectors(CornerBlock<4> const&, float*, float*, float*) noexcept
 template void newellVectors(CornerBlock<3> const&, float*, float*, float*) noexcept;
 template void newellVectors(CornerBlock<4> const&, float*, float*, float*) noexcept;
 
-void unitsOrFallback(float* __restrict x, float* __restrict y, float* __restrict z, std::size_t count) noexcept
+VELDRIN_VECTOR_CLONES void unitsOrFallback(float* __restrict x, float* __restrict y, float* __restrict z,
+                                           std::size_t count) noexcept
 {
     for (std::size_t i = 0; i < count; ++i) {
         float const length = std::sqrt(x[i] * x[i] + y[i] * y[i] + z[i] * z[i]);
@@ -81,7 +85,8 @@ void unitsOrFallback(float* __restrict x, float* __restrict y, float* __restrict
     }
 }
 
-void unitsOrSelf(float* __restrict x, float* __restrict y, float* __restrict z, std::size_t count) noexcept
+VELDRIN_VECTOR_CLONES void unitsOrSelf(float* __restrict x, float* __restrict y, float* __restrict z,
+                                       std::size_t count) noexcept
 {
     for (std::size_t i = 0; i < count; ++i) {
         float const length = std::sqrt(x[i] * x[i] + y[i] * y[i] + z[i] * z[i]);
@@ -92,8 +97,9 @@ void unitsOrSelf(float* __restrict x, float* __restrict y, float* __restrict z, 
     }
 }
 
-void scaleByHalfLength(float* __restrict x, float* __restrict y, float* __restrict z, float const* __restrict u,
-                       float const* __restrict v, float const* __restrict w, std::size_t count) noexcept
+VELDRIN_VECTOR_CLONES void scaleByHalfLength(float* __restrict x, float* __restrict y, float* __restrict z,
+                                             float const* __restrict u, float const* __restrict v,
+                                             float const* __restrict w, std::size_t count) noexcept
 {
     for (std::size_t i = 0; i < count; ++i) {
         float const half = 0.5f * std::sqrt(u[i] * u[i] + v[i] * v[i] + w[i] * w[i]);
@@ -103,7 +109,7 @@ void scaleByHalfLength(float* __restrict x, float* __restrict y, float* __restri
     }
 }
 
-void arcCosines(float* values, std::size_t count) noexcept
+VELDRIN_VECTOR_CLONES void arcCosines(float* values, std::size_t count) noexcept
 {
     for (std::size_t i = 0; i < count; ++i) {
         float const cosine = std::min(std::max(values[i], -1.0f), 1.0f);
@@ -127,7 +133,7 @@ void arcCosines(float* values, std::size_t count) noexcept
 }
 
 template <unsigned int N>
-void cornerAngles(CornerBlock<N> const& corners, float (&angles)[N][kBlockSize]) noexcept
+VELDRIN_VECTOR_CLONES void cornerAngles(CornerBlock<N> const& corners, float (&angles)[N][kBlockSize]) noexcept
 {
     // Edge k leads from corner k to the next.
     CornerBlock<N> edges;

@@ -5,17 +5,22 @@
 #include <nexil/parallel/Parallel.h>
 #include <veldrin/algorithms/internal/FaceContributions.h>
 #include <veldrin/algorithms/internal/MeshOrder.h>
-#include <veldrin/algorithms/internal/PointOwners.h>
+#include <veldrin/algorithms/internal/PointClaims.h>
 
 #include <algorithm>
+#include <cstring>
 #include <utility>
 
 namespace Veldrin::GeometryAlgorithms {
 
+/// x and y at once: two reads and two writes, of which each later one finds the earlier of its own width.
 [[gnu::always_inline]] inline void addTo(Math::float3& sum, Math::float3 const& value) noexcept
 {
-    sum.x += value.x;
-    sum.y += value.y;
+    using Pair [[gnu::vector_size(8)]] = float;
+    Pair xy;
+    std::memcpy(&xy, &sum.x, sizeof(xy));
+    xy += Pair{value.x, value.y};
+    std::memcpy(&sum.x, &xy, sizeof(xy));
     sum.z += value.z;
 }
 
@@ -36,18 +41,14 @@ public:
         Worker worker(positions_, faces_.points(), ranges_);
         for (std::uint64_t begin = 0; begin < faces_.faceCount(); begin += kChunkFaces) {
             Nexil::Internal::throwIfJobCancelled();
-            worker.forEachCorner(begin, std::min<std::uint64_t>(begin + kChunkFaces, faces_.faceCount()),
-                                 [&](unsigned int point, Math::float3 const& value) { addTo(sums_[point], value); });
+            add(worker, begin, std::min<std::uint64_t>(begin + kChunkFaces, faces_.faceCount()));
         }
     }
 
     void addInParallel(std::size_t threadCount)
     {
-        if (Geometry::judgeOrder(faces_).isLocal) {
-            PointOwners const owners(faces_, std::min(threadCount, PointOwners::kMostParts));
-            if (owners.areMostlyApart())
-                return addByParts(owners);
-        }
+        if (Geometry::judgeOrder(faces_).isLocal && addByParts(std::min(threadCount, PointClaims::kMostParts)))
+            return;
         if (faces_.pointCount() > kMostNearPoints && threadCount > kMostTakingTurns)
             return addByStripes(threadCount);
         addInTurns();
@@ -56,7 +57,6 @@ public:
 private:
     static constexpr std::uint64_t kChunkFaces = 4096;
     static constexpr std::size_t kKeptGrain = 1024;
-    static constexpr std::size_t kPointGrain = 1024;
     /// Sums of so many points lie in a cache near the thread that adds, so adding takes less time than what it adds.
     static constexpr std::uint64_t kMostNearPoints = 131072;
     /// So many threads have enough to do with what one of them adds.
@@ -64,36 +64,39 @@ private:
 
     using Worker = FaceContributions<isAngleWeighted, isAreaWeighted, Ranges>;
 
-    void clear()
+    /// Each thread adds to points that it has claimed for its part of the faces; those where parts meet follow. False, and
+    /// nothing to be relied on, where parts meet at many points.
+    [[nodiscard]] bool addByParts(std::size_t partCount)
     {
-        Nexil::parallel::forRange(faces_.pointCount(), kPointGrain, [&](std::size_t begin, std::size_t end) {
-            std::fill(sums_ + begin, sums_ + end, Math::float3{});
-        });
-    }
-
-    /// Each thread adds to the points of its own part of the faces; the rest follows.
-    void addByParts(PointOwners const& owners)
-    {
-        clear();
-        Nexil::parallel::forRange(owners.partCount(), 1, [&](std::size_t firstPart, std::size_t endPart) {
+        PointClaims claims(faces_, partCount);
+        auto const clear = [sums = sums_](std::uint64_t first, std::uint64_t count) {
+            std::fill_n(sums + first, count, Math::float3{});
+        };
+        Nexil::parallel::forRange(claims.partCount(), 1, [&](std::size_t firstPart, std::size_t endPart) {
             Worker worker(positions_, faces_.points(), ranges_);
             for (std::size_t part = firstPart; part < endPart; ++part)
-                owners.forEachChunk(part, [&](std::uint64_t begin, std::uint64_t end) {
+                claims.forEachChunk(part, [&](std::uint64_t begin, std::uint64_t end) {
                     // The plain loop is half again as fast as one that asks at every corner.
-                    if (owners.isOwnChunk(begin))
-                        worker.forEachCorner(begin, end, [&](unsigned int point, Math::float3 const& value) {
-                            addTo(sums_[point], value);
-                        });
+                    if (claims.claim(part, begin, end, clear))
+                        add(worker, begin, end);
                     else
-                        addWhere(worker, begin, end, [&](unsigned int point) { return owners.owns(part, point); });
+                        addWhere(worker, begin, end, [&](unsigned int point) { return claims.owns(part, point); });
                 });
         });
+        if (claims.areTooManyShared())
+            return false;
+        claims.clearRest(clear);
         Worker worker(positions_, faces_.points(), ranges_);
-        for (std::size_t part = 1; part < owners.partCount(); ++part)
-            owners.forEachChunk(part, [&](std::uint64_t begin, std::uint64_t end) {
-                if (!owners.isOwnChunk(begin))
-                    addWhere(worker, begin, end, [&](unsigned int point) { return !owners.owns(part, point); });
-            });
+        claims.forEachSharingBlock([&](std::uint64_t begin, std::uint64_t end) {
+            addWhere(worker, begin, end, [&](unsigned int point) { return claims.isShared(point); });
+        });
+        return true;
+    }
+
+    [[gnu::always_inline]] void add(Worker& worker, std::uint64_t begin, std::uint64_t end)
+    {
+        worker.forEachCorner(
+            begin, end, [sums = sums_](unsigned int point, Math::float3 const& value) { addTo(sums[point], value); });
     }
 
     template <class Holds>
