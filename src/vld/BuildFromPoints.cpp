@@ -102,9 +102,14 @@ namespace {
                !(sphere.radius > 0);
     }
 
-    /// How many entries of `Touched` a sphere will make, on an average over where it may lie among the tiles.
+    /// How many tiles a sphere will touch, on an average over where it may lie among them.
+    struct TouchedCount {
+        double entries;  // of `Touched`
+        double elements; // of the volume, were it the only sphere
+    };
+
     template <class Traits>
-    double touchedCount(Sphere const& sphere, Range const& range, double voxelSize)
+    TouchedCount touchedCount(Sphere const& sphere, Range const& range, double voxelSize)
     {
         // Tiles of which the centre lies within a radius.
         auto const tiles = [](double radius, double width) {
@@ -112,20 +117,29 @@ namespace {
             return 4.0 / 3.0 * std::numbers::pi * r * r * r;
         };
         auto const reach = [=](int width) { return (width - 1) * 0.5 * std::numbers::sqrt3 * voxelSize; };
-        double const outer = sphere.radius + range.outer + reach(Traits::kDataWidth);
-        double const core = sphere.radius - range.inner - reach(Traits::kInnerWidth);
         double const cellWidth = Traits::kDataWidth * voxelSize;
-        return tiles(outer, cellWidth) - tiles(core, cellWidth) + tiles(core, Traits::kInnerWidth * voxelSize);
+        double const outer = tiles(sphere.radius + range.outer + reach(Traits::kDataWidth), cellWidth);
+        double const inner = tiles(sphere.radius - range.inner - reach(Traits::kDataWidth), cellWidth);
+        double const core = sphere.radius - range.inner - reach(Traits::kInnerWidth);
+        double const insideTiles = tiles(core, Traits::kInnerWidth * voxelSize);
+        return {outer - tiles(core, cellWidth) + insideTiles,
+                (outer - inner) * Traits::kLeafVoxels + insideTiles * Traits::kInnerCells};
     }
 
-    /// Whether spheres touch too many tiles. Told before any is: it is their entries that take memory.
+    /// Whether spheres touch too many tiles, or one alone has more elements than 32 bits count: others only add to its inside,
+    /// and where they hide its surface they have more themselves. Told before any tile is touched, as that takes the memory.
     template <class Traits>
     bool touchTooMuch(Spheres const& spheres, Range const& range, double voxelSize)
     {
         double count = 0;
-        for (std::uint64_t point = 0; point < spheres.count(); ++point)
-            if (!makesNothing(spheres[point]))
-                count += touchedCount<Traits>(spheres[point], range, voxelSize);
+        for (std::uint64_t point = 0; point < spheres.count(); ++point) {
+            if (makesNothing(spheres[point]))
+                continue;
+            auto const touched = touchedCount<Traits>(spheres[point], range, voxelSize);
+            if (touched.elements >= kNoElement)
+                return true;
+            count += touched.entries;
+        }
         return count > kMostTouchedTiles;
     }
 
@@ -164,6 +178,8 @@ namespace {
     template <class T>
     Nexil::Array<T> joined(Nexil::Array<Touched>& chunks, Nexil::Array<T> Touched::*part)
     {
+        if (chunks.size() == 1)
+            return std::move(chunks[0].*part);
         std::uint64_t count = 0;
         for (Touched const& chunk : chunks)
             count += (chunk.*part).size();
@@ -201,6 +217,29 @@ namespace {
         return all;
     }
 
+    /// Whether it is one of sorted tiles. A hash would take twice their memory.
+    bool contains(Nexil::Array<Coordinate> const& sorted, Coordinate const& tile)
+    {
+        return std::binary_search(sorted.begin(), sorted.end(), tile,
+                                  [](Coordinate const& a, Coordinate const& b) { return isBefore(a, b); });
+    }
+
+    /// The inner tiles that have cells inside, some several times.
+    template <class Traits>
+    Nexil::Array<Coordinate> tilesWithoutVoxels(Touched const& touched)
+    {
+        Nexil::Array<Coordinate> tiles;
+        tiles.reserve(touched.insideTiles.size() + touched.insideCells.size());
+        for (Coordinate const& tile : touched.insideTiles)
+            tiles.push_back(tile);
+        for (Coordinate const& cell : touched.insideCells) {
+            Coordinate const tile = tileOrigin<Traits::kInnerWidth>(cell);
+            if (tiles.empty() || tiles[tiles.size() - 1] != tile)
+                tiles.push_back(tile);
+        }
+        return tiles;
+    }
+
     /// Takes the distances from one more sphere at the voxels of a leaf tile, where they are smaller.
     template <class Traits>
     void lowerDistances(Sphere const& sphere, Coordinate const& origin, double voxelSize, double* distances)
@@ -235,11 +274,9 @@ namespace {
             return {};
 
         // What lies deep in one sphere has its value, whichever others reach there.
-        TileHash const insideCells(touched.insideCells);
-        TileHash const insideTiles(touched.insideTiles);
         auto isInside = [&](Coordinate const& cell) {
-            return insideCells.find(cell) != kNoTile ||
-                   insideTiles.find(tileOrigin<Traits::kInnerWidth>(cell)) != kNoTile;
+            return contains(touched.insideCells, cell) ||
+                   contains(touched.insideTiles, tileOrigin<Traits::kInnerWidth>(cell));
         };
         Nexil::Array<Coordinate> leaves;
         Nexil::Array<std::uint64_t> starts;
@@ -250,11 +287,8 @@ namespace {
                 starts.push_back(i);
             }
         }
-        Nexil::Array<Coordinate> furtherTiles = touched.insideTiles;
-        for (Coordinate const& cell : touched.insideCells)
-            furtherTiles.push_back(tileOrigin<Traits::kInnerWidth>(cell));
-        auto topology =
-            Internal::assembleTopology<Traits>(description.topologyName, std::move(leaves), std::move(furtherTiles));
+        auto topology = Internal::assembleTopology<Traits>(description.topologyName, std::move(leaves),
+                                                           tilesWithoutVoxels<Traits>(touched));
         if (!topology)
             return {};
 
@@ -275,8 +309,14 @@ namespace {
             }
         });
         float const deepest = value(-range.inner);
-        for (std::uint64_t i = topology->voxelCount(); i < topology->elementCount(); ++i)
-            values[i] = isInside(topology->elementCube(static_cast<unsigned int>(i)).origin) ? deepest : background;
+        Nexil::parallel::forRange(topology->innerCount(), grain::kTiles, [&](std::size_t begin, std::size_t end) {
+            for (std::size_t cell = begin * Traits::kInnerCells; cell < end * Traits::kInnerCells; ++cell) {
+                std::uint64_t const element = topology->voxelCount() + cell;
+                bool const isDeep = topology->innerChildren()[cell] == kNoTile &&
+                                    isInside(topology->elementCube(static_cast<unsigned int>(element)).origin);
+                values[element] = isDeep ? deepest : background;
+            }
+        });
         return Internal::gridOf(description, std::move(topology), std::move(values), background);
     }
 

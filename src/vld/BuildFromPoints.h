@@ -15,15 +15,17 @@
 ///            all numbers, makes nothing.
 /// Errors: an empty grid for a description with an empty or repeated name or a voxel size that is not finite and positive,
 /// a band or falloff that is not, another number of radii, spheres beyond the coordinate limits, more elements than 32 bits
-/// count, and spheres that touch more tiles than `kMostTouchedTiles`, which is told at once.
+/// count, and spheres that touch more tiles than `kMostTouchedTiles`; this, and a sphere that alone has too many
+/// elements, is told at once.
 /// std::bad_alloc; std::runtime_error when the job is cancelled.
-/// Cost: by the leaf tiles near each sphere's surface, and the cells inside of it; where spheres overlap, a tile costs for
-/// each of them, 16 bytes of temporary memory among others. Threads: parallel inside; one result, bit for bit, for every
-/// number of threads.
+/// Cost: by the leaf tiles near each sphere's surface, and the cells and inner tiles inside of it; where spheres overlap, a
+/// tile costs for each of them. Besides the grid itself, up to 32 bytes of temporary memory for each. Threads: parallel
+/// inside; one result, bit for bit, for every number of threads.
 namespace VLD::TileTree3D {
 
-/// How many tiles spheres may touch, each counted for every sphere: some 4 GiB of temporary memory.
-inline constexpr double kMostTouchedTiles = 1 << 28;
+/// How many tiles spheres may touch, each counted for every sphere, as an average over where they may lie: 4 GiB of temporary
+/// memory at most.
+inline constexpr double kMostTouchedTiles = 1 << 27;
 
 /// The distance to the nearest sphere's surface at the centre of each voxel, negative inside of any, cut off at -band and
 /// band. Inside, where spheres overlap, it is the one to the sphere in which the voxel lies deepest. The default is band.

@@ -323,7 +323,7 @@ TYPED_TEST(Builders, WhatCannotBeBuiltGivesAnEmptyGrid)
     EXPECT_FALSE(planeOf({{-9, 0, 0}, {30, 30, 30}}, 1000));
     EXPECT_FALSE(planeOf({{-1 << 19, 0, 0}, {1 << 20, 1 << 20, 1}}, 100000));
     // Spheres that touch too many tiles are told at once, not when the memory is full: a shell, a core, and many small ones.
-    EXPECT_FALSE(points(good, {{0, 0, 0}}, {20000.0f}, 3));
+    EXPECT_FALSE(points(good, {{0, 0, 0}}, {4500.0f}, 3));
     EXPECT_FALSE(points(good, {{0, 0, 0}}, {1e6f}, 1));
     Nexil::Array<float3> same;
     same.resize(1000000);
