@@ -3,7 +3,7 @@ import pathlib
 import struct
 
 import tool
-from zon_files import NULL, array, frame, obj, part, stream
+from zon_files import array, obj, part, stream
 
 STREAMS = pathlib.Path(__file__).resolve().parents[1] / "corpus/streams"
 VALID = STREAMS / "valid"
@@ -14,7 +14,7 @@ def floats(*numbers):
 
 
 def u32(number):
-    return frame(2, number)
+    return [2, number]
 
 
 class Reports(tool.ToolTest):
@@ -68,7 +68,7 @@ class Diff(tool.ToolTest):
         nan, = struct.unpack("<f", bytes.fromhex("0000c07f"))
         numbers, others = {"a": floats(1, 2, 3)}, {"a": floats(1, 2.5, 3)}
         for first, second, options, expected in (
-                ({"a": u32(1)}, {"a": frame(6, 1)}, [], [("a", "type", "unsigned int", "int")]),
+                ({"a": u32(1)}, {"a": [6, 1]}, [], [("a", "type", "unsigned int", "int")]),
                 ({"a": u32(1)}, {"b": u32(1)}, [], [("a", "missing", "unsigned int", "nothing"),
                                                     ("b", "missing", "nothing", "unsigned int")]),
                 ({"a": u32(1), "b": u32(2)}, {"b": u32(2), "a": u32(1)}, [], [("", "order", '"a"', '"b"')]),
@@ -80,8 +80,8 @@ class Diff(tool.ToolTest):
                 ({"a": floats(nan)}, {"a": floats(1)}, ["--tolerance", "1e30"],
                  [("a/[0]", "value", "nan(0x7fc00000)", "1")]),
                 ({"a": floats(1, 2)}, {"a": floats(1)}, [], [("a", "size", "2", "1")]),
-                ({"a": NULL}, {"a": u32(1)}, [], [("a", "type", "nothing", "unsigned int")]),
-                ({"a": part(NULL)}, {"a": part(obj({}))}, [], [("a", "null", "null", "a value")])):
+                ({"a": None}, {"a": u32(1)}, [], [("a", "type", "nothing", "unsigned int")]),
+                ({"a": part(None)}, {"a": part(obj({}))}, [], [("a", "null", "null", "a value")])):
             self.write("a.zon", stream([first]))
             self.write("b.zon", stream([second]))
             report = self.json("diff", "a.zon", "b.zon", *options, code=1 if expected else 0)
@@ -93,7 +93,7 @@ class Diff(tool.ToolTest):
         for depth, width in ((60, 2), (100000, 1)):
             for name, bottom in (("a.zon", 1), ("b.zon", 2)):
                 levels = [{"n": u32(bottom)}]
-                levels += [{f"p{i}": frame(362, level) for i in range(width)} for level in range(1, depth + 1)]
+                levels += [{f"p{i}": [362, level] for i in range(width)} for level in range(1, depth + 1)]
                 self.write(name, stream(levels[-1:], levels[:-1]))
             report = self.json("diff", "a.zon", "b.zon", code=1)
             self.assertEqual([len(each["path"]) for each in report["differences"]], [depth + 2])

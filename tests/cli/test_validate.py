@@ -1,7 +1,7 @@
 """zon validate: what it judges, how it reports, how it ends."""
 import tool
 import zon_files
-from zon_files import NULL, component, data, frame, indices, mesh, obj, part, points, text
+from zon_files import component, data, indices, mesh, obj, part, points, text
 
 TRIANGLE = [(0, 0, 0), (1, 0, 0), (0, 1, 0)]
 
@@ -33,8 +33,8 @@ class Validate(tool.ToolTest):
         broken = mesh(TRIANGLE, [0, 1, 2], [0, 3])
         broken["face_offset"] = points(TRIANGLE, "face_component")
         instances = {"point_component": component(2),
-                     "instance_shape": data(frame(363, [1, [obj(mesh(TRIANGLE, [0, 1, 2], [0, 3])), obj(broken)]]),
-                                            "point_component", part(NULL))}
+                     "instance_shape": data([363, [1, [obj(mesh(TRIANGLE, [0, 1, 2], [0, 3])), obj(broken)]]],
+                                            "point_component", part(None))}
         self.write("mixed.zon", zon_files.stream([
             {"note": text("no geometry")}, instances, zon_files.strands(2, TRIANGLE[:2], [0, 3]),
             {"point_position": component(1)}, {"lost": indices([], "")}, {"voxel_tile_tree": component(1)}]))

@@ -2,71 +2,52 @@
 import itertools
 import struct
 
+import msgpack
+
 # What an array of numbers is, by its form in struct: the type, and how many numbers make an element.
 ARRAYS = {"I": (122, 1), "f": (128, 1), "3i": (149, 3), "3f": (151, 3), "?": (130, 1)}
-NULL = b"\xc0"
+NO_NAMES = [131, [1, []]]
 
 
-def pack(value):
-    """A MessagePack item of a truth value, a natural number, a text or a list. Bytes are taken as packed already."""
-    if isinstance(value, bytes):
-        return value
-    if isinstance(value, bool):
-        return b"\xc3" if value else b"\xc2"
-    if isinstance(value, int):
-        return b"\xcf" + struct.pack(">Q", value)
-    if isinstance(value, str):
-        return b"\xdb" + struct.pack(">I", len(value.encode())) + value.encode()
-    return b"\xdd" + struct.pack(">I", len(value)) + b"".join(map(pack, value))
-
-
-def frame(code, payload):
-    return pack([code, payload])
+def pack(item):
+    return msgpack.packb(item, use_single_float=True)
 
 
 def obj(properties):
-    """An object's payload: name to frame."""
-    return pack([item for pair in properties.items() for item in pair])
+    """An object's payload: name to value, which is [type, payload]."""
+    return [item for pair in properties.items() for item in pair]
 
 
 def part(payload):
-    return frame(362, payload)
+    return [362, payload]
 
 
 def text(value):
-    return frame(11, value)
-
-
-def single(value):
-    return frame(8, b"\xca" + struct.pack(">f", value))
-
-
-def blob(memory):
-    return b"\xc6" + struct.pack(">I", len(memory)) + memory
+    return [11, value]
 
 
 def array(form, values):
     """An array of numbers as one chunk."""
     code, width = ARRAYS[form]
     memory = struct.pack(f"<{len(values)}{form[-1]}", *values)
-    return frame(code, [0, [len(values) // width, [blob(memory)] if memory else []]])
+    return [code, [0, [len(values) // width, [memory] if memory else []]]]
 
 
 def component(count):
-    return part(obj({"count": frame(2, count)}))
+    return part(obj({"count": [2, count]}))
 
 
-def data(values, target, default):
-    return part(obj({"data": values, "target": text(target), "depends_on": frame(131, [1, []]), "default": default,
-                     "interpolation_mode": frame(360, 1)}))
+def data(values, target, default, **more):
+    return part(obj({"data": values, "target": text(target), "depends_on": NO_NAMES, "default": default,
+                     "interpolation_mode": [360, 1], **more}))
 
 
 def indices(values, target):
-    return data(array("I", values), target, frame(2, 0xFFFFFFFF))
+    return data(array("I", values), target, [2, 0xFFFFFFFF])
 
 
 def points(values, target="point_component"):
-    return data(array("3f", [x for each in values for x in each]), target, frame(31, [1, [blob(bytes(12))]]))
+    return data(array("3f", [x for each in values for x in each]), target, [31, [1, [bytes(12)]]])
 
 
 def mesh(positions, corners, offsets, counts=None, **more):
@@ -83,31 +64,28 @@ def strands(point_count, positions, offsets):
 
 
 def stream(top, shared=()):
-    """A file of objects, each a dict of name to frame. Frame (362, i) refers to object i, those on top counted first."""
-    head = obj({"file_identifier": frame(2, 6611198), "file_version": frame(2, 5),
-                "compression_level": frame(6, 0), "serialize_handles": frame(10, False)})
-    items = [part(obj(each)) for each in (*shared, *top)]
+    """A file of objects, each a dict of name to value. Value [362, i] refers to object i, those on top counted first."""
+    head = pack(obj({"file_identifier": [2, 6611198], "file_version": [2, 5], "compression_level": [6, 0],
+                     "serialize_handles": [10, False]}))
+    items = [pack(part(obj(each))) for each in (*shared, *top)]
     *starts, end = itertools.accumulate(map(len, items), initial=len(head) + 9)
     entries = [(start, 1) for start in starts[len(shared):]] + [(start, 0) for start in starts[:len(shared)]]
-    return head + pack(end) + b"".join(items) + b"".join(pack(number) for entry in entries for number in entry)
+    table = b"".join(pack(number) for entry in entries for number in entry)
+    return head + struct.pack(">BQ", 0xCF, end) + b"".join(items) + table
 
 
-def volume(at=(0, 0, 0), **channels):
+def volume(origin=(0, 0, 0), **channels):
     """One small inner tile without leaf tiles; each channel has a form and the values of its eight cells."""
-    sizes = dict(zip(("voxelTileWidth", "voxelTileDataWidth", "voxelOffsetType", "voxelInnerLevels"),
-                     (frame(2, each) for each in (2, 4, 0, 1))))
+    sizes = {"voxelTileWidth": [2, 2], "voxelTileDataWidth": [2, 4], "voxelOffsetType": [2, 0], "voxelInnerLevels": [2, 1]}
     none = array("I", ())
-    tiles = {"count": frame(2, 8), "vld_component": text("voxel_topology"), "name": text("voxel_component"), **sizes,
-             "leaf_origins": array("3i", ()), "leaf_parents": none, "inner_origins": array("3i", at),
+    tiles = {"count": [2, 8], "vld_component": text("voxel_topology"), "name": text("voxel_component"), **sizes,
+             "leaf_origins": array("3i", ()), "leaf_parents": none, "inner_origins": array("3i", origin),
              "inner_children": array("I", [0xFFFFFFFF] * 8)}
-    tree = {"indices": none, "target": text("voxel_component"), "depends_on": frame(131, [1, []]),
-            "vld_component": text("container"), "name": text("voxel_tile_tree"), "topology": text("voxel_component"),
-            "voxelSize": single(1)}
+    tree = {"indices": none, "target": text("voxel_component"), "depends_on": NO_NAMES, "vld_component": text("container"),
+            "name": text("voxel_tile_tree"), "topology": text("voxel_component"), "voxelSize": [8, 1.0]}
     geometry = {"voxel_component": part(obj(tiles)), "voxel_tile_tree": part(obj(tree))}
     for name, (form, values) in channels.items():
-        default = frame(10, False) if form == "?" else single(0)
-        channel = {"data": array(form, values), "target": text("voxel_tile_tree"), "depends_on": frame(131, [1, []]),
-                   "default": default, "interpolation_mode": frame(360, 1), "vld_component": text("channel"),
-                   "name": text(name), **sizes, "container": text("voxel_tile_tree")}
-        geometry[name] = part(obj(channel))
+        default = [10, False] if form == "?" else [8, 0.0]
+        geometry[name] = data(array(form, values), "voxel_tile_tree", default, vld_component=text("channel"),
+                              name=text(name), container=text("voxel_tile_tree"), **sizes)
     return geometry
