@@ -1,6 +1,7 @@
 /// Meshes, strands and volumes whose counts, offsets, indices and targets are any numbers, without a validator being asked,
 /// to everything that reads geometry. The geometry must come out of it as it went in.
 
+#include "Check.h"
 #include "InputBytes.h"
 
 #include <faults/Operations.h>
@@ -10,26 +11,17 @@
 #include <veldrin/veldrin.h>
 
 #include <cstdint>
-#include <cstdio>
-#include <cstdlib>
 #include <string>
 
 namespace {
 
 using namespace Veldrin;
 using MaskPtr = Nexil::Ptr<Nexil::Array<bool>>;
+using fuzz::check;
 using fuzz::InputBytes;
 
 // Where an output is as large as a count says, a large count is the caller's choice and proves nothing.
 constexpr unsigned int kMostCounted = 1u << 20;
-
-void check(bool condition, unsigned int line = __builtin_LINE())
-{
-    if (!condition) {
-        std::fprintf(stderr, "check of line %u failed\n", line);
-        std::abort();
-    }
-}
 
 char const* targetFrom(InputBytes& bytes, char const* expected)
 {

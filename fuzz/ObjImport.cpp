@@ -1,24 +1,19 @@
 /// Any bytes to the reader of OBJ files. What it takes becomes objects, which have to be valid and to come back the same
 /// from the text that the writer makes of them.
 
+#include "Check.h"
 #include "Command.h"
 #include "MeshArrays.h"
 
 #include <veldrin/validation/MeshValidator.h>
 
 #include <cstdint>
-#include <cstdlib>
 #include <cstring>
 
 namespace {
 
 using namespace Zon;
-
-void check(bool condition)
-{
-    if (!condition)
-        std::abort();
-}
+using fuzz::check;
 
 template <class T>
 bool haveSameBytes(Nexil::Array<T> const& a, Nexil::Array<T> const& b)

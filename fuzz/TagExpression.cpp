@@ -1,25 +1,21 @@
 /// Any text as a tag expression: the whole input, and each of its lines. What parses is dumped, parsed again and
 /// resolved, both ways, on a small geometry whose tags must stay as they are.
 
+#include "Check.h"
+
 #include <tags/TagSample.h>
 
 #include <veldrin/tags/TagParser.h>
 #include <veldrin/tags/TagResolver.h>
 
 #include <cstdint>
-#include <cstdlib>
 #include <sstream>
 #include <string_view>
 
 namespace {
 
 using namespace Veldrin;
-
-void check(bool condition)
-{
-    if (!condition)
-        std::abort();
-}
+using fuzz::check;
 
 std::string dumpOf(std::string_view text)
 {

@@ -1,0 +1,31 @@
+#pragma once
+
+#include "Check.h"
+
+#include <support/Geometry.h>
+#include <support/StreamDescription.h>
+#include <support/Streams.h>
+
+#include <string>
+
+namespace fuzz {
+
+/// Any bytes to the stream reader. What it refuses gives one message at most and no object; what it takes is dumped, written,
+/// read again and compared.
+inline void checkStream(std::string const& bytes)
+{
+    auto const found = support::read(bytes);
+    check(found.isRead ? found.errors.empty() : found.errors.size() <= 1 && found.objects.empty());
+    if (!found.isRead)
+        return;
+    for (auto const& object : found.objects)
+        if (object)
+            (void)support::dump(*object, 3);
+    std::string const description = support::describeObjects(found.objects);
+    for (int const level : {0, 9}) {
+        auto const again = support::read(support::written(found.objects, level));
+        check(again.isRead && support::describeObjects(again.objects) == description);
+    }
+}
+
+} // namespace fuzz
