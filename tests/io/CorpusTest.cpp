@@ -1,9 +1,7 @@
 #include <support/Environment.h>
-#include <support/StreamDescription.h>
 #include <support/Streams.h>
 
 #include <gtest/gtest.h>
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <filesystem>
@@ -24,28 +22,32 @@ std::vector<fs::path> filesIn(char const* folder)
     return files;
 }
 
-/// The objects of the kept description.
-std::string keptObjects(fs::path path)
+int countOf(std::string const& part, std::string const& text)
 {
-    return nlohmann::json::parse(support::fileBytes(path.replace_extension(".json").string()))["objects"].dump();
+    int count = 0;
+    for (auto at = text.find(part); at != std::string::npos; at = text.find(part, at + 1))
+        ++count;
+    return count;
 }
 
-TEST(StreamCorpus, EveryGoodStreamGivesWhatStandsBesideItAndIsWrittenAndReadBackTheSame)
+// The second reader tells whether what is read is what stands beside each stream.
+TEST(StreamCorpus, EveryGoodStreamIsWrittenAndReadBackTheSame)
 {
     auto const files = filesIn("valid");
     ASSERT_GT(files.size(), 30u);
-    for (auto const& file : files) {
+    for (auto file : files) {
         auto const result = support::read(support::fileBytes(file.string()));
         EXPECT_TRUE(result.isRead) << file << testing::PrintToString(result.errors);
-        std::string const expected = keptObjects(file);
-        EXPECT_EQ(support::describeObjects(result.objects), expected) << file;
         for (int const level : {0, 1, 9})
             for (char const* limit : {"1", "1000", "99999999999999999999"}) {
                 support::EnvironmentVariable const variable(kChunkLimit, limit);
                 auto const again = support::read(support::written(result.objects, level));
                 EXPECT_TRUE(again.isRead) << file;
-                EXPECT_EQ(support::describeObjects(again.objects), expected) << file << level << ' ' << limit;
+                EXPECT_EQ(support::contentOf(again.objects), support::contentOf(result.objects)) << file;
             }
+        // Of the components of volumes, those that are no proxies are damaged, which is warned about.
+        auto const kept = support::fileBytes(file.replace_extension(".json").string());
+        EXPECT_EQ(result.warnings.empty(), countOf("\"vld_component\"", kept) == countOf("\"proxy\"", kept)) << file;
     }
 }
 

@@ -1,6 +1,5 @@
 #include <support/Environment.h>
 #include <support/Geometry.h>
-#include <support/StreamDescription.h>
 #include <support/Streams.h>
 
 #include <nexil/JobCancel.h>
@@ -16,6 +15,7 @@ using Veldrin::createObject;
 using Veldrin::getPropertyAs;
 using Veldrin::setProperty;
 using ObjectPtr = Nexil::Ptr<Veldrin::Object>;
+using Bytes = Nexil::Ptr<Nexil::Array<unsigned char>>;
 
 Nexil::MutablePtr<Veldrin::Object> objectWith(char const* key, Nexil::Any value)
 {
@@ -58,7 +58,10 @@ TEST(StreamRoundTrip, LongArraysComeBackThroughTheWindowAndBesideIt)
             setProperty(*object, "second", support::array(bytes));
             support::Objects const objects{ObjectPtr(std::move(object))};
             std::string stream = support::written(objects, level);
-            EXPECT_EQ(support::describeObjects(support::read(stream).objects), support::describeObjects(objects));
+            auto const back = readOne(stream);
+            EXPECT_EQ(back->keys().size(), 3u);
+            for (char const* key : {"first", "second"})
+                EXPECT_TRUE(*getPropertyAs<Bytes>(*back, key) == *support::array(bytes)) << key;
             stream[stream.size() / 2] = static_cast<char>(stream[stream.size() / 2] ^ 4);
             EXPECT_THAT(support::read(stream).errors, ElementsAre("Checksum mismatch"));
         }
@@ -149,7 +152,7 @@ TEST(StreamRoundTrip, AStreamThatCannotSeekIsReadFromFrontToBack)
     Nexil::InputStream input(stream);
     support::Objects back;
     ASSERT_TRUE(Veldrin::IO::deserialize(input, back, {}, nullptr));
-    EXPECT_EQ(support::describeObjects(back), support::describeObjects(objects));
+    EXPECT_EQ(support::contentOf(back), support::contentOf(objects));
 }
 
 TEST(StreamRoundTrip, WhatCouldNotBeReadAgainIsNotWritten)
@@ -252,7 +255,7 @@ TEST(StreamRoundTrip, ArraysAboveFourGibibytes)
         ASSERT_TRUE(Veldrin::IO::serialize(objects, path.c_str(), options, nullptr));
         support::Objects back;
         ASSERT_TRUE(Veldrin::IO::deserialize(path.c_str(), back, {}, nullptr));
-        EXPECT_EQ(support::describeObjects(back), support::describeObjects(objects)) << "level " << level;
+        EXPECT_TRUE(*getPropertyAs<Bytes>(*back[0], "bytes") == *getPropertyAs<Bytes>(*objects[0], "bytes")) << level;
     }
     std::remove(path.c_str());
 }

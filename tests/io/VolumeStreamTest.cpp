@@ -1,5 +1,4 @@
 #include <support/Geometry.h>
-#include <support/StreamDescription.h>
 #include <support/Streams.h>
 #include <volume/Samples.h>
 
@@ -155,8 +154,7 @@ TEST(VolumeStream, WhatIsDamagedStaysPlainTogetherWithWhatTargetsIt)
             EXPECT_EQ(typeid(object) == typeid(Object), isLost) << name;
         }
         // What is kept is written and read the same again.
-        EXPECT_EQ(support::describeObjects(writtenAndRead(back.objects).objects),
-                  support::describeObjects(back.objects));
+        EXPECT_EQ(support::contentOf(writtenAndRead(back.objects).objects), support::contentOf(back.objects));
         // Only a whole stream is warned about.
         std::string cut = support::written({geometry, ObjectPtr(createObject())}, 0);
         cut.back() = static_cast<char>(cut.back() ^ 1);

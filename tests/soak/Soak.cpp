@@ -6,7 +6,6 @@
 #include "../volume/Samples.h"
 
 #include <support/Geometry.h>
-#include <support/StreamDescription.h>
 #include <support/Streams.h>
 
 #include <veldrin/validation/GeoValidator.h>
@@ -117,7 +116,7 @@ std::string roundTrip(std::uint64_t seed)
         return "not " + (bytes.empty() ? "written" : "read: " + again.errors.at(0));
     objectCount += objects.size();
     byteCount += bytes.size();
-    if (support::describeObjects(again.objects) != support::describeObjects(objects))
+    if (support::contentOf(again.objects) != support::contentOf(objects))
         return "not the same after reading";
     for (std::uint64_t i = 0; i < objects.size(); ++i)
         if (verdictOn(again.objects[i]) != verdictOn(objects[i]))

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <support/Geometry.h>
+
 #include <nexil/RuntimeMessage.h>
 #include <veldrin/io/InputMemoryBuf.h>
 #include <veldrin/io/ObjectStream.h>
@@ -42,6 +44,15 @@ inline std::string written(Objects const& objects, int level = 9, Nexil::Runtime
     Veldrin::IO::SerializationOptions options;
     options.compressionLevel = level;
     return Veldrin::IO::serialize(objects, output, options, services) ? stream.str() : std::string();
+}
+
+/// All that there is to objects, sharing included: by their stream, and by their dumps, which owe nothing to the writer.
+inline std::string contentOf(Objects const& objects)
+{
+    std::string content;
+    for (auto const& object : objects)
+        content += object ? dump(*object, 1000) : "null";
+    return content + written(objects, 0);
 }
 
 struct ReadResult {
