@@ -44,12 +44,8 @@ struct Sample {
         if (how == Offsets::ReachBeyond)
             for (unsigned int& offset : offsets)
                 offset = random() % 4 == 0 ? offset + 4000000000u : offset;
-        std::vector<Veldrin::Math::float3> const points(pointCount);
-        mesh = Veldrin::createObject();
-        populateMesh(support::array(points), support::array(corners), support::array(offsets), *mesh);
-        strands = Veldrin::createObject();
-        populateStrand(support::array(std::vector<Veldrin::Math::float3>(corners.size())), support::array(offsets),
-                       *strands);
+        mesh = support::mesh(std::vector<Veldrin::Math::float3>(pointCount), corners, offsets);
+        strands = support::strands(std::vector<Veldrin::Math::float3>(corners.size()), offsets);
     }
 
     /// Calls visit(face, place) for the places below `limit` that each face owns.

@@ -19,8 +19,8 @@ using Geometry::kInvalidIndex;
 using Geometry::Mesh::HalfEdgeDataStructure;
 using Math::float3;
 using support::FaceEdge;
+using support::Indices;
 using support::Polygons;
-using Indices = std::vector<unsigned int>;
 
 constexpr unsigned int kMany = 100000;
 
@@ -82,9 +82,7 @@ TEST(HardFamilies, OffsetsOfWhichEveryOtherFaceOwnsAllCorners)
     Indices offsets(kCount + 1);
     for (unsigned int f = 0; f <= kCount; ++f)
         offsets[f] = f % 2 * kCount;
-    auto const mesh = createObject();
-    Geometry::populateMesh(support::array(std::vector<float3>(kCount)), support::array(countingUp(kCount)),
-                           support::array(offsets), *mesh);
+    auto const mesh = support::mesh(std::vector<float3>(kCount), countingUp(kCount), offsets);
     auto const selected = support::array(std::vector<bool>(kCount, true));
     auto const faces = Geometry::pointsToFaces(*mesh, *selected, Geometry::TagConversionStyle::AllElements, nullptr);
     EXPECT_TRUE((*faces)[0]);

@@ -172,10 +172,8 @@ TEST(MeshNormals, OffsetsThatWrapAmongOnesThatRiseStayWithinTheirArrays)
     for (unsigned int i = 0; i < offsets.size(); ++i)
         offsets[i] = i < kRun ? 3 * i : i < 2 * kRun ? 3 * (i - kRun) - 2 : 2 * i - kRun - 2;
     offsets.push_back(3 * 4 * kRun);
-    auto const object = Veldrin::createObject();
-    Veldrin::Geometry::populateMesh(support::array(std::vector<float3>(1000)),
-                                    support::array(std::vector<unsigned int>(offsets.back(), 999)),
-                                    support::array(offsets), *object);
+    auto const object =
+        support::mesh(std::vector<float3>(1000), std::vector<unsigned int>(offsets.back(), 999), offsets);
     Normals normals;
     computeMeshFaceNormals(*object, normals);
     EXPECT_EQ(normals.size(), offsets.size() - 1);

@@ -18,8 +18,7 @@ struct Measured {
 
     Measured(std::vector<float3> const& points, std::vector<unsigned int> const& offsets)
     {
-        auto const strands = Veldrin::createObject();
-        Veldrin::Geometry::populateStrand(support::array(points), support::array(offsets), *strands);
+        auto const strands = support::strands(points, offsets);
         EXPECT_TRUE(computeStrandTangents(*strands, tangents, nullptr));
         EXPECT_TRUE(computeStrandLength(*strands, lengths, segments, nullptr));
         EXPECT_TRUE(computeStrandRatio(*strands, ratios, nullptr));

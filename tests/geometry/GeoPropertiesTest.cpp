@@ -1,3 +1,4 @@
+#include <support/Costly.h>
 #include <support/Geometry.h>
 #include <veldrin/geometry/Prototypes.h>
 
@@ -170,24 +171,10 @@ TEST(GeoProperties, UniqueNamesTakeTheFirstFreeNumber)
     EXPECT_EQ(getGeoPropRangeName("face_vertex_normal"), "face_vertex_normal_index");
 }
 
-/// Counts how often data is asked for rather than its type.
-struct Costly : Object {
-    PropertyInfo propertyInfo(Nexil::String const& key) const override
-    {
-        return key == sData ? PropertyInfo{true, true, Nexil::TypeId::of<Nexil::Ptr<Nexil::Array<float>>>(), 1000}
-                            : Object::propertyInfo(key);
-    }
-    Nexil::Any getProperty(Nexil::String const& key) const override
-    {
-        EXPECT_NE(key, sData) << "built data that nobody asked for";
-        return Object::getProperty(key);
-    }
-};
-
 TEST(GeoProperties, QuestionsNeverBuildData)
 {
-    auto costly = Nexil::makeMutable<Costly>();
-    createDataGeoProperty(0.0f, sPointComp, nullptr, *costly);
+    auto costly = Nexil::makeMutable<support::Costly>();
+    createDataGeoProperty(0.0f, sPointComp, support::array<float>({1}), *costly);
     auto const obj = createObject();
     setProperty(*obj, "point_heat", std::move(costly));
     EXPECT_TRUE(getDataGeoProperty(*obj, "point_heat"));

@@ -1,6 +1,6 @@
 #include <veldrin/object/Object.h>
 
-#include <gtest/gtest.h>
+#include <gmock/gmock.h>
 
 #include <cstddef>
 #include <cstring>
@@ -25,15 +25,16 @@ std::size_t placeOf(Member member)
 TEST(VirtualTable, TheTenOperationsStandInTheirPlaces)
 {
     // The first operation, the destructor, takes two places: one destroys, the other also frees.
-    EXPECT_EQ(placeOf(&Object::size), 2u);
-    EXPECT_EQ(placeOf(&Object::empty), 3u);
-    EXPECT_EQ(placeOf(&Object::hasProperty), 4u);
-    EXPECT_EQ(placeOf(&Object::getProperty), 5u);
-    EXPECT_EQ(placeOf(&Object::extractProperty), 6u);
-    EXPECT_EQ(placeOf(&Object::eraseProperty), 7u);
-    EXPECT_EQ(placeOf(&Object::eraseAllProperties), 8u);
-    EXPECT_EQ(placeOf(&Object::keys), 9u);
-    EXPECT_EQ(placeOf(&Object::setPropertyAny), 10u);
+    std::size_t const places[] = {placeOf(&Object::size),
+                                  placeOf(&Object::empty),
+                                  placeOf(&Object::hasProperty),
+                                  placeOf(&Object::getProperty),
+                                  placeOf(&Object::extractProperty),
+                                  placeOf(&Object::eraseProperty),
+                                  placeOf(&Object::eraseAllProperties),
+                                  placeOf(&Object::keys),
+                                  placeOf(&Object::setPropertyAny)};
+    EXPECT_THAT(places, testing::ElementsAre(2, 3, 4, 5, 6, 7, 8, 9, 10));
 }
 
 } // namespace

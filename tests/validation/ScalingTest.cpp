@@ -1,10 +1,10 @@
 #include "Edits.h"
 
+#include <support/Costly.h>
+
 #include <veldrin/validation/GeoValidator.h>
 
 #include <gtest/gtest.h>
-
-#include <stdexcept>
 
 namespace {
 
@@ -13,28 +13,14 @@ using namespace support;
 
 TEST(Validation, NeverFetchesWhatATypeOrASizeTells)
 {
-    /// Data whose array would have to be built.
-    class Computed : public Object {
-    public:
-        [[nodiscard]] Nexil::Any getProperty(Nexil::String const& key) const override
-        {
-            if (key == Geometry::sData || key == Geometry::sIndices)
-                throw std::logic_error("built");
-            return Object::getProperty(key);
-        }
-        [[nodiscard]] PropertyInfo propertyInfo(Nexil::String const& key) const override
-        {
-            return Object(*this).propertyInfo(key);
-        }
-    };
-    auto const object = Nexil::makeMutable<Computed>();
+    auto const object = Nexil::makeMutable<Costly>();
     // Not a geo property, but no cheaper to look at.
     setProperty(*object, Geometry::sData, array<float>({1}));
     addComponent(*object, "c", 3);
-    auto data = Nexil::makeMutable<Computed>();
+    auto data = Nexil::makeMutable<Costly>();
     Geometry::createDataGeoProperty(0.0f, "c", array<float>({1, 2, 3}), *data);
     setProperty(*object, "d", std::move(data));
-    auto range = Nexil::makeMutable<Computed>();
+    auto range = Nexil::makeMutable<Costly>();
     Geometry::populateRangeGeoProperty(array<unsigned int>({0, 1, 2}), "c", *range);
     setProperty(*object, "r", std::move(range));
     EXPECT_EQ(verdict(Geometry::GeoValidator(), *object), "");
