@@ -4,6 +4,9 @@
 
 #include <gtest/gtest.h>
 
+#include <fstream>
+#include <iterator>
+
 namespace {
 
 using namespace Veldrin;
@@ -28,59 +31,18 @@ Nexil::Ptr<Nexil::Array<T>> claiming(std::uint64_t count)
 
 constexpr std::uint64_t k4G = 1ull << 32;
 
-/// The dump of a property that holds these lines.
-std::string block(std::string const& name, std::string const& lines)
+TEST(Population, EmptyFormsHoldExactlyWhatTheirKeptDumpsShow)
 {
-    return "    " + name + ": \n    {\n" + lines + "    }\n";
-}
-
-std::string component(std::string const& name)
-{
-    return block(name, "        count: 0 (unsigned int)\n");
-}
-
-std::string data(std::string const& name, std::string const& values, std::string const& target,
-                 std::string const& defaultValue)
-{
-    return block(
-        name, "        data: " + values + "\n        target: " + target +
-                  " (string)\n        depends_on: [  ] 0 elements (array<string>)\n        default: " + defaultValue +
-                  "\n        interpolation_mode: Linear (Geometry::Common::DataInterpolationMode)\n");
-}
-
-TEST(Population, EmptyFormsHoldExactlyTheseProperties)
-{
-    auto const points = component("point_component");
-    auto const positions = data("point_position", "[  ] 0 elements (array<Math::float3>)", "point_component",
-                                "{0f, 0f, 0f} (Math::float3)");
-    auto const offsets = [](char const* name, char const* target) {
-        return data(name, "[ 0 ] 1 elements (array<unsigned int>)", target, "4294967295 (unsigned int)");
-    };
-    auto const volume = component("voxel_component") + block("voxel_tile_tree",
-                                                             "        indices: [  ] 0 elements (array<unsigned int>)\n"
-                                                             "        target: voxel_component (string)\n"
-                                                             "        depends_on: [  ] 0 elements (array<string>)\n");
-    auto const channel = [](char const* name) {
-        return data(name, "[  ] 0 elements (array<float>)", "voxel_tile_tree", "0 (float)");
-    };
-    struct Case {
-        void (*populate)(Object&);
-        std::string text;
-    };
-    Case const cases[] = {
-        {&populateMesh, points + component("face_vertex_component") + component("face_component") + positions +
-                            data("face_vertex", "[  ] 0 elements (array<unsigned int>)", "face_vertex_component",
-                                 "4294967295 (unsigned int)") +
-                            offsets("face_offset", "face_component")},
-        {&populateStrand,
-         points + component("strand_component") + positions + offsets("strand_offset", "strand_component")},
-        {&populateFogVolume, volume + channel("voxel_fog_density")},
-        {&populateLevelSet, volume + channel("voxel_signed_distance")},
-        {&populateInstances,
-         data("instance_shape", "        [\n        ]", "", "(unknown data type) (Nexil::Ptr<Veldrin::Object>)")},
-    };
-    for (auto const& [populate, text] : cases)
-        EXPECT_EQ(support::dump(*support::filled(populate)), "{\n" + text + "}");
+    std::pair<char const*, void (*)(Object&)> const forms[] = {{"mesh", &populateMesh},
+                                                               {"strand", &populateStrand},
+                                                               {"fog_volume", &populateFogVolume},
+                                                               {"level_set", &populateLevelSet},
+                                                               {"instances", &populateInstances}};
+    for (auto const& [name, populate] : forms) {
+        std::ifstream file(VELDRIN_TEST_CORPUS "/dumps/" + std::string(name) + ".txt");
+        std::string const kept(std::istreambuf_iterator<char>(file), {});
+        EXPECT_EQ(support::dump(*support::filled(populate)) + "\n", kept);
+    }
 }
 
 TEST(Population, ArraysAreMovedInAndNothingGrowsWithTheirSize)
