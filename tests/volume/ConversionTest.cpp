@@ -3,7 +3,6 @@
 #include <support/FailingMemory.h>
 #include <support/Geometry.h>
 
-#include <nexil/JobCancel.h>
 #include <veldrin/geometry/Prototypes.h>
 #include <veldrin/tags/TagData.h>
 #include <veldrin/volume/ValidUpdatedVolume.h>
@@ -11,7 +10,6 @@
 #include <veldrin/volume/VldProxyComponentChannel.h>
 #include <veldrin/volume/VldProxyComponentContainer.h>
 #include <veldrin/volume/VldProxyComponentTopology.h>
-#include <veldrin/volume/VolumeBounds.h>
 #include <veldrin/volume/VolumeConversion.h>
 
 #include <map>
@@ -252,27 +250,6 @@ TEST(VolumeConversion, WhatWasOnlyPopulatedGivesAnEmptyVolume)
         EXPECT_TRUE(volume->empty());
         EXPECT_TRUE(object->empty());
     }
-}
-
-TEST(VolumeConversion, ACancelledJobLeavesItsSourceAlone)
-{
-    auto volume = support::sphereVolume<SmallTiles>();
-    auto const before = componentsOf(*volume);
-    auto other = support::sphereVolume<SmallTiles>();
-    auto object = Geometry::move_vld_volume_to_object(*other);
-    Nexil::setJobCancelHook([] { return true; });
-    auto const converted = Geometry::move_vld_volume_to_object(*volume);
-    EXPECT_THROW(static_cast<void>(Geometry::move_object_to_vld_volume(*object)), std::runtime_error);
-    Math::bbox<Math::float3, float> box;
-    auto const container = volume->component<Container<SmallTiles>>("voxel_tile_tree");
-    EXPECT_THROW(GeometryAlgorithms::volumeBounds(*volume, *container, *container->topology(), box),
-                 std::runtime_error);
-    Nexil::setJobCancelHook(nullptr);
-    EXPECT_EQ(box, (Math::bbox<Math::float3, float>()));
-    ASSERT_TRUE(converted);
-    EXPECT_TRUE(converted->empty());
-    EXPECT_EQ(componentsOf(*volume), before);
-    EXPECT_EQ(object->size(), 3u);
 }
 
 TEST(VolumeConversion, AnUpdatedVolumeIsToldByItsSizesAndItsDifferencesArePrinted)
