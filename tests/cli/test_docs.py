@@ -38,7 +38,3 @@ class Examples(tool.ToolTest):
 
     def test_every_command_prints_what_the_page_of_the_tag_language_shows(self):
         self.check("tag-language.md")
-
-
-if __name__ == "__main__":
-    tool.main()

@@ -145,7 +145,3 @@ class Files(tool.ToolTest):
         self.assertIn(b"\033[32mok", terminal_output("verify a.zon", self.folder))
         self.assertNotIn(b"\033", terminal_output("verify a.zon", self.folder, NO_COLOR="1"))
         self.assertNotIn("\033", self.zon("verify", "a.zon").stdout)
-
-
-if __name__ == "__main__":
-    tool.main()

@@ -188,7 +188,3 @@ class Export(tool.ToolTest):
             text = self.zon(command, "named.zon").stdout
             self.assertIn("?[2Jred", text)
             self.assertNotIn("\x1b", text)
-
-
-if __name__ == "__main__":
-    tool.main()

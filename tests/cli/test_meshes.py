@@ -71,7 +71,3 @@ class Meshes(tool.ToolTest):
         self.assertEqual(first, {"is_strands": True, "is_broken": True})
         self.assertEqual([second[key] for key in ("strands", "points", "total", "shortest", "mean", "longest", "lengths")],
                          [1, 2, 1, 1, 1, 1, [1]])
-
-
-if __name__ == "__main__":
-    tool.main()

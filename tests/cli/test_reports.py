@@ -98,7 +98,3 @@ class Diff(tool.ToolTest):
             report = self.json("diff", "a.zon", "b.zon", code=1)
             self.assertEqual([len(each["path"]) for each in report["differences"]], [depth + 2])
             self.zon("info", "a.zon")
-
-
-if __name__ == "__main__":
-    tool.main()

@@ -89,7 +89,3 @@ class Tags(tool.ToolTest):
             self.assertIn(words, self.zon("tag", "plane.zon", *arguments, code=2).stderr)
         self.assertEqual((self.folder / "plane.zon").read_bytes(), before)
         self.assertEqual(self.names(), ["plane.zon"])
-
-
-if __name__ == "__main__":
-    tool.main()

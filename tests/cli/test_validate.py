@@ -59,7 +59,3 @@ class Validate(tool.ToolTest):
             result = self.zon("validate", "notes.zon", name, "--json", code=2)
             self.assertIn(name, result.stderr)
             self.assertEqual(result.stdout, "")
-
-
-if __name__ == "__main__":
-    tool.main()

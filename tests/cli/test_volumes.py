@@ -206,7 +206,3 @@ class VolumesOfPoints(tool.ToolTest):
             deep = {name: zon_files.part(zon_files.obj(deep))}
         self.write("deep.zon", zon_files.stream([deep]))
         self.assertIn("indices: [  ] 0 elements", self.zon("dump", "deep.zon").stdout)
-
-
-if __name__ == "__main__":
-    tool.main()

@@ -1,5 +1,4 @@
 """A program that was built without OpenVDB says so wherever it is needed, and leaves no file behind."""
-import unittest
 
 import tool
 
@@ -15,7 +14,3 @@ class WithoutOpenVdb(tool.ToolTest):
             self.assertIn("this program was built without OpenVDB: install it (Debian: libopenvdb-dev) and build again",
                           said.stderr)
         self.assertEqual(self.names(), ["cube.zon", "smoke.vdb"])
-
-
-if __name__ == "__main__":
-    tool.main()

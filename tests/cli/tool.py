@@ -3,11 +3,10 @@ import json
 import os
 import pathlib
 import subprocess
-import sys
 import tempfile
 import unittest
 
-ZON = None
+ZON = os.environ["VELDRIN_TEST_PROGRAM"]
 
 
 class ToolTest(unittest.TestCase):
@@ -62,12 +61,3 @@ class ToolTest(unittest.TestCase):
     def import_cloud(self):
         """A file of one point without a normal."""
         self.import_text("cloud.off", "OFF 1 0 0\n0 0 0\n")
-
-
-def main():
-    """Takes the program's path off the command line, then runs the tests."""
-    global ZON
-    ZON = os.path.abspath(sys.argv.pop(1))
-    # Test files see this module under its own name.
-    sys.modules["tool"].ZON = ZON
-    unittest.main()

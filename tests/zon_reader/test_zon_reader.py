@@ -1,7 +1,7 @@
 """The second reader against the kept streams: good ones give what stands beside them, bad ones their message.
 
-Argument: the program that reads streams by the library and writes them again. What it makes of them tells the second reader
-what the library has read.
+A program reads streams by the library and writes them again: what it makes of them tells the second reader what the library
+has read.
 """
 import itertools
 import json
@@ -9,7 +9,6 @@ import os
 import pathlib
 import re
 import subprocess
-import sys
 import tempfile
 import unittest
 
@@ -43,7 +42,7 @@ class ZonReader(unittest.TestCase):
     def test_good_streams_give_it_again_when_the_library_has_read_and_written_them(self):
         for level, limit in itertools.product("019", ("1", "1000", "99999999999999999999")):
             with self.subTest(level=level, limit=limit), tempfile.TemporaryDirectory() as folder:
-                subprocess.run([REWRITE, STREAMS / "valid", folder, level], check=True,
+                subprocess.run([os.environ["VELDRIN_TEST_PROGRAM"], STREAMS / "valid", folder, level], check=True,
                                env={**os.environ, "VELDRIN_MAX_SERIALIZATION_ARRAY_SIZE": limit})
                 self.check_descriptions(pathlib.Path(folder), "objects")
 
@@ -69,8 +68,3 @@ class ZonReader(unittest.TestCase):
         self.assertEqual(data, valid("v6_walk"))
         rows = re.findall(r"^\| (\d+) \| (?:Math::)?[a-z][\w:<>, ]* \| (\d+|-) \|$", PAGE, re.MULTILINE)
         self.assertEqual(rows, [(str(code), "-" if code == 11 else str(value_size(code))) for code in range(120)])
-
-
-if __name__ == "__main__":
-    REWRITE = sys.argv.pop(1)
-    unittest.main()
