@@ -3,6 +3,7 @@
 #include <nexil/parallel/Parallel.h>
 #include <veldrin/algorithms/internal/CountUnited.h>
 #include <veldrin/algorithms/internal/MeshOrder.h>
+#include <veldrin/algorithms/internal/Prefetch.h>
 
 #include <algorithm>
 
@@ -28,7 +29,8 @@ namespace {
     };
 
     template <class Parents>
-    bool hangTogether(Parents parents, unsigned int const* points, std::uint64_t count, std::uint64_t pointCount)
+    [[gnu::always_inline]] inline bool hangTogether(Parents parents, unsigned int const* points, std::uint64_t count,
+                                                    std::uint64_t pointCount)
     {
         if (count == 0 || points[0] >= pointCount)
             return false;
@@ -41,8 +43,8 @@ namespace {
 
     /// Makes those of a face's points that there are one set, and adds how many links that took.
     template <Way way, class Parents>
-    void uniteFace(Parents parents, unsigned int const* points, std::uint64_t count, std::uint64_t pointCount,
-                   std::uint64_t& linkCount)
+    [[gnu::always_inline]] inline void uniteFace(Parents parents, unsigned int const* points, std::uint64_t count,
+                                                 std::uint64_t pointCount, std::uint64_t& linkCount)
     {
         // Every other triangle of a mesh has no point that is new, but hardly a larger polygon has none.
         if (way == Way::AskFirst && count == 3 && hangTogether(parents, points, count, pointCount))
@@ -62,16 +64,32 @@ namespace {
         }
     }
 
+    /// Has brought to the cache what faces some way behind need: corners, and the parents of some of these.
+    template <unsigned int parentCount, class Parents>
+    [[gnu::always_inline]] inline void prefetchAhead(Parents parents, unsigned int const* points, std::uint64_t first,
+                                                     std::uint64_t cornerCount)
+    {
+        constexpr std::uint64_t kCornersAhead = 2048;
+        constexpr std::uint64_t kParentsAhead = 48;
+        prefetch(points, first + kCornersAhead);
+        if (first + kParentsAhead + parentCount > cornerCount)
+            return;
+        for (unsigned int k = 0; k < parentCount; ++k)
+            parents.prefetch(points[first + kParentsAhead + k]);
+    }
+
     /// Returns how many links that took.
-    template <Way way, class Parents, class Ranges>
+    template <Way way, unsigned int parentsAhead, class Parents, class Ranges>
     std::uint64_t uniteFaces(Parents parents, MeshFaces const& faces, Ranges ranges, std::uint64_t begin,
                              std::uint64_t end)
     {
         unsigned int const* const points = faces.points();
         std::uint64_t const pointCount = faces.pointCount();
+        std::uint64_t const cornerCount = faces.cornerCount();
         std::uint64_t linkCount = 0;
         for (std::uint64_t face = begin; face < end; ++face) {
             auto const [first, last] = ranges[face];
+            prefetchAhead<parentsAhead>(parents, points, first, cornerCount);
             uniteFace<way>(parents, points + first, last - first, pointCount, linkCount);
         }
         return linkCount;
@@ -87,19 +105,25 @@ namespace {
             parallel::threadCount() == 1 || faces.cornerCount() < kParallelCorners ||
             (!order.isByPoint && faces.pointCount() <= kCachedPoints && faces.cornerCount() <= kMostCornersAlone);
         auto const uniteLocked = [&](std::uint64_t begin, std::uint64_t end) {
-            return uniteFaces<Way::Locked>(sets.parents(), faces, ranges, begin, end);
+            return uniteFaces<Way::Locked, 3>(sets.parents(), faces, ranges, begin, end);
         };
-        auto const uniteBest = [&](std::uint64_t begin, std::uint64_t end) {
+        auto const uniteBest = [&]<unsigned int parentsAhead>(std::uint64_t begin, std::uint64_t end) {
             if (order.isByFace)
-                return isAlone ? uniteFaces<Way::AskFirst>(sets.parentsOfOneThread(), faces, ranges, begin, end)
-                               : uniteFaces<Way::AskFirst>(sets.parents(), faces, ranges, begin, end);
-            return isAlone ? uniteFaces<Way::Loosely>(sets.parentsOfOneThread(), faces, ranges, begin, end)
-                           : uniteLocked(begin, end);
+                return isAlone ? uniteFaces<Way::AskFirst, parentsAhead>(sets.parentsOfOneThread(), faces, ranges,
+                                                                         begin, end)
+                               : uniteFaces<Way::AskFirst, parentsAhead>(sets.parents(), faces, ranges, begin, end);
+            return isAlone
+                       ? uniteFaces<Way::Loosely, parentsAhead>(sets.parentsOfOneThread(), faces, ranges, begin, end)
+                       : uniteLocked(begin, end);
+        };
+        bool const isNear = order.isByPoint || faces.pointCount() <= kCachedPoints;
+        auto const unite = [&](std::uint64_t begin, std::uint64_t end) {
+            return isNear ? uniteBest.template operator()<1>(begin, end) : uniteBest.template operator()<3>(begin, end);
         };
         std::uint64_t const cornersOfFace = faces.cornerCount() / std::max<std::uint64_t>(1, faces.faceCount());
         return countUnited(sets, faces.faceCount(),
-                           kGrainCorners / std::clamp<std::uint64_t>(cornersOfFace, 3, kGrainCorners), isAlone,
-                           uniteBest, uniteLocked);
+                           kGrainCorners / std::clamp<std::uint64_t>(cornersOfFace, 3, kGrainCorners), isAlone, unite,
+                           uniteLocked);
     }
 
 } // namespace

@@ -2,6 +2,7 @@
 
 #include <veldrin/algorithms/internal/CornerAngles.h>
 #include <veldrin/algorithms/internal/FaceNormalBlock.h>
+#include <veldrin/algorithms/internal/Prefetch.h>
 
 #include <algorithm>
 #include <utility>
@@ -50,7 +51,7 @@ public:
     {
         for (std::uint64_t next = begin; begin < end; begin = next) {
             next = std::min(begin + normals_.kSize, end);
-            askForCornersAhead(begin);
+            prefetchCorners(begin);
             normals_.compute(positions_, points_, ranges_, begin, next);
             if constexpr (isAngleWeighted)
                 angles_.compute(normals_, positions_, points_, ranges_, begin, next);
@@ -75,13 +76,13 @@ public:
 
 private:
     /// Whoever looks at a thousand faces at once before they come here finds their corners in the cache.
-    [[gnu::always_inline]] void askForCornersAhead(std::uint64_t face) const noexcept
+    [[gnu::always_inline]] void prefetchCorners(std::uint64_t face) const noexcept
     {
-        constexpr std::size_t kAheadBytes = 4096 * sizeof(unsigned int);
-        constexpr std::size_t kLineBytes = 64;
-        auto const ahead = reinterpret_cast<std::uintptr_t>(points_ + ranges_[face].begin) + kAheadBytes;
-        for (std::size_t byte = 0; byte < kBlockSize * 4 * sizeof(unsigned int); byte += kLineBytes)
-            __builtin_prefetch(reinterpret_cast<void const*>(ahead + byte));
+        constexpr std::uint64_t kCornersAhead = 4096;
+        constexpr std::uint64_t kCornersOfLine = 16;
+        std::uint64_t const first = ranges_[face].begin + kCornersAhead;
+        for (std::uint64_t i = 0; i < kBlockSize * 4; i += kCornersOfLine)
+            Geometry::prefetch(points_, first + i);
     }
 
     Positions const& positions_;

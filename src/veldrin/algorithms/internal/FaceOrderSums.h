@@ -168,9 +168,10 @@ private:
             std::uint64_t const end = std::min<std::uint64_t>(begin + kChunkFaces, kept.endFace);
             for (std::uint64_t f = begin; f < end; ++f) {
                 Math::float3 const normal = normals[f - kept.firstFace];
-                for (std::uint64_t i = ranges_[f].begin; i < ranges_[f].end; ++i)
+                forEachCornerOf(ranges_, f, [=, &kept](std::uint64_t i, std::uint64_t) {
                     if (unsigned int const point = points[i] - firstPoint; point < size)
                         addTo(sums[point], isAngleWeighted ? scaled(normal, angles[i - kept.firstCorner]) : normal);
+                });
             }
         }
     }

@@ -14,7 +14,9 @@ MeshOrder judgeOrder(MeshFaces const& faces) noexcept
     std::uint64_t nearCount = 0;
     std::uint64_t localCount = 0;
     for (std::uint64_t i = 0; i < kLookedAt && faces.faceCount() > 1; ++i) {
-        std::uint64_t const face = (faces.faceCount() - 1) * i / kLookedAt;
+        // Spread by the golden ratio: even steps may meet every other face only, of which some meshes have two kinds.
+        std::uint64_t const share = i * 0x9E3779B9u & 0xFFFFFFFFu;
+        std::uint64_t const face = share * (faces.faceCount() - 1) >> 32;
         IndexRange const range = faces.corners(face, face + 1);
         IndexRange const next = faces.corners(face + 1, face + 2);
         if (range.end - range.begin < 2 || next.end - next.begin < 2)
