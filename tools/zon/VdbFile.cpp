@@ -3,6 +3,7 @@
 #include "Command.h"
 #include "OutputFile.h"
 #include "ValueRows.h"
+#include "VdbOpening.h"
 #include "VolumeParts.h"
 
 #include <veldrin/geometry/Names.h>
@@ -629,12 +630,21 @@ namespace {
 VdbVolumes readVdb(std::string const& path)
 {
     return withVdb(path, [&] {
-        openvdb::io::File file(path);
-        file.open(false);
+        auto const file = openVdb(path);
         VdbVolumes result;
         double freeBlocks = kFreeBlocks;
-        for (auto name = file.beginName(); name != file.endName(); ++name) {
-            auto const grid = file.readGrid(*name);
+        for (auto name = file->beginName(); name != file->endName(); ++name) {
+            openvdb::GridBase::Ptr grid;
+            try {
+                grid = file->readGrid(*name);
+            } catch (openvdb::KeyError const& error) {
+                auto const type = VdbStandIns::typeIn(error);
+                if (!type)
+                    throw;
+                result.leftOut.push_back("grid '" + openvdb::io::GridDescriptor::stripSuffix(*name) +
+                                         "': it is a grid of type " + *type);
+                continue;
+            }
             try {
                 result.objects.push_back(objectOf(*grid, freeBlocks));
             } catch (Failure const& failure) {

@@ -27,9 +27,9 @@ struct VdbVolumes {
 /// "voxel_". Voxels keep their coordinates. The grid's transform is kept as "vdb_transform" (x, y, z of the centre of its
 /// voxel 0, 0, 0, and the voxel size) where that is another than the centre of ours. Which values are active follows from
 /// them (all but the background, and its negative in a level set); where it does not, a bool channel "..._active" tells.
-/// Grids of other types, and those whose transform is not one positive scale and a translation, are left out. So are grids
-/// in which regions of one value cover too many blocks of 8 x 8 x 8 voxels, each of which becomes a tile: 2^21 are taken for
-/// all grids of a file, and 64 more for every block of voxels of their own.
+/// Grids of other types and trees of another shape, and those whose transform is not one positive scale and a translation,
+/// are left out. So are grids in which regions of one value cover too many blocks of 8 x 8 x 8 voxels, each of which becomes
+/// a tile: 2^21 are taken for all grids of a file, and 64 more for every block of voxels of their own.
 /// Errors: Failure with the file's name and the reason.
 [[nodiscard]] VdbVolumes readVdb(std::string const& path);
 
