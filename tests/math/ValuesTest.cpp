@@ -4,8 +4,6 @@
 
 #include <cstring>
 #include <limits>
-#include <map>
-#include <string>
 
 namespace {
 
@@ -13,17 +11,6 @@ using namespace Veldrin::Math;
 
 constexpr float kNaN = std::numeric_limits<float>::quiet_NaN();
 constexpr float kInfinity = std::numeric_limits<float>::infinity();
-
-TEST(MathValues, AreTheirComponentsWithoutPadding)
-{
-    EXPECT_EQ(sizeof(bool3), 3u);
-    EXPECT_EQ(sizeof(ushort3), 6u);
-    EXPECT_EQ(sizeof(float3), 12u);
-    EXPECT_EQ(alignof(float4), alignof(float));
-    EXPECT_EQ(sizeof(double4x4), 128u);
-    EXPECT_EQ(sizeof(quatf), 16u);
-    EXPECT_EQ(sizeof(bbox<float3, float>), 24u);
-}
 
 TEST(MathValues, MatricesLieColumnByColumn)
 {

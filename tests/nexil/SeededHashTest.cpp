@@ -1,4 +1,3 @@
-#include <nexil/RuntimeMessage.h>
 #include <nexil/SeededHash.h>
 
 #include <gtest/gtest.h>
@@ -8,13 +7,7 @@
 
 namespace {
 
-TEST(Services, CategoriesHaveTheNumbersThatHostsCompare)
-{
-    EXPECT_EQ(Nexil::RuntimeMessageCategory(1), Nexil::RuntimeMessageCategory::Error);
-    EXPECT_EQ(Nexil::RuntimeMessageCategory(2), Nexil::RuntimeMessageCategory::Warning);
-}
-
-TEST(Services, HashesTellNamesApartByEveryByteAndTheirLength)
+TEST(SeededHash, TellsNamesApartByEveryByteAndTheirLength)
 {
     // Names of zeros differ by length alone, the others in one byte, at each place of each length.
     std::set<std::uint64_t> hashes;
