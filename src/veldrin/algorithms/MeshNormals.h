@@ -41,11 +41,11 @@ VELDRIN_API void computeMeshFaceNormals(Object const& mesh, Nexil::Array<Math::f
 ///                Angles are within 4 units in the last place of the arc cosine of the same cosine.
 /// areaWeighted:  weights by area.
 /// normals: resized to the element count of "point_component"; storage that it already has is used again.
-/// Cost: one pass over the corners; parallel from `kParallelMeshVertexNormalsThreshold` points on. On a mesh too large for the
-/// caches whose neighbours have near numbers, as most have, each thread then adds for its own part of the points; elsewhere
-/// one adds what the others compute, or each of more than four goes over all corners for its own points.
+/// Cost: one pass over the corners; parallel from `kParallelMeshVertexNormalsThreshold` points on. Where neighbours have near
+/// numbers, as in most meshes, each thread then adds for a part of the faces and for points of its own; elsewhere one adds
+/// what the others compute, or each of more than four goes over all corners for its own points.
 /// Temporary memory: for each thread 20 bytes a corner of 64 faces when weighted by angle, otherwise none. On more than one
-/// thread besides 1 byte for 32 points and 12 bytes for 1024 faces, or, where threads do not add for their own parts, 12
+/// thread besides 2 bytes for 32 points and 8 bytes for 1024 faces, or, where threads do not add for their own points, 12
 /// bytes a face and 4 bytes a corner when weighted by angle: for 32768 faces, or for all with more than four threads.
 VELDRIN_API void computeMeshVertexNormals(Object const& mesh, bool angleWeighted, bool areaWeighted,
                                           Nexil::Array<Math::float3>& normals);
