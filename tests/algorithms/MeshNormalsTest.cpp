@@ -90,14 +90,16 @@ void soilFreeMemory(std::size_t floatCount)
     std::vector<std::vector<float>> const soil(4, std::vector<float>(floatCount, std::nanf("")));
 }
 
-/// Random faces whose corners lie within `spread` points of each other, all along the points of a mesh.
+/// Random faces whose corners lie within `spread` points of each other, all along the points of a mesh; only the last quarter
+/// has points that are not there.
 Polygons facesAlong(unsigned int pointCount, unsigned int spread, unsigned int faceSize)
 {
     auto faces = support::randomFaces(spread, 20000, faceSize, spread);
     for (std::size_t f = 0; f < faces.size(); ++f)
         for (unsigned int& corner : faces[f])
-            if (corner < spread)
-                corner = static_cast<unsigned int>((corner + f * (pointCount - spread) / faces.size()) % pointCount);
+            if (corner < spread || f < faces.size() / 4 * 3)
+                corner = static_cast<unsigned int>((corner % spread + f * (pointCount - spread) / faces.size()) %
+                                                   pointCount);
             else
                 corner = corner - spread + pointCount;
     return faces;
