@@ -23,9 +23,9 @@
 /// inside; one result, bit for bit, for every number of threads.
 namespace VLD::TileTree3D {
 
-/// How many tiles spheres may touch, each counted for every sphere, as an average over where they may lie: 4 GiB of temporary
-/// memory at most.
-inline constexpr double kMostTouchedTiles = 1 << 27;
+/// How many tiles spheres may touch, each counted for every sphere, as an average over where they may lie: about 8 GiB of
+/// temporary memory. Spheres of radius 2 voxels touch some 28 each.
+inline constexpr double kMostTouchedTiles = 1 << 28;
 
 /// The distance to the nearest sphere's surface at the centre of each voxel, negative inside of any, cut off at -band and
 /// band. Inside, where spheres overlap, it is the one to the sphere in which the voxel lies deepest. The default is band.

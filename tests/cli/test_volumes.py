@@ -97,14 +97,19 @@ class Volumes(tool.ToolTest):
             self.assertIn(wanted, self.zon("volume", "from-mesh", "cube.zon", "x.zon", *options, code=2).stderr)
         self.assertNotIn("x.zon", self.names())
 
-    def test_values_where_no_grid_has_a_place_are_left_out_by_name(self):
+    def test_what_no_grid_holds_is_left_out_by_name(self):
         end = (1 << 31) - 4096  # of what OpenVDB fills in a time that ends
-        low, high = (zon_files.volume((0, z, 0), heat=("f", range(8))) for z in (end - 8, end))
-        self.write("a.zon", zon_files.stream([high, low]))
-        self.assertIn(f"object 0: heat: it has values beyond coordinate {end}",
-                      self.zon("export", "a.zon", "a.vdb").stderr)
+        heat = ("f", range(8))
+        low, high = (zon_files.volume((0, z, 0), heat=heat) for z in (end - 8, end))
+        tiny = zon_files.volume(voxel_size=1e-5, heat=heat)
+        named = {"name": zon_files.text("smoke"), **zon_files.volume(heat=heat, soot=heat)}
+        self.write("a.zon", zon_files.stream([high, low, tiny, named]))
+        said = self.zon("export", "a.zon", "a.vdb").stderr
+        for expected in (f"object 0: heat: it has values beyond coordinate {end}",
+                         "object 2: heat: OpenVDB takes no voxels of size 1e-05", "object 3: name\n"):
+            self.assertIn(expected, said)
         self.zon("import", "a.vdb", "b.zon")
-        self.assertEqual(len(self.objects("b.zon")), 1)
+        self.assertEqual(len(self.objects("b.zon")), 3)
         self.write("high.zon", zon_files.stream([high]))
         self.assertIn("beyond", self.zon("export", "high.zon", "high.vdb", code=2).stderr)
         self.assertNotIn("high.vdb", self.names())

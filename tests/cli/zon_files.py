@@ -74,7 +74,7 @@ def stream(top, shared=()):
     return head + struct.pack(">BQ", 0xCF, end) + b"".join(items) + table
 
 
-def volume(origin=(0, 0, 0), **channels):
+def volume(origin=(0, 0, 0), voxel_size=1.0, **channels):
     """One small inner tile without leaf tiles; each channel has a form and the values of its eight cells."""
     sizes = {"voxelTileWidth": [2, 2], "voxelTileDataWidth": [2, 4], "voxelOffsetType": [2, 0], "voxelInnerLevels": [2, 1]}
     none = array("I", ())
@@ -82,7 +82,7 @@ def volume(origin=(0, 0, 0), **channels):
              "leaf_origins": array("3i", ()), "leaf_parents": none, "inner_origins": array("3i", origin),
              "inner_children": array("I", [0xFFFFFFFF] * 8)}
     tree = {"indices": none, "target": text("voxel_component"), "depends_on": NO_NAMES, "vld_component": text("container"),
-            "name": text("voxel_tile_tree"), "topology": text("voxel_component"), "voxelSize": [8, 1.0]}
+            "name": text("voxel_tile_tree"), "topology": text("voxel_component"), "voxelSize": [8, voxel_size]}
     geometry = {"voxel_component": part(obj(tiles)), "voxel_tile_tree": part(obj(tree))}
     for name, (form, values) in channels.items():
         default = [10, False] if form == "?" else [8, 0.0]

@@ -113,6 +113,26 @@ TYPED_TEST(VolumeBounds, GrowABoxLikeALoopOverAllElements)
     }
 }
 
+TYPED_TEST(VolumeBounds, HoldTheContentOfAllContainers)
+{
+    using Other = std::conditional_t<std::is_same_v<TypeParam, SmallTiles>, WideTiles, SmallTiles>;
+    auto const add = [](auto traits, int x, char const* topology, char const* container, char const* channel,
+                        auto& volume) {
+        buildFromVoxels<decltype(traits)>(
+            {.channelName = channel, .topologyName = topology, .containerName = container},
+            Nexil::Array<Coordinate>{{x, 0, 0}}, Nexil::Array<float>{x < 0 ? -1.0f : 1.0f}, x < 0 ? 3.0f : 0.0f)
+            .addTo(volume);
+    };
+    auto volume = VLD::createObject();
+    add(TypeParam(), -7, "a", "b", "voxel_signed_distance", *volume);
+    add(Other(), 9, "c", "d", "voxel_fog_density", *volume);
+    add(TypeParam(), 5, "e", "f", "voxel_depth", *volume);
+    Box box;
+    GeometryAlgorithms::getVolumeBounds(*Geometry::move_vld_volume_to_object(*volume), box);
+    EXPECT_EQ(box.min.x, -7);
+    EXPECT_EQ(box.max.x, 10);
+}
+
 TYPED_TEST(VolumeBounds, PassOverWhatDoesNotBelongToTheContainer)
 {
     using Traits = TypeParam;

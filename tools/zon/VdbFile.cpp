@@ -178,8 +178,7 @@ namespace {
                 std::make_shared<openvdb::math::UniformScaleTranslateMap>(placement.voxelSize, openvdb::Vec3d(t));
             return std::make_shared<openvdb::math::Transform>(map);
         } catch (openvdb::ArithmeticError const&) {
-            throw openvdb::ValueError(
-                fmt::format("OpenVDB takes no voxels of size {}", static_cast<float>(placement.voxelSize)));
+            throw Failure(fmt::format("OpenVDB takes no voxels of size {}", static_cast<float>(placement.voxelSize)));
         }
     }
 
@@ -499,14 +498,14 @@ namespace {
         return grid;
     }
 
-    /// The transform that the object was read with where it still fits, else that of our voxels.
-    Placement placementIn(Object const& object, float voxelSize)
+    /// The transform that the object was read with, where it still fits.
+    std::optional<Placement> placementIn(Object const& object, float voxelSize)
     {
         auto const held = object.getProperty(kTransform);
         auto const* const t = held.get<double4>();
         if (!t || static_cast<float>(t->w) != voxelSize)
-            return Placement::ofOurs(voxelSize);
-        return {{t->x, t->y, t->z}, t->w};
+            return std::nullopt;
+        return Placement{{t->x, t->y, t->z}, t->w};
     }
 
     /// The grids of one object; adds to `leftOut` what is none.
@@ -529,10 +528,15 @@ namespace {
             forEachContainer(*volume, [&](auto const& container) { writeContainer(*volume, container); });
             // The name that the object has is that of its grid, where there is one.
             auto const name = getPropertyAs<Nexil::String>(object_, "name");
-            if (grids_.size() == gridsBefore + 1 && !name.empty())
+            bool const hasNamed = grids_.size() == gridsBefore + 1 && !name.empty();
+            if (hasNamed)
                 grids_.back()->setName(name.c_str());
+            auto const isKept = [&](Nexil::String const& key) {
+                return (key == "name" && hasNamed) || (key == kTransform && hasPlaced_) ||
+                       volume->hasComponentFromName(key);
+            };
             for (Nexil::String const& key : object_.keys())
-                if (key != "name" && key != kTransform && !volume->hasComponentFromName(key))
+                if (!isKept(key))
                     leave(std::string(key.view()));
             for (Nexil::String const& key : volume->componentRange())
                 if (volume->component<PointTopology<SmallTiles>>(key) ||
@@ -546,7 +550,7 @@ namespace {
         template <class Traits>
         void writeContainer(VLD::Object const& volume, Container<Traits> const& container)
         {
-            auto const transform = transformOf(placementIn(object_, container.voxelSize()));
+            auto const placement = placementIn(object_, container.voxelSize());
             auto const channels = channelsOf(volume, container);
             auto find = [&](Nexil::String const& name) {
                 auto const place = std::find_if(channels.begin(), channels.end(),
@@ -567,6 +571,8 @@ namespace {
                         if (channel->template values<E>())
                             grid = gridOf<E>(AnyTopology(*container.topology()), *channel, states.get());
                     });
+                    if (grid)
+                        grid->setTransform(transformOf(placement.value_or(Placement::ofOurs(container.voxelSize()))));
                 } catch (Failure const& failure) {
                     leave(std::string(name) + ": " + failure.what());
                     continue;
@@ -575,9 +581,9 @@ namespace {
                     leave(std::string(name) + ": " + typeName(channel->data()));
                     continue;
                 }
-                grid->setTransform(transform->copy());
                 grid->setName(std::string(name));
                 grids_.push_back(grid);
+                hasPlaced_ = hasPlaced_ || placement;
             }
         }
 
@@ -585,6 +591,7 @@ namespace {
         std::string place_;
         openvdb::GridPtrVec& grids_;
         std::vector<std::string>& leftOut_;
+        bool hasPlaced_ = false; // a grid where the object says
     };
 
     /// Throws Failure for a surface whose level set has no place among the coordinates, or in the memory of this machine: it

@@ -219,7 +219,7 @@ namespace {
                 list.push_back(box.isEmpty() ? Json{{"min", nullptr}, {"max", nullptr}}
                                              : Json{{"min", corner(box.min)}, {"max", corner(box.max)}});
             } else if (box.isEmpty()) {
-                fmt::print("object {}: nothing in it\n", i);
+                fmt::print("object {}: no signed distance, fog density or points in it\n", i);
             } else {
                 auto const size = box.max - box.min;
                 fmt::print("object {}: {} {} {} to {} {} {}, size {} {} {}\n", i, box.min.x, box.min.y, box.min.z,
@@ -293,7 +293,7 @@ namespace {
         if (!grid.addTo(*volume))
             throw Failure(place +
                           "the spheres have more voxels than a volume holds, or too many of them overlap, or they lie "
-                          "beyond the coordinates that there are");
+                          "beyond the coordinates that there are; larger voxels help");
         return Geometry::move_vld_volume_to_object(*volume);
     }
 
