@@ -188,3 +188,10 @@ class Export(tool.ToolTest):
             text = self.zon(command, "named.zon").stdout
             self.assertIn("?[2Jred", text)
             self.assertNotIn("\x1b", text)
+        self.import_text("c1.obj", "o \x9b31m\nv 0 0 0\nv 1 0 0\nv 0 1 0\nf 1 2 3\n")
+        self.assertIn("??31m", self.zon("info", "c1.zon").stdout)
+        # A name that OBJ cannot keep comes in a warning.
+        self.import_text("red.obj", "o a\x1b[31mb\nv 0 0 0\nv 1 0 0\nv 0 1 0\nf 1 2 3\n")
+        said = self.zon("export", "red.zon", "back.obj").stderr
+        self.assertIn('"a?[31mb"', said)
+        self.assertNotIn("\x1b", said)

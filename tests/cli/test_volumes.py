@@ -93,7 +93,8 @@ class Volumes(tool.ToolTest):
             self.zon("volume", "from-mesh", source, "x.zon", f"--voxel-size={size}", code=2)
         for options, wanted in ((("--voxel-size=1e-4", "--band=1e6"), "more than the memory of this machine holds"),
                                 (("--voxel-size=2e-5",), "with voxels that small its level set has some 9e+10 voxels"),
-                                (("--voxel-size=1e-5",), "OpenVDB takes no voxels of size 1e-05")):
+                                (("--voxel-size=1e-5",), "OpenVDB takes no voxels of size 1e-05"),
+                                (("--voxel-size=0.1", "--band=0.9"), "at least 1")):
             self.assertIn(wanted, self.zon("volume", "from-mesh", "cube.zon", "x.zon", *options, code=2).stderr)
         self.assertNotIn("x.zon", self.names())
 

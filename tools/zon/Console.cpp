@@ -37,12 +37,12 @@ std::string colored(std::FILE* stream, Color color, std::string_view text)
 
 void error(std::string_view text)
 {
-    fmt::print(stderr, "zon: {} {}\n", colored(stderr, Color::Red, "error:"), text);
+    fmt::print(stderr, "zon: {} {}\n", colored(stderr, Color::Red, "error:"), printable(text, true));
 }
 
 void warn(std::string_view text)
 {
-    fmt::print(stderr, "zon: {} {}\n", colored(stderr, Color::Yellow, "warning:"), text);
+    fmt::print(stderr, "zon: {} {}\n", colored(stderr, Color::Yellow, "warning:"), printable(text, true));
 }
 
 std::string errorText(int errorNumber)
@@ -53,9 +53,15 @@ std::string errorText(int errorNumber)
 std::string printable(std::string_view text, bool keepsLineEnds)
 {
     std::string result(text);
-    for (char& c : result)
-        if ((c >= 0 && c < 32 && !(keepsLineEnds && c == '\n')) || c == 127)
-            c = '?';
+    for (std::size_t i = 0; i < result.size(); ++i) {
+        auto const byte = static_cast<unsigned char>(result[i]);
+        auto const next = static_cast<unsigned char>(i + 1 < result.size() ? result[i + 1] : 0);
+        // U+0080 to U+009F are control characters of two bytes.
+        if (byte == 0xC2 && next >= 0x80 && next < 0xA0)
+            result[i] = result[i + 1] = '?';
+        else if ((byte < 32 && !(keepsLineEnds && byte == '\n')) || byte == 127)
+            result[i] = '?';
+    }
     return result;
 }
 

@@ -16,14 +16,15 @@ enum class Color { Green, Red, Yellow, Bold };
 /// `text` in colour when `stream` is a terminal and NO_COLOR is not set, else as it is.
 [[nodiscard]] std::string colored(std::FILE* stream, Color color, std::string_view text);
 
-/// One line on stderr.
+/// One line on stderr, `printable` but for line ends in it.
 void error(std::string_view text);
 void warn(std::string_view text);
 
 /// The system's text for an error number.
 [[nodiscard]] std::string errorText(int errorNumber);
 
-/// Text from a file as a terminal may have it: '?' for each control byte, line ends among them unless they are kept.
+/// Text from a file as a terminal may have it: '?' for each byte of a control character, line ends among them unless they
+/// are kept.
 [[nodiscard]] std::string printable(std::string_view text, bool keepsLineEnds = false);
 
 /// "1 face", "2 faces".

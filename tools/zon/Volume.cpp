@@ -337,13 +337,25 @@ namespace {
                    : text + " is no finite number above 0";
     }
 
+    /// A thinner band than that leaves gaps, through which the inside of a mesh gets out.
+    std::string checkBandOfMesh(std::string const& text)
+    {
+        float value = 0;
+        return CLI::detail::lexical_cast(text, value) && std::isfinite(value) && value >= 1
+                   ? ""
+                   : text + " is no finite number of at least 1";
+    }
+
     template <class Make>
     void addMaker(CLI::App& volume, Run& run, char const* name, char const* description, bool hasRadius,
                   Make const& make)
     {
         auto const options = std::make_shared<MakeOptions>();
         auto* const command = volume.add_subcommand(name, description);
-        command->add_option("in", options->input, "zon file; each of its objects becomes a volume")->required();
+        command
+            ->add_option("in", options->input,
+                         "zon file; each of its objects becomes a volume, and one that cannot is an error")
+            ->required();
         command->add_option("out", options->output, "zon file to write")->required();
         command->add_option("--voxel-size", options->voxelSize, "Edge length of a voxel")
             ->required()
@@ -353,7 +365,7 @@ namespace {
                 ->required()
                 ->check(checkPositive);
         command->add_option("--band", options->halfBand, "Voxels to each side of the surface that have a distance")
-            ->check(checkPositive)
+            ->check(hasRadius ? checkPositive : checkBandOfMesh)
             ->capture_default_str();
         command->add_option("--level", options->level, "Compression: 0 none, 1 quickest to 9 smallest")
             ->check(CLI::Range(0, 9))
