@@ -22,7 +22,8 @@ class Files(tool.ToolTest):
         self.write("text.zon", "no zon at all")
         self.write("mesh.xyz", "0 0 0")
         before = self.names()
-        for command, words in (([], ""), (["nonsense"], ""), (["diff", "only-one.zon"], ""),
+        for command, words in (([], ""), (["nonsense"], "no subcommand 'nonsense'"),
+                               (["make", "donut", "x"], "'donut'"), (["diff", "only-one.zon"], ""),
                                (["make", "cube", "x.zon", "--level", "10"], "level"),
                                (["make", "cube", "x.zon", "--size", "nan"], "size"),
                                (["make", "plane", "x.zon", "--subdivisions", "0"], "subdivisions"),

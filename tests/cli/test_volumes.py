@@ -86,6 +86,8 @@ class Volumes(tool.ToolTest):
         self.assertEqual(self.objects("solid.zon")[0][0], "level set")
         (volume,) = self.json("volume", "info", "solid.zon")["objects"]
         self.assertTrue(volume["containers"][0]["consistent"])
+        self.assertIn("object 0: no voxel lies inside",
+                      self.zon("volume", "from-mesh", "cube.zon", "none.zon", "--voxel-size=100").stderr)
         self.zon("make", "plane", "plane.zon")
         said = self.zon("volume", "from-mesh", "plane.zon", "open.zon", "--voxel-size", "0.1").stderr
         self.assertIn("object 0: its surface is not closed: 4 boundary edges", said)

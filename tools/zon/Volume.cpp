@@ -306,8 +306,10 @@ namespace {
             Working const working("making volumes");
             editEach(objects, [&](std::uint64_t number, Nexil::Ptr<Object>& object) {
                 auto const name = getPropertyAs<Nexil::String>(*object, "name");
-                Nexil::MutablePtr<Object> made(
-                    make(*object, fmt::format("{}: object {}: ", options.input, number), options));
+                auto const place = fmt::format("{}: object {}: ", options.input, number);
+                Nexil::MutablePtr<Object> made(make(*object, place, options));
+                if (boundsOf(*made).isEmpty())
+                    warn(place + "no voxel lies inside of it");
                 if (!name.empty())
                     setProperty(*made, "name", name);
                 object = std::move(made);

@@ -3,10 +3,13 @@
 
 #include <CLI/CLI.hpp>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <exception>
 #include <new>
+#include <string>
+#include <string_view>
 
 namespace {
 
@@ -58,9 +61,14 @@ int main(int argumentCount, char** arguments)
     try {
         app.parse(argumentCount, arguments);
     } catch (CLI::ParseError const& wrongUsage) {
+        auto const unknown = app.remaining(true);
+        if (!unknown.empty() && std::string_view(wrongUsage.what()) == "A subcommand is required") {
+            error("there is no subcommand '" + unknown[0] + "'");
+            return kFailure;
+        }
         if (app.exit(wrongUsage) == 0)
             return kDone;
-        if (dynamic_cast<CLI::ExtrasError const*>(&wrongUsage))
+        if (std::ranges::any_of(unknown, [](std::string const& word) { return word.starts_with('-'); }))
             std::fputs("What begins with '-' and is no option stands behind '--'.\n", stderr);
         return kFailure;
     }
