@@ -1,20 +1,25 @@
 #include <support/FreshMemory.h>
 #include <vld/VolumeCases.h>
 
+#include <nexil/parallel/Parallel.h>
 #include <veldrin/io/ObjectStream.h>
 #include <veldrin/volume/VolumeConversion.h>
 #include <vld/Accessor.h>
 
 #include <openvdb/openvdb.h>
 #include <openvdb/tools/LevelSetSphere.h>
+#include <openvdb/tree/LeafManager.h>
 
 #include <benchmark/benchmark.h>
 
 #include <blosc.h>
 
+#include <tbb/parallel_reduce.h>
+
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <functional>
 #include <memory>
 #include <string>
 #include <thread>
@@ -69,45 +74,61 @@ void boundsPeer(benchmark::State& state)
     perVoxel(state, static_cast<double>(grid->activeVoxelCount()));
 }
 
-/// Every value within the band, with its coordinates.
+/// What comes of every value within the band and its coordinates.
+struct Visited {
+    double sum = 0;
+    std::int64_t places = 0;
+
+    friend Visited operator+(Visited const& left, Visited const& right)
+    {
+        return {left.sum + right.sum, left.places + right.places};
+    }
+};
+
 template <class Traits>
 void visitOurs(benchmark::State& state)
 {
+    ThreadLimit const limit(state);
     auto const grid = sphere<Traits>(kRadius);
     auto const values = grid.channel->template values<float>();
-    for (auto _ : state) {
-        double sum = 0;
-        std::int64_t places = 0;
-        for (unsigned int leaf = 0; leaf < grid.topology->leafCount(); ++leaf) {
-            float const* const tile = values->data() + std::uint64_t(leaf) * Traits::kLeafVoxels;
-            Coordinate const origin = grid.topology->leafOrigins()[leaf];
-            for (unsigned int place = 0; place < Traits::kLeafVoxels; ++place)
-                if (tile[place] > -kBand && tile[place] < kBand) {
-                    Coordinate const voxel = origin + cellAtPlace<Traits::kDataWidth>(place);
-                    sum += tile[place];
-                    places += voxel.x + voxel.y + voxel.z;
+    for (auto _ : state)
+        benchmark::DoNotOptimize(Nexil::parallel::reduceInOrder(
+            grid.topology->leafCount(), 256, Visited(),
+            [&](std::size_t begin, std::size_t end, Visited visited) {
+                for (std::size_t leaf = begin; leaf < end; ++leaf) {
+                    float const* const tile = values->data() + leaf * Traits::kLeafVoxels;
+                    Coordinate const origin = grid.topology->leafOrigins()[leaf];
+                    for (unsigned int place = 0; place < Traits::kLeafVoxels; ++place)
+                        if (tile[place] > -kBand && tile[place] < kBand) {
+                            Coordinate const voxel = origin + cellAtPlace<Traits::kDataWidth>(place);
+                            visited.sum += tile[place];
+                            visited.places += voxel.x + voxel.y + voxel.z;
+                        }
                 }
-        }
-        benchmark::DoNotOptimize(sum);
-        benchmark::DoNotOptimize(places);
-    }
+                return visited;
+            },
+            std::plus<>()));
     perVoxel(state, heldVoxels(grid));
 }
 
 void visitPeer(benchmark::State& state)
 {
+    ThreadLimit const limit(state);
     auto const grid = peerSphere();
-    for (auto _ : state) {
-        double sum = 0;
-        std::int64_t places = 0;
-        for (auto value = grid->cbeginValueOn(); value; ++value) {
-            openvdb::Coord const voxel = value.getCoord();
-            sum += *value;
-            places += voxel.x() + voxel.y() + voxel.z();
-        }
-        benchmark::DoNotOptimize(sum);
-        benchmark::DoNotOptimize(places);
-    }
+    openvdb::tree::LeafManager<openvdb::FloatTree const> const leaves(grid->tree());
+    for (auto _ : state)
+        benchmark::DoNotOptimize(tbb::parallel_reduce(
+            leaves.leafRange(64), Visited(),
+            [](auto const& range, Visited visited) {
+                for (auto leaf = range.begin(); leaf; ++leaf)
+                    for (auto value = leaf->cbeginValueOn(); value; ++value) {
+                        openvdb::Coord const voxel = value.getCoord();
+                        visited.sum += *value;
+                        visited.places += voxel.x() + voxel.y() + voxel.z();
+                    }
+                return visited;
+            },
+            std::plus<>()));
     perVoxel(state, static_cast<double>(grid->activeVoxelCount()));
 }
 
@@ -312,9 +333,7 @@ BENCHMARK_TEMPLATE(buildFromVoxelList, SmallTiles)
     ->ArgsProduct({{1, 2}, {0, 1}})
     ->UseRealTime();
 VELDRIN_SIDES(boundsPeer, boundsOfContent);
-BENCHMARK(visitPeer);
-BENCHMARK_TEMPLATE(visitOurs, SmallTiles);
-BENCHMARK_TEMPLATE(visitOurs, WideTiles);
+VELDRIN_SIDES(visitPeer, visitOurs);
 #define VELDRIN_FILES(name)                             \
     BENCHMARK_TEMPLATE(name, SmallTiles)                \
         ->ArgNames({"level", "radius"})                 \
@@ -328,9 +347,10 @@ VELDRIN_FILES(saveBare);
 BENCHMARK(loadPeer)->UseRealTime();
 VELDRIN_FILES(loadOurs);
 VELDRIN_FILES(loadBare);
-BENCHMARK(readPeer);
-BENCHMARK_TEMPLATE(readAtRandom, SmallTiles);
-BENCHMARK_TEMPLATE(readAtRandom, WideTiles);
+// Each thread with an accessor of its own; the time of both over what both have read.
+BENCHMARK(readPeer)->Threads(1)->Threads(2);
+BENCHMARK_TEMPLATE(readAtRandom, SmallTiles)->Threads(1)->Threads(2);
+BENCHMARK_TEMPLATE(readAtRandom, WideTiles)->Threads(1)->Threads(2);
 
 } // namespace
 

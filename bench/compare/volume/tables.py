@@ -2,11 +2,14 @@
 
     tables.py BOTH.json ONE.json
 
-What the program writes with --benchmark_out: on all cores, and bound to one of them. Of repetitions the quickest counts.
+What the program writes with --benchmark_out: on all cores, and bound to one of them. Of repetitions the quickest counts, in
+ratios the median.
 """
+import collections
 import datetime
 import json
 import pathlib
+import statistics
 import sys
 
 RADII = (125, 500)
@@ -18,6 +21,7 @@ NANOSECONDS = {"ns": 1, "us": 1e3, "ms": 1e6, "s": 1e9}
 class Results:
     def __init__(self, path):
         self.runs = {}
+        self.times = collections.defaultdict(list)
         for run in json.loads(pathlib.Path(path).read_text())["benchmarks"]:
             if run.get("run_type") == "aggregate":
                 continue
@@ -25,6 +29,7 @@ class Results:
                 sys.exit(f"{run['run_name']}: {run['error_message']}")
             name = run["run_name"].removesuffix("/real_time")
             run["time"] = run["real_time"] * NANOSECONDS[run["time_unit"]]
+            self.times[name].append(run["time"])
             if name not in self.runs or run["time"] < self.runs[name]["time"]:
                 self.runs[name] = run
 
@@ -32,6 +37,9 @@ class Results:
         """Of the quickest run, the time in nanoseconds or a counter; nothing for a case that there is not."""
         run = self.runs.get("/".join(filter(None, (name, arguments))))
         return run and run[key]
+
+    def median(self, name, arguments):
+        return statistics.median(self.times[f"{name}/{arguments}"])
 
 
 def number(value):
@@ -77,8 +85,8 @@ def main():
         on_threads("buildFromVoxelList", "buildFromListPeer", "/shuffled:0"))
     row("build from the same list shuffled, one thread / two (OpenVDB: one)", "ms", 1e6,
         on_threads("buildFromVoxelList", "buildFromListPeer", "/shuffled:1"))
-    row("visit every value of the band", "ms", 1e6, counted("visitOurs", "visitPeer", "time"))
-    row("random read by accessor", "ns", 1, counted("readAtRandom", "readPeer", "time"))
+    row("visit every value of the band, one thread / two", "ms", 1e6, on_threads("visitOurs", "visitPeer"))
+    row("random read by accessor, one thread / two", "ns", 1, on_threads("readAtRandom", "readPeer"))
     row("box around the content, one thread / two (OpenVDB: around active voxels, whatever their values)", "ms", 1e6,
         on_threads("boundsOfContent", "boundsPeer"))
     row("save, level 9 (OpenVDB: blosc), one core / all", "ms", 1e6, on_cores("saveOurs", "savePeer"))
@@ -93,7 +101,8 @@ def main():
         for what in ("save", "load"):
             for level in LEVELS:
                 arguments = f"level:{level}/radius:{radius}"
-                ratios.append(both(f"{what}Bare<SmallTiles>", arguments) / both(f"{what}Ours<SmallTiles>", arguments))
+                bare, ours = (both.median(f"{what}{side}<SmallTiles>", arguments) for side in ("Bare", "Ours"))
+                ratios.append(bare / ours)
         print(f"| radius {radius} | " + " | ".join(f"{ratio:.2f}" for ratio in ratios) + " |")
 
 
